@@ -1,0 +1,31 @@
+#pragma once
+
+#include <optional>
+#include <string>
+#include <string_view>
+#include <system_error>
+
+namespace zal {
+
+/// What placing files needs from the host. Any thread; may wait for a disk. Paths are plain UTF-8.
+class FilePlacement {
+ public:
+  virtual ~FilePlacement() = default;
+  /// The home directory that a leading "~" stands for.
+  [[nodiscard]] virtual std::string homeDirectory() const = 0;
+  /// A path in the temporary area that names nothing yet and that nobody can guess.
+  [[nodiscard]] virtual std::string randomTemporaryPath(std::string_view suffix) = 0;
+  /// The path itself when nothing exists there, else the first free "name-2.ext", "name-3.ext" …;
+  /// nothing when no free name was found.
+  [[nodiscard]] virtual std::optional<std::string> uniqueSavePath(const std::string& path) = 0;
+  /// Hard link; an existing target is an error, never overwritten. Symbolic links are not followed.
+  virtual std::error_code link(const std::string& source, const std::string& target) = 0;
+  /// Rename; across file systems a synced copy and then the removal, so that at every moment at
+  /// least one whole file exists. An existing target is an error.
+  virtual std::error_code move(const std::string& source, const std::string& target) = 0;
+  /// Copies a file, or a directory with all below it, with modes and modification times; symbolic
+  /// links as links. An existing target is an error.
+  virtual std::error_code copy(const std::string& source, const std::string& target) = 0;
+};
+
+}  // namespace zal

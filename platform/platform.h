@@ -1,0 +1,50 @@
+#pragma once
+
+#include "platform/agent_log.h"
+#include "platform/clock.h"
+#include "platform/configuration.h"
+#include "platform/crash_reporter.h"
+#include "platform/device_registry.h"
+#include "platform/file_placement.h"
+#include "platform/ipc_listener.h"
+#include "platform/local_notifications.h"
+#include "platform/log_facility.h"
+#include "platform/network_status.h"
+#include "platform/ping_test.h"
+#include "platform/preference_store.h"
+#include "platform/process_exit.h"
+#include "platform/process_table.h"
+#include "platform/run_loop.h"
+#include "platform/system_notifications.h"
+#include "platform/system_shell.h"
+#include "platform/telephony.h"
+#include "platform/work_queue.h"
+
+namespace zal {
+
+/// All host services in one hand. Borrowed: the entry owns every one and outlives every user.
+/// Classes ask their constructor only for those they use; this is for those that wire others.
+struct Platform {
+  const Configuration& configuration;
+  Clock& clock;
+  RunLoop& mainLoop;
+  WorkQueues& queues;
+  IpcService& ipc;
+  PreferenceStore& preferences;
+  SystemNotifications& systemNotifications;
+  LocalNotifications& localNotifications;
+  PlatformLogFacility& logFacility;
+  AgentLog& agentLog;
+  CrashReporter& crashReporter;
+  FilePlacement& files;
+  SystemShell& shell;
+  ProcessTable& processes;
+  DeviceRegistry& deviceRegistry;
+  SystemVersion& systemVersion;
+  NetworkStatus& networkStatus;
+  Telephony& telephony;
+  PingFacility& pings;
+  ProcessExit& processExit;
+};
+
+}  // namespace zal

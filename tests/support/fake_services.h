@@ -1,0 +1,208 @@
+#pragma once
+
+#include <map>
+#include <memory>
+#include <optional>
+#include <set>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "platform/agent_log.h"
+#include "platform/crash_reporter.h"
+#include "platform/device_registry.h"
+#include "platform/log_facility.h"
+#include "platform/network_status.h"
+#include "platform/preference_store.h"
+#include "platform/process_exit.h"
+#include "platform/process_table.h"
+#include "platform/system_notifications.h"
+#include "platform/system_shell.h"
+#include "platform/telephony.h"
+
+namespace zal::testing {
+
+/// Keeps every line as "log:CATEGORY: text", "notice: text", "warning: text" or
+/// "console:CATEGORY: text"; log lines only of enabled categories. Not for several threads.
+class RecordingAgentLog : public AgentLog {
+ public:
+  std::set<std::string, std::less<>> enabledCategories;
+  std::vector<std::string> lines;
+  int backtraces = 0;
+
+  [[nodiscard]] bool isEnabled(std::string_view category) const override {
+    return enabledCategories.contains(category);
+  }
+  void log(std::string_view category, std::string_view text) override {
+    if (isEnabled(category)) _add("log:" + std::string(category) + ": ", text);
+  }
+  void notice(std::string_view text) override { _add("notice: ", text); }
+  void warning(std::string_view text) override { _add("warning: ", text); }
+  void console(std::string_view category, std::string_view text) override {
+    _add("console:" + std::string(category) + ": ", text);
+  }
+  void backtrace() override { ++backtraces; }
+
+ private:
+  void _add(std::string prefix, std::string_view text) { lines.push_back(prefix.append(text)); }
+};
+
+class RecordingLogFacility : public PlatformLogFacility {
+ public:
+  struct Kept {
+    int level;
+    std::string type, category;
+    bool processInformation;
+    std::string line;
+    std::uint64_t time;
+    bool operator==(const Kept&) const = default;
+  };
+  std::vector<Kept> records;
+  int flushes = 0;
+  void record(const LogRecord& r) override {
+    records.push_back({r.level, std::string(r.type), std::string(r.category), r.processInformation,
+                       std::string(r.line), r.time});
+  }
+  void flush() override { ++flushes; }
+};
+
+class FakePreferences : public PreferenceStore {
+ public:
+  /// What is stored; visible to readers after the next synchronize.
+  std::map<std::string, bool, std::less<>> stored;
+  std::vector<std::string> readKeys;
+  int synchronizations = 0;
+  void synchronize(std::string_view /*domain*/) override {
+    ++synchronizations;
+    _current = stored;
+  }
+  [[nodiscard]] std::optional<bool> boolean(std::string_view domain, std::string_view key) override {
+    if (domain != "com.vendel.logging") return std::nullopt;
+    readKeys.emplace_back(key);
+    const auto found = _current.find(key);
+    if (found == _current.end()) return std::nullopt;
+    return found->second;
+  }
+
+ private:
+  std::map<std::string, bool, std::less<>> _current;
+};
+
+class FakeSystemNotifications : public SystemNotifications {
+ public:
+  std::vector<std::string> posts;
+  std::multimap<std::string, std::function<void()>, std::less<>> observers;
+  void observe(std::string name, std::function<void()> handler) override {
+    observers.emplace(std::move(name), std::move(handler));
+  }
+  void post(std::string_view name) override {
+    posts.emplace_back(name);
+    auto [first, last] = observers.equal_range(name);
+    for (; first != last; ++first) first->second();
+  }
+};
+
+class RecordingCrashReporter : public CrashReporter {
+ public:
+  struct Crash {
+    pid_t process;
+    std::uint32_t code;
+    std::string message;
+  };
+  bool available = true;
+  std::vector<Crash> crashes;
+  std::vector<std::string> exceptions, stackshots;
+  bool simulateCrash(pid_t process, std::uint32_t code, std::string_view message) override {
+    crashes.push_back({process, code, std::string(message)});
+    return available;
+  }
+  bool simulateCrashForException(std::string_view description) override {
+    exceptions.emplace_back(description);
+    return available;
+  }
+  bool stackshot(std::string_view reason) override {
+    stackshots.emplace_back(reason);
+    return available;
+  }
+};
+
+/// Keeps the lines; `respond` may do what the command would have done and gives the status.
+class ScriptedShell : public SystemShell {
+ public:
+  std::vector<std::string> commands;
+  std::function<int(const std::string&)> respond;
+  int PerformSystem(const std::string& commandLine) override {
+    commands.push_back(commandLine);
+    return respond ? respond(commandLine) : 0;
+  }
+};
+
+class FakeProcessTable : public ProcessTable {
+ public:
+  std::optional<std::vector<ProcessEntry>> table = std::vector<ProcessEntry>{};
+  mutable int reads = 0;
+  [[nodiscard]] std::optional<std::vector<ProcessEntry>> processes() const override {
+    ++reads;
+    return table;
+  }
+};
+
+class FakeDeviceRegistry : public DeviceRegistry {
+ public:
+  std::optional<std::string> bytes;
+  int reads = 0;
+  [[nodiscard]] std::optional<std::string> modelBytes() override {
+    ++reads;
+    return bytes;
+  }
+};
+
+class FakeSystemVersion : public SystemVersion {
+ public:
+  std::optional<std::map<std::string, std::string>> values;
+  int reads = 0;
+  [[nodiscard]] std::optional<std::map<std::string, std::string>> read() override {
+    ++reads;
+    return values;
+  }
+};
+
+class FakeNetworkStatus : public NetworkStatus {
+ public:
+  bool associated = false;
+  std::optional<Number> rssi, strength, rate;
+  [[nodiscard]] bool isWifiAssociated() override { return associated; }
+  [[nodiscard]] std::optional<Number> scaledRssi() override { return rssi; }
+  [[nodiscard]] std::optional<Number> signalStrength() override { return strength; }
+  [[nodiscard]] std::optional<Number> scaledRate() override { return rate; }
+};
+
+class FakeTelephony : public Telephony {
+ public:
+  bool reachable = false;
+  std::optional<CellularSignal> signal;
+  int open = 0;  ///< connections open right now
+  [[nodiscard]] std::unique_ptr<TelephonyConnection> connect() override {
+    if (!reachable) return nullptr;
+    return std::make_unique<Connection>(*this);
+  }
+
+ private:
+  class Connection : public TelephonyConnection {
+   public:
+    explicit Connection(FakeTelephony& owner) : _owner(owner) { ++_owner.open; }
+    ~Connection() override { --_owner.open; }
+    [[nodiscard]] std::optional<CellularSignal> signalStrength() override { return _owner.signal; }
+
+   private:
+    FakeTelephony& _owner;
+  };
+};
+
+class RecordingProcessExit : public ProcessExit {
+ public:
+  std::vector<int> exits;
+  void exit(int status) override { exits.push_back(status); }
+};
+
+}  // namespace zal::testing

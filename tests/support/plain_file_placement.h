@@ -1,0 +1,62 @@
+#pragma once
+
+#include <filesystem>
+#include <functional>
+#include <string>
+#include <utility>
+
+#include "platform/file_placement.h"
+
+namespace zal::testing {
+
+/// Real files through the standard library; no copying across file systems. `failWith` makes link,
+/// move and copy fail for the sources that it names an error for.
+class PlainFilePlacement : public FilePlacement {
+ public:
+  explicit PlainFilePlacement(std::string home) : _home(std::move(home)) {}
+  std::function<std::error_code(const std::string& source)> failWith;
+
+  [[nodiscard]] std::string homeDirectory() const override { return _home; }
+  [[nodiscard]] std::string randomTemporaryPath(std::string_view suffix) override {
+    return _home + "/temporary-" + std::to_string(++_counter) + std::string(suffix);
+  }
+  [[nodiscard]] std::optional<std::string> uniqueSavePath(const std::string& path) override {
+    const std::filesystem::path wanted(path);
+    std::filesystem::path candidate = wanted;
+    for (int number = 2; std::filesystem::exists(std::filesystem::symlink_status(candidate)); ++number) {
+      candidate = wanted.parent_path() /
+                  (wanted.stem().string() + "-" + std::to_string(number) + wanted.extension().string());
+    }
+    return candidate.string();
+  }
+  std::error_code link(const std::string& source, const std::string& target) override {
+    std::error_code error = _injected(source);
+    if (!error) std::filesystem::create_hard_link(source, target, error);
+    return error;
+  }
+  std::error_code move(const std::string& source, const std::string& target) override {
+    std::error_code error = _injected(source);
+    if (!error && std::filesystem::exists(target)) error = std::make_error_code(std::errc::file_exists);
+    if (!error) std::filesystem::rename(source, target, error);
+    return error;
+  }
+  std::error_code copy(const std::string& source, const std::string& target) override {
+    std::error_code error = _injected(source);
+    if (!error && std::filesystem::exists(target)) error = std::make_error_code(std::errc::file_exists);
+    if (!error) {
+      std::filesystem::copy(
+          source, target,
+          std::filesystem::copy_options::recursive | std::filesystem::copy_options::copy_symlinks, error);
+    }
+    return error;
+  }
+
+ private:
+  std::error_code _injected(const std::string& source) {
+    return failWith ? failWith(source) : std::error_code{};
+  }
+  std::string _home;
+  int _counter = 0;
+};
+
+}  // namespace zal::testing
