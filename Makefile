@@ -1,0 +1,97 @@
+# Everything a person does with this project, one word each. See README.md.
+
+BUILD := build
+JOBS := $(shell nproc 2>/dev/null || echo 2)
+CMAKE := cmake -Wno-dev
+# Seconds that each fuzzer runs; `make test` gives them a short turn.
+FUZZ_SECONDS ?= 120
+TEST_FUZZ_SECONDS ?= 10
+
+.PHONY: help demo test build bench fuzz lint format hooks install clean \
+	dependencies-build dependencies-test dependencies-bench dependencies-develop \
+	build-plain build-address build-thread test-plain test-address test-thread house-check fuzz-short bench-once
+
+help:
+	@sed -n 's/^## //p' Makefile
+
+## make demo     a real call through the real agent, from nothing to its log files
+demo: build
+	scripts/demo $(BUILD)
+
+## make build    the programs, in build/bin
+build: dependencies-build
+	$(CMAKE) -S . -B $(BUILD) -DCMAKE_BUILD_TYPE=Release -DZAL_TESTS=OFF -DZAL_BENCH=OFF
+	$(CMAKE) --build $(BUILD) -j $(JOBS)
+
+## make test     all tests: plain, address and undefined sanitizers, thread sanitizer, a short fuzz run
+test: dependencies-build dependencies-test
+	$(MAKE) --no-print-directory house-check
+	$(MAKE) --no-print-directory test-plain
+	$(MAKE) --no-print-directory test-address
+	$(MAKE) --no-print-directory test-thread
+	$(MAKE) --no-print-directory fuzz-short
+
+house-check:
+	python3 scripts/house_check.py
+
+build-plain:
+	$(CMAKE) -S . -B $(BUILD)/plain -DCMAKE_BUILD_TYPE=Release -DZAL_TESTS=ON
+	$(CMAKE) --build $(BUILD)/plain -j $(JOBS)
+
+# clang here and GCC in the other two: both compilers read every line.
+build-address:
+	$(CMAKE) -S . -B $(BUILD)/address -DCMAKE_BUILD_TYPE=Debug -DZAL_TESTS=ON -DZAL_FUZZ=ON \
+		-DZAL_SANITIZE=address,undefined -DCMAKE_C_COMPILER=clang -DCMAKE_CXX_COMPILER=clang++ \
+		-DCMAKE_CXX_FLAGS_DEBUG="-O1 -g1"
+	$(CMAKE) --build $(BUILD)/address -j $(JOBS)
+
+build-thread:
+	$(CMAKE) -S . -B $(BUILD)/thread -DCMAKE_BUILD_TYPE=Debug -DZAL_TESTS=ON \
+		-DZAL_SANITIZE=thread -DCMAKE_CXX_FLAGS_DEBUG="-O1 -g1"
+	$(CMAKE) --build $(BUILD)/thread -j $(JOBS)
+
+test-plain: build-plain
+	cd $(BUILD)/plain && ctest --output-on-failure -j $(JOBS)
+
+test-address: build-address
+	cd $(BUILD)/address && UBSAN_OPTIONS=print_stacktrace=1 ctest --output-on-failure -j $(JOBS)
+
+test-thread: build-thread
+	cd $(BUILD)/thread && TSAN_OPTIONS="halt_on_error=1 second_deadlock_stack=1" ctest --output-on-failure -j $(JOBS)
+
+fuzz-short: build-address
+	scripts/fuzz $(BUILD)/address $(TEST_FUZZ_SECONDS)
+
+## make fuzz     the fuzzers, FUZZ_SECONDS each (120)
+fuzz: dependencies-build dependencies-test build-address
+	scripts/fuzz $(BUILD)/address $(FUZZ_SECONDS)
+
+## make bench    the benchmarks against their peers, one table at the end
+bench: dependencies-build dependencies-test dependencies-bench
+	$(CMAKE) -S . -B $(BUILD)/bench -DCMAKE_BUILD_TYPE=Release -DZAL_TESTS=OFF -DZAL_BENCH=ON
+	$(CMAKE) --build $(BUILD)/bench -j $(JOBS)
+	bench/run $(BUILD)/bench/bin
+
+## make lint     clang-tidy and the format check over the whole tree
+lint: dependencies-build dependencies-develop build-plain
+	git ls-files '*.cpp' '*.h' '*.hpp' | xargs clang-format --dry-run -Werror
+	git ls-files 'platform/*.cpp' 'collectors/*.cpp' 'session/*.cpp' 'agent/*.cpp' 'client/*.cpp' 'cli/*.cpp' \
+		| xargs -P $(JOBS) -n 4 clang-tidy -p $(BUILD)/plain --quiet
+
+## make format   lays out the sources as .clang-format says
+format: dependencies-develop
+	git ls-files '*.cpp' '*.h' '*.hpp' | xargs clang-format -i
+
+## make hooks    installs the commit hook: format, house check
+hooks: dependencies-develop
+	install -m 755 scripts/pre-commit "$$(git rev-parse --git-path hooks)/pre-commit"
+
+## make install  the programs, library, headers and unit files; DESTDIR and PREFIX as usual
+install: build
+	$(CMAKE) --install $(BUILD) --prefix $(or $(PREFIX),/usr/local)
+
+clean:
+	rm -rf $(BUILD)
+
+dependencies-%:
+	@scripts/install-dependencies $*
