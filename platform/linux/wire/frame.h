@@ -40,7 +40,10 @@ inline constexpr std::uint32_t kDefaultMaximumPayload = 16U << 20U;
   return kFrameHeaderSize + ((payload + 7U) & ~std::size_t{7});
 }
 
-/// Appends header, payload and padding.
+/// Writes the 16 bytes as they are, `length` included.
+void storeFrameHeader(char* to, const FrameHeader& header);
+
+/// Appends header, payload and padding. `length` is set from the payload.
 void appendFrame(std::string& out, const FrameHeader& header, std::string_view payload);
 
 }  // namespace zal
