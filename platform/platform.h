@@ -6,6 +6,7 @@
 #include "platform/crash_reporter.h"
 #include "platform/device_registry.h"
 #include "platform/file_placement.h"
+#include "platform/host_signals.h"
 #include "platform/ipc_listener.h"
 #include "platform/local_notifications.h"
 #include "platform/log_facility.h"
@@ -45,6 +46,7 @@ struct Platform {
   Telephony& telephony;
   PingFacility& pings;
   ProcessExit& processExit;
+  HostSignals& hostSignals;
 };
 
 }  // namespace zal
