@@ -1,0 +1,12 @@
+#pragma once
+
+#include <string>
+#include <system_error>
+
+namespace zal {
+
+/// Reads a whole small regular file; never waits on a pipe or device that stands in its place.
+/// Returned: an error for what is missing, unreadable, no regular file, or larger than 1 MiB.
+[[nodiscard]] std::error_code readTextFile(const std::string& path, std::string& content);
+
+}  // namespace zal

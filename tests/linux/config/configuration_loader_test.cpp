@@ -1,0 +1,249 @@
+#include "platform/linux/config/configuration_loader.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <set>
+
+#include "tests/support/temporary_directory.h"
+
+namespace zal {
+namespace {
+
+using ::testing::ElementsAre;
+using ::testing::IsEmpty;
+using testing::TemporaryDirectory;
+using testing::writeFile;
+
+class ConfigurationLoaderTest : public ::testing::Test {
+ protected:
+  ConfigurationLoaderTest() {
+    environment.userId = 1000;
+    environment.homeDirectory = "/home/ann";
+    environment.variables["LIRRA_CONFIG"] = file;
+  }
+  LoadedConfiguration load() const { return ConfigurationLoader(environment).load(); }
+  LoadedConfiguration load(const std::string& text) const {
+    writeFile(file, text);
+    return load();
+  }
+
+  TemporaryDirectory directory;
+  const std::string file = directory / "lirra.toml";
+  HostEnvironment environment;
+};
+
+TEST_F(ConfigurationLoaderTest, AnEmptyFileLeavesTheDefaults) {
+  const auto loaded = load("");
+  EXPECT_THAT(loaded.warnings, IsEmpty());
+  EXPECT_EQ(loaded.file, file);
+  EXPECT_EQ(loaded.configuration.log.rotationSize, 4'194'304U);
+  EXPECT_EQ(loaded.configuration.log.maximumOpenFiles, 64U);
+  EXPECT_EQ(loaded.configuration.ipc.maximumPayload, 16'777'216U);
+  EXPECT_EQ(loaded.configuration.ipc.maximumReplyBacklog, 1'048'576U);
+  EXPECT_EQ(loaded.configuration.inactivityLimit, std::chrono::milliseconds{360'000});
+  EXPECT_EQ(loaded.configuration.roots.UserLogRoot, "/home/ann/.local/state/lirra/Logs");
+}
+
+TEST_F(ConfigurationLoaderTest, WithoutAnyFileTheDefaultsStandAndNothingIsSaid) {
+  environment.variables.clear();
+  environment.variables["XDG_CONFIG_HOME"] = directory / "config";
+  const auto loaded = load();
+  EXPECT_THAT(loaded.warnings, IsEmpty());
+  EXPECT_EQ(loaded.file, "");
+  EXPECT_EQ(loaded.configuration.roots.TemporaryRoot, "/tmp");
+}
+
+TEST_F(ConfigurationLoaderTest, FindsTheFileInTheUsersConfigurationDirectory) {
+  environment.variables.clear();
+  environment.variables["XDG_CONFIG_HOME"] = directory / "config";
+  writeFile(directory / "config/lirra/lirra.toml", "[ipc]\ngroup = \"calls\"\n");
+  const auto loaded = load();
+  EXPECT_EQ(loaded.file, directory / "config/lirra/lirra.toml");
+  EXPECT_EQ(loaded.configuration.ipc.group, "calls");
+}
+
+TEST_F(ConfigurationLoaderTest, EveryKeyReachesItsField) {
+  const auto loaded = load(R"(
+[roots]
+UserLogRoot = "/r/user"
+MobileLogRoot = "/r/mobile"
+DiagnosticReportRoot = "/r/reports"
+WirelessLogRoot = "/r/wireless"
+WirelessReportRoot = "/r/wirelessreports"
+RootReportRoot = "/r/root"
+SystemLogRoot = "/r/system"
+SystemReportRoot = "/r/systemreports"
+NetworkConfigRoot = "/r/network"
+TemporaryRoot = "/r/tmp"
+UartLogFile = "/r/uart.log"
+VarLogRoot = "/r/varlog"
+RuntimeRoot = "/r/run"
+[endpoints]
+reportHost = "report.example"
+cellPingServer = "192.0.2.1"
+wifiPingServer = "192.0.2.2"
+[interfaces]
+wifi = "wlp3s0"
+cellular = "wwp0"
+[ipc]
+group = "calls"
+maximumPayload = 2048
+maximumReplyBacklog = 4096
+[log]
+categories = ["IPC", "Ping"]
+rotationSize = 1024
+maximumOpenFiles = 2
+[device]
+SystemVersionFile = "/r/version.plist"
+[testing]
+inactivityLimit = 1.5
+)");
+  EXPECT_THAT(loaded.warnings, IsEmpty());
+  const auto& c = loaded.configuration;
+  EXPECT_EQ(c.roots.UserLogRoot, "/r/user");
+  EXPECT_EQ(c.roots.MobileLogRoot, "/r/mobile");
+  EXPECT_EQ(c.roots.DiagnosticReportRoot, "/r/reports");
+  EXPECT_EQ(c.roots.WirelessLogRoot, "/r/wireless");
+  EXPECT_EQ(c.roots.WirelessReportRoot, "/r/wirelessreports");
+  EXPECT_EQ(c.roots.RootReportRoot, "/r/root");
+  EXPECT_EQ(c.roots.SystemLogRoot, "/r/system");
+  EXPECT_EQ(c.roots.SystemReportRoot, "/r/systemreports");
+  EXPECT_EQ(c.roots.NetworkConfigRoot, "/r/network");
+  EXPECT_EQ(c.roots.TemporaryRoot, "/r/tmp");
+  EXPECT_EQ(c.roots.UartLogFile, "/r/uart.log");
+  EXPECT_EQ(c.roots.VarLogRoot, "/r/varlog");
+  EXPECT_EQ(c.roots.RuntimeRoot, "/r/run");
+  EXPECT_EQ(c.endpoints.reportServer, "report.example");
+  EXPECT_EQ(c.endpoints.cellPingServer, "192.0.2.1");
+  EXPECT_EQ(c.endpoints.wifiPingServer, "192.0.2.2");
+  EXPECT_EQ(c.interfaces.wifi, "wlp3s0");
+  EXPECT_EQ(c.interfaces.cellular, "wwp0");
+  EXPECT_EQ(c.ipc.group, "calls");
+  EXPECT_EQ(c.ipc.maximumPayload, 2048U);
+  EXPECT_EQ(c.ipc.maximumReplyBacklog, 4096U);
+  EXPECT_THAT(c.log.categories, ElementsAre("IPC", "Ping"));
+  EXPECT_EQ(c.log.rotationSize, 1024U);
+  EXPECT_EQ(c.log.maximumOpenFiles, 2U);
+  EXPECT_EQ(c.systemVersionFile, "/r/version.plist");
+  EXPECT_EQ(c.inactivityLimit, std::chrono::milliseconds{1500});
+}
+
+TEST_F(ConfigurationLoaderTest, UnknownKeysAndWrongTypesAreNamedByLineAndTheOthersStand) {
+  const auto loaded = load(R"([roots]
+UserLogRoot = "relative/logs"
+SystemLogRoot = ""
+NetworkConfigRoot = 7
+Surprise = "/x"
+
+[log]
+rotationSize = "big"
+maximumOpenFiles = 0
+categories = ["IPC", 3]
+
+[ipc]
+maximumPayload = 2147483648
+group = "calls"
+
+[colours]
+red = true
+)");
+  EXPECT_THAT(loaded.warnings,
+              ElementsAre(file + ":2: roots.UserLogRoot must be an absolute path, not \"relative/logs\"",
+                          file + ":3: roots.SystemLogRoot is empty, but must be an absolute path",
+                          file + ":4: roots.NetworkConfigRoot wants a path in quotes",
+                          file + ":5: unknown key roots.Surprise",
+                          file + ":8: log.rotationSize wants a whole number from 1024 to 1073741824",
+                          file + ":9: log.maximumOpenFiles wants a whole number from 1 to 65536",
+                          file + ":10: log.categories wants a list of texts in quotes",
+                          file + ":13: ipc.maximumPayload wants a whole number from 1024 to 1073741824",
+                          file + ":16: unknown section [colours]"));
+  EXPECT_EQ(loaded.configuration.ipc.group, "calls");
+  EXPECT_EQ(loaded.configuration.roots.UserLogRoot, "/home/ann/.local/state/lirra/Logs");
+  EXPECT_EQ(loaded.configuration.log.rotationSize, 4'194'304U);
+  EXPECT_THAT(loaded.configuration.log.categories, IsEmpty());
+}
+
+TEST_F(ConfigurationLoaderTest, AKeyOutsideAnySectionAndASectionThatIsNoneAreNamed) {
+  const auto loaded = load("rotationSize = 4\nlog = 5\n");
+  EXPECT_THAT(loaded.warnings,
+              ElementsAre(file + ":1: unknown key rotationSize", file + ":2: log must be a section"));
+}
+
+TEST_F(ConfigurationLoaderTest, ABrokenFileLeavesTheDefaultsAndNamesTheLine) {
+  const auto loaded = load("[ipc]\ngroup = \"calls\"\n[log\n");
+  ASSERT_EQ(loaded.warnings.size(), 1U);
+  EXPECT_TRUE(loaded.warnings[0].starts_with(file + ":3: ")) << loaded.warnings[0];
+  EXPECT_EQ(loaded.configuration.ipc.group, "");
+  EXPECT_EQ(loaded.configuration.roots.UserLogRoot, "/home/ann/.local/state/lirra/Logs");
+}
+
+TEST_F(ConfigurationLoaderTest, AMissingNamedFileIsSaid) {
+  EXPECT_THAT(load().warnings, ElementsAre(file + ":1: cannot be read: No such file or directory"));
+}
+
+TEST_F(ConfigurationLoaderTest, ADirectoryInThePlaceOfTheFileIsSaid) {
+  std::filesystem::create_directory(file);
+  EXPECT_THAT(load().warnings, ElementsAre(file + ":1: cannot be read: Is a directory"));
+}
+
+TEST_F(ConfigurationLoaderTest, AnEndlessFileIsNotReadToItsEnd) {
+  const auto loaded = load("# " + std::string(1U << 20U, 'x'));
+  EXPECT_THAT(loaded.warnings, ElementsAre(file + ":1: cannot be read: File too large"));
+}
+
+TEST_F(ConfigurationLoaderTest, RootsThatFollowAnotherRootMoveWithIt) {
+  const auto roots = load("[roots]\nUserLogRoot = \"/logs\"\nSystemLogRoot = \"/sys\"\n").configuration.roots;
+  EXPECT_EQ(roots.MobileLogRoot, "/logs");
+  EXPECT_EQ(roots.DiagnosticReportRoot, "/logs/DiagnosticReports");
+  EXPECT_EQ(roots.SystemReportRoot, "/sys/DiagnosticReports");
+}
+
+TEST_F(ConfigurationLoaderTest, AHomeMarkIsExpandedAndTrailingSlashesGo) {
+  const auto roots = load("[roots]\nUserLogRoot = \"~/logs//\"\nVarLogRoot = \"~\"\n").configuration.roots;
+  EXPECT_EQ(roots.UserLogRoot, "/home/ann/logs");
+  EXPECT_EQ(roots.VarLogRoot, "/home/ann");
+}
+
+TEST_F(ConfigurationLoaderTest, CategoriesOfTheEnvironmentAreAddedOnce) {
+  environment.variables["LIRRA_LOG_CATEGORIES"] = "IPC, Ping,,Logging ,Ping";
+  EXPECT_THAT(load("[log]\ncategories = [\"IPC\"]\n").configuration.log.categories,
+              ElementsAre("IPC", "Ping", "Logging"));
+}
+
+TEST_F(ConfigurationLoaderTest, TheInactivityLimitMayBeAWholeNumberOfSeconds) {
+  EXPECT_EQ(load("[testing]\ninactivityLimit = 2\n").configuration.inactivityLimit,
+            std::chrono::milliseconds{2000});
+}
+
+TEST_F(ConfigurationLoaderTest, AnInactivityLimitOfNothingIsRefused) {
+  for (const char* value : {"0", "-1.0", "nan", "inf", "\"6\"", "true"}) {
+    const auto loaded = load(std::string("[testing]\ninactivityLimit = ") + value + "\n");
+    EXPECT_THAT(
+        loaded.warnings,
+        ElementsAre(file + ":2: testing.inactivityLimit wants a number of seconds from 0.001 to 31536000"))
+        << value;
+    EXPECT_EQ(loaded.configuration.inactivityLimit, std::chrono::milliseconds{360'000});
+  }
+}
+
+/// The keys that a row of a table in the document begins with.
+std::set<std::string> documentedKeys() {
+  const auto document = std::filesystem::path(__FILE__).parent_path() / "../../../docs/configuration.md";
+  std::ifstream text(document);
+  std::set<std::string> keys;
+  for (std::string line; std::getline(text, line);) {
+    if (!line.starts_with("| `")) continue;
+    const std::string key = line.substr(3, line.find('`', 3) - 3);
+    if (key.find('.') != std::string::npos) keys.insert(key);
+  }
+  return keys;
+}
+
+TEST(ConfigurationDocumentTest, ListsExactlyTheKeysThatTheLoaderKnows) {
+  const auto known = ConfigurationLoader::knownKeys();
+  EXPECT_EQ(documentedKeys(), std::set<std::string>(known.begin(), known.end()));
+}
+
+}  // namespace
+}  // namespace zal
