@@ -3,8 +3,8 @@
 namespace zal::testing {
 
 void ManualRunLoop::run() {
-  _stopped = false;
   drain();
+  _stopped = false;
 }
 
 void ManualRunLoop::post(Task task) {

@@ -16,7 +16,8 @@ namespace zal::testing {
 /// ahead of UTC and called CEST unless a test sets another.
 class ManualRunLoop : public RunLoop, public Clock {
  public:
-  // RunLoop. run() runs what is posted until nothing is left or stop() was called.
+  // RunLoop. run() runs what is posted until nothing is left or stop() was called; a stop()
+  // that came before makes it return at once.
   void run() override;
   void stop() override { _stopped = true; }
   void post(Task task) override;

@@ -1,0 +1,68 @@
+#include "platform/linux/loop/linux_clock.h"
+
+#include <time.h>
+
+#include <atomic>
+
+namespace zal {
+
+namespace {
+
+// Counts the zones that were in force, so that no thread answers from one that is gone.
+std::atomic<unsigned> zoneGeneration{0};
+
+struct LastSecond {
+  std::chrono::sys_seconds second;
+  unsigned generation = 0;
+  LocalTime time;
+};
+
+LocalTime takeApart(std::chrono::sys_seconds second) {
+  const time_t seconds = second.time_since_epoch().count();
+  tm parts{};
+  LocalTime result;
+  if (::localtime_r(&seconds, &parts) == nullptr) return result;
+  result.year = parts.tm_year + 1900;
+  result.month = parts.tm_mon + 1;
+  result.day = parts.tm_mday;
+  result.hour = parts.tm_hour;
+  result.minute = parts.tm_min;
+  result.second = parts.tm_sec;
+  return result;
+}
+
+}  // namespace
+
+LinuxClock::LinuxClock() {
+  ::tzset();
+  zoneGeneration.fetch_add(1);
+}
+
+SteadyTime LinuxClock::steadyNow() const { return std::chrono::steady_clock::now(); }
+
+WallTime LinuxClock::wallNow() const {
+  return std::chrono::floor<std::chrono::microseconds>(std::chrono::system_clock::now());
+}
+
+LocalTime LinuxClock::localTime(WallTime moment) const {
+  // localtime_r takes a lock of the whole process and walks the zone's rules.
+  thread_local LastSecond last;
+  const auto second = std::chrono::floor<std::chrono::seconds>(moment);
+  const unsigned generation = zoneGeneration.load(std::memory_order_relaxed);
+  if (last.generation != generation || last.second != second) {
+    last = {second, generation, takeApart(second)};
+  }
+  LocalTime result = last.time;
+  result.millisecond =
+      static_cast<int>(std::chrono::floor<std::chrono::milliseconds>(moment - second).count());
+  return result;
+}
+
+std::string LinuxClock::zoneAbbreviation() const {
+  const time_t now = std::chrono::system_clock::to_time_t(std::chrono::system_clock::now());
+  tm parts{};
+  if (::localtime_r(&now, &parts) == nullptr || parts.tm_zone == nullptr) return {};
+  return parts.tm_zone;
+}
+
+}  // namespace zal

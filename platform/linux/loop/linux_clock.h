@@ -1,0 +1,19 @@
+#pragma once
+
+#include "platform/clock.h"
+
+namespace zal {
+
+/// The kernel's clocks and the C library's time zone. Any thread. The zone is the one in force when
+/// the clock was made; what follows from it (summer time) changes by itself.
+class LinuxClock : public Clock {
+ public:
+  LinuxClock();
+  [[nodiscard]] SteadyTime steadyNow() const override;
+  [[nodiscard]] WallTime wallNow() const override;
+  /// Cheap for moments of one second in a row: each thread keeps the last second taken apart.
+  [[nodiscard]] LocalTime localTime(WallTime moment) const override;
+  [[nodiscard]] std::string zoneAbbreviation() const override;
+};
+
+}  // namespace zal
