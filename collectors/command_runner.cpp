@@ -1,0 +1,36 @@
+#include "collectors/command_runner.h"
+
+#include "platform/system_shell.h"
+
+namespace zal {
+namespace {
+
+// Directories carry client text (a session type), which must stay text between the quotes.
+std::string insideQuotes(std::string_view text) {
+  std::string escaped;
+  escaped.reserve(text.size());
+  for (const char c : text) {
+    if (c == '"' || c == '\\' || c == '$' || c == '`') escaped += '\\';
+    escaped += c;
+  }
+  return escaped;
+}
+
+std::string redirected(std::string_view commandLine, std::string_view directory, std::string_view fileName) {
+  return std::string(commandLine) + " > \"" + insideQuotes(directory) + "/" + insideQuotes(fileName) +
+         "\"  2>&1";
+}
+
+}  // namespace
+
+void CommandRunner::RunCommandInBackground(std::string_view commandLine, std::string_view directory,
+                                           std::string_view fileName) {
+  _shell.PerformSystem(redirected(commandLine, directory, fileName) + " &");
+}
+
+void CommandRunner::RunCommandAndWait(std::string_view commandLine, std::string_view directory,
+                                      std::string_view fileName) {
+  _shell.PerformSystem(redirected(commandLine, directory, fileName));
+}
+
+}  // namespace zal

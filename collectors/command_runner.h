@@ -1,0 +1,28 @@
+#pragma once
+
+#include <string>
+#include <string_view>
+
+namespace zal {
+
+class SystemShell;
+
+/// Runs the command lines of the collectors, each with its output and errors in one file of a
+/// directory. The command line goes to the shell as it is, pipes and all; what a command does or
+/// says is seen in its output file alone. Any thread; keeps no state.
+class CommandRunner {
+ public:
+  explicit CommandRunner(SystemShell& shell) : _shell(shell) {}
+
+  /// Returns at once; the command goes on by itself, even when this process ends. The directory
+  /// must exist; the file is created or truncated.
+  void RunCommandInBackground(std::string_view commandLine, std::string_view directory,
+                              std::string_view fileName);
+  /// The same, but returns when the command has finished.
+  void RunCommandAndWait(std::string_view commandLine, std::string_view directory, std::string_view fileName);
+
+ private:
+  SystemShell& _shell;
+};
+
+}  // namespace zal

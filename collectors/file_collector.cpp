@@ -1,0 +1,82 @@
+#include "collectors/file_collector.h"
+
+#include <filesystem>
+
+#include "collectors/directory_listing.h"
+#include "platform/file_placement.h"
+#include "platform/open_directories.h"
+#include "platform/standard_path.h"
+
+namespace zal {
+namespace {
+
+bool fileExists(const std::string& path) {
+  std::error_code error;
+  return std::filesystem::exists(path, error);
+}
+
+void makeParent(const std::string& target) {
+  const std::string parent = std::filesystem::path(target).parent_path().string();
+  if (!fileExists(parent)) createDirectoriesWithMode0777(parent);
+}
+
+std::string nameOf(const std::string& path) { return std::filesystem::path(path).filename().string(); }
+
+}  // namespace
+
+std::string FileCollector::_resolved(const std::string& path) const {
+  return resolveAndStandardize(path, _files.homeDirectory());
+}
+
+bool FileCollector::LinkFileIntoDirectory(const std::string& source, const std::string& directory,
+                                          const std::string& suffix) {
+  const std::string resolved = _resolved(source);
+  const std::string target = directory + "/" + nameOf(resolved) + suffix;
+  if (!fileExists(resolved)) return false;
+  makeParent(target);
+  return !_files.link(resolved, target);
+}
+
+bool FileCollector::_linkEntry(const std::string& sourceDirectory, const std::string& name,
+                               const std::string& directory) {
+  return LinkFileIntoDirectory(sourceDirectory + "/" + name, directory, "");
+}
+
+bool FileCollector::LinkDirectoryEntriesWithPrefix(const std::string& sourceDirectory,
+                                                   const std::string& prefix, const std::string& directory) {
+  bool result = true;
+  const auto names = listDirectory(_resolved(sourceDirectory), HiddenEntries::listed);
+  if (!names) return result;
+  for (const auto& name : *names) {
+    if (name.starts_with(prefix)) result = _linkEntry(sourceDirectory, name, directory) && result;
+  }
+  return result;
+}
+
+bool FileCollector::LinkDirectoryEntriesWithSuffix(const std::string& sourceDirectory,
+                                                   const std::string& suffix, const std::string& directory) {
+  bool result = true;
+  const auto names = listDirectory(sourceDirectory, HiddenEntries::listed);
+  if (!names) return result;
+  for (const auto& name : *names) {
+    if (name.ends_with(suffix)) result = _linkEntry(sourceDirectory, name, directory) && result;
+  }
+  return result;
+}
+
+bool FileCollector::MoveFileIntoDirectory(const std::string& source, const std::string& directory,
+                                          const std::string& suffix) {
+  const std::string resolved = _resolved(source);
+  const std::string name = nameOf(resolved);
+  const std::string wanted = directory + "/" + name + suffix;
+  const auto target = _files.uniqueSavePath(wanted);
+  if (name.empty() || !fileExists(resolved)) return false;  // "/" has no name to go under
+  makeParent(target.value_or(wanted));
+  if (target) return !_files.move(resolved, *target);
+  // Without a free name it goes all the same: what was asked for is that it no longer lies there.
+  std::error_code ignored;
+  std::filesystem::remove(resolved, ignored);
+  return true;
+}
+
+}  // namespace zal

@@ -1,0 +1,56 @@
+#include "collectors/rotated_log_sets.h"
+
+#include <filesystem>
+#include <string_view>
+#include <system_error>
+
+#include "collectors/file_collector.h"
+#include "platform/agent_log.h"
+#include "platform/directory_roots.h"
+#include "platform/open_directories.h"
+
+namespace zal {
+namespace {
+
+// What follows the set's name, in the order of linking.
+constexpr std::string_view kRecent[] = {"-Event.log", "-Event.log.1.zip", ".log",
+                                        ".log.1.zip", ".log.2.zip",       ".log.3.zip"};
+// The first event generation stands in both lists: a second link to a taken name changes nothing.
+constexpr std::string_view kOlder[] = {
+    "-Event.log.1.zip", "-Event.log.2.zip", "-Event.log.3.zip", "-Event.log.4.zip", "-Event.log.5.zip",
+    "-Event.log.6.zip", "-Event.log.7.zip", "-Event.log.8.zip", "-Event.log.9.zip", ".log.4.zip",
+    ".log.5.zip",       ".log.6.zip",       ".log.7.zip",       ".log.8.zip",       ".log.9.zip"};
+
+bool isPlainName(const std::string& name) {
+  return name != "." && name != ".." && name.find('/') == std::string::npos &&
+         name.find('\0') == std::string::npos;
+}
+
+}  // namespace
+
+void LinkRotatedLogSets(FileCollector& collector, const DirectoryRoots& roots, AgentLog& log,
+                        const std::vector<std::string>& names, const std::string& destination,
+                        bool includeAllGenerations) {
+  std::error_code error;
+  if (!std::filesystem::exists(destination, error)) createDirectoriesWithMode0777(destination);
+  for (const auto& name : names) {
+    if (!isPlainName(name)) {
+      log.warning("Refused the log set \"" + name + "\": its name leads out of the log directory");
+      continue;
+    }
+    const auto link = [&](std::string_view ending) {
+      collector.LinkFileIntoDirectory((roots.UserLogRoot + "/" + name + "/" + name).append(ending),
+                                      destination + "/" + name, "");
+    };
+    for (const auto ending : kRecent) link(ending);
+    if (!includeAllGenerations) continue;
+    for (const auto ending : kOlder) link(ending);
+  }
+}
+
+void LinkRecentLogSets(FileCollector& collector, const DirectoryRoots& roots, AgentLog& log,
+                       const std::vector<std::string>& names, const std::string& destination) {
+  LinkRotatedLogSets(collector, roots, log, names, destination, false);
+}
+
+}  // namespace zal
