@@ -1,26 +1,14 @@
 #include "platform/linux/wire/frame.h"
 
-#include <bit>
+#include "platform/linux/wire/little_endian.h"
 
 namespace zal {
-namespace {
-
-template <class Unsigned>
-void storeLittle(char* to, Unsigned value) {
-  if constexpr (std::endian::native == std::endian::little) {
-    std::memcpy(to, &value, sizeof value);
-  } else {
-    for (std::size_t i = 0; i < sizeof value; ++i) to[i] = static_cast<char>(value >> (8 * i));
-  }
-}
-
-}  // namespace
 
 void storeFrameHeader(char* to, const FrameHeader& header) {
-  storeLittle(to, header.length);
-  storeLittle(to + 4, header.version);
-  storeLittle(to + 6, static_cast<std::uint16_t>(header.kind));
-  storeLittle(to + 8, header.cookie);
+  storeLittle(to, header.length, 4);
+  storeLittle(to + 4, header.version, 2);
+  storeLittle(to + 6, static_cast<std::uint16_t>(header.kind), 2);
+  storeLittle(to + 8, header.cookie, 8);
 }
 
 void appendFrame(std::string& out, const FrameHeader& header, std::string_view payload) {

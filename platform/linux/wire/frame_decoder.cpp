@@ -1,26 +1,14 @@
 #include "platform/linux/wire/frame_decoder.h"
 
 #include <algorithm>
-#include <bit>
+
+#include "platform/linux/wire/little_endian.h"
 
 namespace zal {
 namespace {
 
 /// One large frame must not leave its buffer behind for the life of the connection.
 constexpr std::size_t kKeptCapacity = 64U << 10U;
-
-template <class Unsigned>
-Unsigned loadLittle(const char* from) {
-  Unsigned value = 0;
-  if constexpr (std::endian::native == std::endian::little) {
-    std::memcpy(&value, from, sizeof value);
-  } else {
-    for (std::size_t i = 0; i < sizeof value; ++i) {
-      value = static_cast<Unsigned>(value | (Unsigned{static_cast<unsigned char>(from[i])} << (8 * i)));
-    }
-  }
-  return value;
-}
 
 }  // namespace
 
@@ -68,9 +56,9 @@ bool FrameDecoder::_completeRest(std::size_t wanted) {
 }
 
 bool FrameDecoder::_readHeader(const char* bytes) {
-  const auto length = loadLittle<std::uint32_t>(bytes);
-  const auto version = loadLittle<std::uint16_t>(bytes + 4);
-  const auto kind = loadLittle<std::uint16_t>(bytes + 6);
+  const auto length = static_cast<std::uint32_t>(loadLittle(bytes, 4));
+  const auto version = static_cast<std::uint16_t>(loadLittle(bytes + 4, 2));
+  const auto kind = static_cast<std::uint16_t>(loadLittle(bytes + 6, 2));
   if (version != kProtocolVersion) {
     _failure = "unknown protocol version " + std::to_string(version);
   } else if (kind > static_cast<std::uint16_t>(FrameKind::barrierPassed)) {
@@ -86,7 +74,7 @@ bool FrameDecoder::_readHeader(const char* bytes) {
     std::string().swap(_rest);
     return false;
   }
-  _header = {length, version, static_cast<FrameKind>(kind), loadLittle<std::uint64_t>(bytes + 8)};
+  _header = {length, version, static_cast<FrameKind>(kind), loadLittle(bytes + 8, 8)};
   return true;
 }
 

@@ -7,6 +7,7 @@
 
 #include <flatbuffers/flexbuffers.h>
 
+#include "platform/linux/wire/little_endian.h"
 #include "platform/linux/wire/scalar_blob.h"
 
 namespace zal {
@@ -19,14 +20,6 @@ constexpr std::size_t alignedTo(std::size_t position, std::size_t width) {
 }
 
 BitWidth widthOf(std::uint64_t value) { return flexbuffers::WidthU(value); }
-
-void storeAt(char* to, std::uint64_t value, std::size_t width) {
-  if constexpr (std::endian::native == std::endian::little) {
-    std::memcpy(to, &value, width);
-  } else {
-    for (std::size_t i = 0; i < width; ++i) to[i] = static_cast<char>(value >> (8 * i));
-  }
-}
 
 /// One entry of the root map. Values that do not fit into the map itself lie in the data before it.
 struct Field {
@@ -63,7 +56,7 @@ struct MessageBuilder::State {
     const std::size_t length = alignedTo(data.size(), byteWidth);
     const std::size_t start = length + byteWidth;
     data.resize(start);
-    storeAt(data.data() + length, bytes.size(), byteWidth);
+    storeLittle(data.data() + length, bytes.size(), byteWidth);
     data.append(bytes);
     if (type == flexbuffers::FBT_STRING) data.push_back('\0');
     add({key, start, flexbuffers::PackedType(width, type)});
@@ -187,24 +180,24 @@ std::size_t MessageBuilder::finish(std::string& out, FrameKind kind, std::uint64
   char* const payload = out.data() + start + kFrameHeaderSize;
 
   if (keysStart != 0) std::memcpy(payload, state.data.data(), keysStart);
-  storeAt(payload + table - tableBytes, count, tableBytes);
-  storeAt(payload + map - 3 * mapBytes, map - 3 * mapBytes - table, mapBytes);
-  storeAt(payload + map - 2 * mapBytes, tableBytes, mapBytes);
-  storeAt(payload + map - mapBytes, count, mapBytes);
+  storeLittle(payload + table - tableBytes, count, tableBytes);
+  storeLittle(payload + map - 3 * mapBytes, map - 3 * mapBytes - table, mapBytes);
+  storeLittle(payload + map - 2 * mapBytes, tableBytes, mapBytes);
+  storeLittle(payload + map - mapBytes, count, mapBytes);
   std::size_t keyAt = keysStart;
   std::size_t tableAt = table;
   std::size_t mapAt = map;
   char* type = payload + types;
   for (const Field& field : state.fields) {
     std::memcpy(payload + keyAt, field.key.data(), field.key.size());
-    storeAt(payload + tableAt, tableAt - keyAt, tableBytes);
-    storeAt(payload + mapAt, field.inlined ? field.bits : mapAt - field.bits, mapBytes);
+    storeLittle(payload + tableAt, tableAt - keyAt, tableBytes);
+    storeLittle(payload + mapAt, field.inlined ? field.bits : mapAt - field.bits, mapBytes);
     *type++ = static_cast<char>(field.inlined ? field.packed | mapWidth : field.packed);
     keyAt += field.key.size() + 1;
     tableAt += tableBytes;
     mapAt += mapBytes;
   }
-  storeAt(payload + rootStart, rootStart - map, rootBytes);
+  storeLittle(payload + rootStart, rootStart - map, rootBytes);
   payload[rootStart + rootBytes] = static_cast<char>(flexbuffers::PackedType(mapWidth, flexbuffers::FBT_MAP));
   payload[rootStart + rootBytes + 1] = static_cast<char>(rootBytes);
 

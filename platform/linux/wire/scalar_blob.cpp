@@ -4,6 +4,8 @@
 
 #include <flatbuffers/flexbuffers.h>
 
+#include "platform/linux/wire/little_endian.h"
+
 namespace zal {
 namespace {
 
@@ -33,7 +35,7 @@ struct ScalarOf {
 ScalarBlob::ScalarBlob(const Number& number) {
   const Scalar scalar = std::visit(ScalarOf{}, number);
   const std::size_t width = std::size_t{1} << scalar.width;
-  for (std::size_t i = 0; i < width; ++i) _bytes[i] = static_cast<char>(scalar.bits >> (8 * i));
+  storeLittle(_bytes.data(), scalar.bits, width);
   _bytes[width] = static_cast<char>(flexbuffers::PackedType(scalar.width, scalar.type));
   _bytes[width + 1] = static_cast<char>(width);
   _size = width + 2;

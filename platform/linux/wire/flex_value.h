@@ -1,0 +1,82 @@
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <optional>
+#include <string_view>
+
+#include <flatbuffers/flexbuffers.h>
+
+namespace zal {
+
+class FlexMap;
+class FlexList;
+
+/// One value inside a FlexBuffers buffer that verifiedFlexRoot() accepted, asked by its exact type:
+/// nothing is converted. A view: the buffer outlives it. Reads bytes, so the buffer may lie anywhere.
+class FlexValue {
+ public:
+  FlexValue() = default;
+  /// `at`: where the value, or the offset to it, stands, in `parentWidth` bytes.
+  FlexValue(const char* at, std::uint8_t parentWidth, std::uint8_t packedType)
+      : _at(at),
+        _parentWidth(parentWidth),
+        _width(static_cast<std::uint8_t>(1U << (packedType & 3U))),
+        _type(static_cast<flexbuffers::Type>(packedType >> 2U)) {}
+
+  [[nodiscard]] flexbuffers::Type type() const { return _type; }
+
+  // Each gives nothing when the value is of another type. Direct and indirect numbers are one type.
+  [[nodiscard]] std::optional<std::int64_t> asInt() const;
+  [[nodiscard]] std::optional<std::uint64_t> asUInt() const;
+  [[nodiscard]] std::optional<double> asFloat() const;
+  [[nodiscard]] std::optional<bool> asBool() const;
+  [[nodiscard]] std::optional<std::string_view> asString() const;  ///< any bytes, not only UTF-8
+  [[nodiscard]] std::optional<std::string_view> asBlob() const;
+  [[nodiscard]] std::optional<std::string_view> asKey() const;
+  [[nodiscard]] std::optional<FlexMap> asMap() const;
+  [[nodiscard]] std::optional<FlexList> asList() const;  ///< every kind of vector
+
+ private:
+  [[nodiscard]] const char* _target() const;
+  [[nodiscard]] std::string_view _counted() const;
+
+  const char* _at = nullptr;
+  std::uint8_t _parentWidth = 1;
+  std::uint8_t _width = 1;
+  flexbuffers::Type _type = flexbuffers::FBT_NULL;
+};
+
+/// The elements of a vector, typed or not, in order.
+class FlexList {
+ public:
+  FlexList(const char* elements, std::size_t size, std::uint8_t width, std::optional<flexbuffers::Type> typed)
+      : _elements(elements), _size(size), _width(width), _typed(typed) {}
+  [[nodiscard]] std::size_t size() const { return _size; }
+  /// `index` is below size().
+  [[nodiscard]] FlexValue operator[](std::size_t index) const;
+
+ private:
+  const char* _elements;
+  std::size_t _size;
+  std::uint8_t _width;
+  std::optional<flexbuffers::Type> _typed;
+};
+
+/// Keys and values of a map. Keys have to be sorted by their bytes: find() searches by halving, and
+/// in a map that breaks the rule (or repeats a key) it may find any of them or none, never more.
+class FlexMap {
+ public:
+  explicit FlexMap(const char* values, std::uint8_t width);
+  [[nodiscard]] std::size_t size() const { return _values.size(); }
+  [[nodiscard]] std::string_view key(std::size_t index) const;
+  [[nodiscard]] FlexValue value(std::size_t index) const { return _values[index]; }
+  [[nodiscard]] FlexValue find(std::string_view key) const;  ///< absent: a null value
+
+ private:
+  FlexList _values;
+  const char* _keys;
+  std::uint8_t _keyWidth;
+};
+
+}  // namespace zal

@@ -1,0 +1,147 @@
+#include "platform/linux/wire/flex_verifier.h"
+
+#include "platform/linux/wire/little_endian.h"
+
+namespace zal {
+namespace {
+
+using flexbuffers::Type;
+
+bool isWidth(std::uint64_t width) { return width == 1 || width == 2 || width == 4 || width == 8; }
+
+class Verifier {
+ public:
+  explicit Verifier(std::string_view buffer)
+      : _bytes(buffer.data()),
+        _size(buffer.size()),
+        _lastZero(buffer.rfind('\0')),
+        _visitsLeft(buffer.size()) {}
+
+  /// The value whose slot of `parentWidth` bytes (inside the buffer) stands at `at`.
+  bool value(std::size_t at, std::size_t parentWidth, std::uint8_t packed, int depth) {
+    if (_visitsLeft-- == 0) return false;
+    const std::size_t width = std::size_t{1} << (packed & 3U);
+    const auto type = static_cast<Type>(packed >> 2U);
+    if (type == flexbuffers::FBT_FLOAT) return parentWidth >= 4;
+    if (flexbuffers::IsInline(type)) return true;
+    std::size_t start = 0;
+    if (!_follow(at, parentWidth, start)) return false;
+    switch (type) {
+      case flexbuffers::FBT_KEY:
+        return _keyEnds(start);
+      case flexbuffers::FBT_STRING:
+        return _counted(start, width, 1, 1);
+      case flexbuffers::FBT_BLOB:
+        return _counted(start, width, 1, 0);
+      case flexbuffers::FBT_INDIRECT_FLOAT:
+        return width >= 4 && _fits(start, 1, width);
+      case flexbuffers::FBT_INDIRECT_INT:
+      case flexbuffers::FBT_INDIRECT_UINT:
+        return _fits(start, 1, width);
+      case flexbuffers::FBT_MAP:
+        return _keysOfMap(start, width) && _elements(start, width, depth);
+      case flexbuffers::FBT_VECTOR:
+        return _elements(start, width, depth);
+      default:
+        return _typed(type, start, width);
+    }
+  }
+
+ private:
+  [[nodiscard]] std::uint64_t _load(std::size_t at, std::size_t width) const {
+    return loadLittle(_bytes + at, width);
+  }
+  [[nodiscard]] bool _fits(std::size_t start, std::uint64_t count, std::size_t each) const {
+    return start <= _size && count <= (_size - start) / each;
+  }
+  /// Offsets count back from their own place; only something empty can begin right there, and what
+  /// points at itself runs into the depth limit.
+  bool _follow(std::size_t at, std::size_t width, std::size_t& target) const {
+    const std::uint64_t offset = _load(at, width);
+    if (offset > at) return false;
+    target = at - offset;
+    return true;
+  }
+  /// One zero byte at or after its start ends a key.
+  [[nodiscard]] bool _keyEnds(std::size_t start) const {
+    return _lastZero != std::string_view::npos && start <= _lastZero;
+  }
+  /// What its length says, each that large, and `extra` bytes more, lie inside.
+  [[nodiscard]] bool _counted(std::size_t start, std::size_t width, std::size_t each,
+                              std::size_t extra) const {
+    if (start < width) return false;
+    return _size - start >= extra && _load(start - width, width) <= (_size - start - extra) / each;
+  }
+
+  bool _elements(std::size_t start, std::size_t width, int depth) {
+    if (depth >= kMaximumFlexDepth || !_counted(start, width, width + 1, 0)) return false;
+    const std::uint64_t count = _load(start - width, width);
+    const std::size_t types = start + count * width;
+    for (std::uint64_t i = 0; i < count; ++i) {
+      if (!value(start + i * width, width, static_cast<std::uint8_t>(_bytes[types + i]), depth + 1))
+        return false;
+    }
+    return true;
+  }
+
+  bool _keysOfMap(std::size_t start, std::size_t width) {
+    if (start < 3 * width) return false;
+    const std::uint64_t keyWidth = _load(start - 2 * width, width);
+    std::size_t keys = 0;
+    if (!isWidth(keyWidth) || !_follow(start - 3 * width, width, keys)) return false;
+    if (keys < keyWidth || _load(keys - keyWidth, keyWidth) != _load(start - width, width)) return false;
+    return _keyTable(keys, keyWidth);
+  }
+
+  bool _keyTable(std::size_t start, std::size_t width) {
+    if (!_counted(start, width, width, 0)) return false;
+    const std::uint64_t count = _load(start - width, width);
+    if (count > _visitsLeft) return false;
+    _visitsLeft -= count;
+    for (std::uint64_t i = 0; i < count; ++i) {
+      std::size_t key = 0;
+      if (!_follow(start + i * width, width, key) || !_keyEnds(key)) return false;
+    }
+    return true;
+  }
+
+  bool _typed(Type type, std::size_t start, std::size_t width) {
+    if (flexbuffers::IsFixedTypedVector(type)) {
+      std::uint8_t count = 0;
+      const Type element = flexbuffers::ToFixedTypedVectorElementType(type, &count);
+      return (element != flexbuffers::FBT_FLOAT || width >= 4) && _fits(start, count, width);
+    }
+    switch (type) {
+      case flexbuffers::FBT_VECTOR_FLOAT:
+        return width >= 4 && _counted(start, width, width, 0);
+      case flexbuffers::FBT_VECTOR_INT:
+      case flexbuffers::FBT_VECTOR_UINT:
+      case flexbuffers::FBT_VECTOR_BOOL:
+        return _counted(start, width, width, 0);
+      case flexbuffers::FBT_VECTOR_KEY:
+      case flexbuffers::FBT_VECTOR_STRING_DEPRECATED:
+        return _keyTable(start, width);
+      default:
+        return false;
+    }
+  }
+
+  const char* _bytes;
+  std::size_t _size;
+  std::size_t _lastZero;
+  std::size_t _visitsLeft;
+};
+
+}  // namespace
+
+std::optional<FlexValue> verifiedFlexRoot(std::string_view buffer) {
+  if (buffer.size() < 3) return std::nullopt;
+  const auto width = static_cast<std::uint8_t>(buffer.back());
+  const auto packed = static_cast<std::uint8_t>(buffer[buffer.size() - 2]);
+  if (!isWidth(width) || buffer.size() < 2U + width) return std::nullopt;
+  const std::size_t at = buffer.size() - 2 - width;
+  if (!Verifier(buffer).value(at, width, packed, 0)) return std::nullopt;
+  return FlexValue(buffer.data() + at, width, packed);
+}
+
+}  // namespace zal
