@@ -1,0 +1,91 @@
+#include "session/arrival_order.h"
+
+#include <algorithm>
+#include <array>
+#include <bit>
+#include <cstddef>
+#include <cstdint>
+#include <utility>
+
+namespace zal {
+
+namespace {
+
+using Entries = std::vector<ZalPair<std::string_view, double>>;
+
+constexpr unsigned kDigitBits = 11;
+constexpr std::size_t kBuckets = std::size_t{1} << kDigitBits;
+constexpr std::size_t kDigits = (64 + kDigitBits - 1) / kDigitBits;
+
+struct Keyed {
+  std::uint64_t key;
+  std::uint64_t index;
+};
+
+// Bits that compare as integers the way the times compare as numbers.
+std::uint64_t orderedBits(double time) {
+  constexpr std::uint64_t kSign = std::uint64_t{1} << 63U;
+  const auto bits = std::bit_cast<std::uint64_t>(time + 0.0);  // -0.0 equals 0.0
+  return (bits & kSign) != 0 ? ~bits : bits | kSign;
+}
+
+std::size_t digitOf(std::uint64_t key, std::size_t digit) {
+  return static_cast<std::size_t>(key >> (digit * kDigitBits)) & (kBuckets - 1);
+}
+
+// Stable, so that equal keys keep the order they came in.
+void sortByKey(std::vector<Keyed>& keyed) {
+  std::vector<std::array<std::size_t, kBuckets>> counts(kDigits);
+  for (const Keyed& entry : keyed) {
+    for (std::size_t digit = 0; digit < kDigits; ++digit) ++counts[digit][digitOf(entry.key, digit)];
+  }
+  std::vector<Keyed> sorted(keyed.size());
+  for (std::size_t digit = 0; digit < kDigits; ++digit) {
+    auto& starts = counts[digit];
+    if (starts[digitOf(keyed.front().key, digit)] == keyed.size()) continue;  // all alike here
+    std::size_t next = 0;
+    for (std::size_t& start : starts) next += std::exchange(start, next);
+    for (const Keyed& entry : keyed) sorted[starts[digitOf(entry.key, digit)]++] = entry;
+    keyed.swap(sorted);
+  }
+}
+
+bool isRising(const Entries& entries) {
+  return std::adjacent_find(entries.begin(), entries.end(), [](const auto& earlier, const auto& later) {
+           return !(earlier.second < later.second);
+         }) == entries.end();
+}
+
+bool isFalling(const Entries& entries) {
+  return std::adjacent_find(entries.begin(), entries.end(), [](const auto& earlier, const auto& later) {
+           return earlier.second < later.second;
+         }) == entries.end();
+}
+
+}  // namespace
+
+void appendInTimeOrder(const Entries& entries, std::vector<std::string_view>& texts) {
+  texts.reserve(texts.size() + entries.size());
+  if (isRising(entries)) {
+    for (const auto& entry : entries) texts.push_back(entry.first);
+    return;
+  }
+  if (isFalling(entries)) {
+    for (auto entry = entries.rbegin(); entry != entries.rend(); ++entry) texts.push_back(entry->first);
+    return;
+  }
+  std::vector<Keyed> keyed;
+  keyed.reserve(entries.size());
+  for (std::size_t index = entries.size(); index-- > 0;) {  // latest first
+    keyed.push_back({orderedBits(entries[index].second), index});
+  }
+  if (entries.size() < kBuckets) {
+    std::stable_sort(keyed.begin(), keyed.end(),
+                     [](const Keyed& a, const Keyed& b) { return a.key < b.key; });
+  } else {
+    sortByKey(keyed);
+  }
+  for (const Keyed& entry : keyed) texts.push_back(entries[entry.index].first);
+}
+
+}  // namespace zal

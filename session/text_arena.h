@@ -1,0 +1,24 @@
+#pragma once
+
+#include <cstddef>
+#include <memory>
+#include <string_view>
+#include <vector>
+
+namespace zal {
+
+/// Keeps texts for as long as it lives, in few large pieces: a session can hold a million lines, and
+/// an allocation for each would cost more than the lines. One thread at a time.
+class TextArena {
+ public:
+  /// A copy of the text that stays where it is.
+  [[nodiscard]] std::string_view keep(std::string_view text);
+
+ private:
+  std::vector<std::unique_ptr<char[]>> _chunks;
+  char* _free = nullptr;
+  std::size_t _left = 0;
+  std::size_t _nextChunk = 4096;
+};
+
+}  // namespace zal

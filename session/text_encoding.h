@@ -1,0 +1,17 @@
+#pragma once
+
+#include <cstddef>
+#include <string_view>
+
+namespace zal {
+
+/// Length of well-formed UTF-8 in UTF-16 units; never more than its bytes.
+[[nodiscard]] std::size_t utf16Length(std::string_view text);
+
+/// Whether it is well-formed UTF-8: no overlong forms, no surrogates, nothing above U+10FFFF.
+[[nodiscard]] bool isValidUtf8(std::string_view text);
+
+/// Without white space and line breaks at both ends. Well-formed UTF-8.
+[[nodiscard]] std::string_view trimmed(std::string_view text);
+
+}  // namespace zal
