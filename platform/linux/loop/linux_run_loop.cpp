@@ -88,21 +88,30 @@ bool LinuxRunLoop::_fireDueTimers() {
   while (!_timers.empty() && _timers.begin()->first.first <= now && !_context.stopped()) {
     fired = true;
     auto due = _timers.extract(_timers.begin());
-    const std::uint64_t number = due.key().second;
-    const auto interval = due.mapped().interval;
-    if (interval.count() == 0) {
-      _deadlines.erase(number);
+    if (due.mapped().interval.count() == 0) {
+      _deadlines.erase(due.key().second);
       due.mapped().task();
       continue;
     }
-    // The next beat of the same grid that still lies ahead: no drift, and missed ones are not made up.
-    due.key().first += interval * ((now - due.key().first) / interval + 1);
-    _deadlines[number] = due.key().first;
-    const Task task = due.mapped().task;  // a copy: the task may cancel its own timer
-    _timers.insert(std::move(due));
-    task();
+    try {
+      due.mapped().task();
+    } catch (...) {
+      _armNextBeat(std::move(due));
+      throw;
+    }
+    _armNextBeat(std::move(due));
   }
   return fired;
+}
+
+void LinuxRunLoop::_armNextBeat(Timers::node_type&& timer) {
+  const auto deadline = _deadlines.find(timer.key().second);
+  if (deadline == _deadlines.end()) return;  // its own task cancelled it
+  // The next instant of the grid that still lies ahead: no drift, and missed beats are not made up.
+  const auto late = std::chrono::steady_clock::now() - timer.key().first;
+  timer.key().first += timer.mapped().interval * (late / timer.mapped().interval + 1);
+  deadline->second = timer.key().first;
+  _timers.insert(std::move(timer));
 }
 
 bool LinuxRunLoop::_runReadyHandlers() {

@@ -62,8 +62,11 @@ class LinuxRunLoop : public RunLoop {
     Task task;
   };
 
+  using Timers = std::map<TimerKey, Timer>;
+
   TimerId _addTimer(std::chrono::nanoseconds delay, Timer timer);
   bool _fireDueTimers();
+  void _armNextBeat(Timers::node_type&& timer);
   bool _runReadyHandlers();
   void _runSleepObservers();
   void _setAlarm();
@@ -75,7 +78,7 @@ class LinuxRunLoop : public RunLoop {
   asio::executor_work_guard<asio::io_context::executor_type> _keepRunning{_context.get_executor()};
   asio::posix::stream_descriptor _alarm{_context};
   SteadyTime _alarmSetFor = SteadyTime::max();  // max: not set
-  std::map<TimerKey, Timer> _timers;
+  Timers _timers;
   std::unordered_map<std::uint64_t, SteadyTime> _deadlines;
   std::uint64_t _lastTimer = 0;
   std::deque<Task> _sleepObservers;        // a deque: an observer may add another while it runs

@@ -155,6 +155,17 @@ TYPED_TEST(RunLoopContractTest, WhatATimerThrowsPassesThroughToo) {
   EXPECT_EQ(this->trace, "b");
 }
 
+TYPED_TEST(RunLoopContractTest, ARepeatingTimerWhoseTaskThrewGoesOn) {
+  this->loop.callEvery(2ms, [this] {
+    this->trace += 'a';
+    if (this->trace == "a") throw std::runtime_error("broken");
+    if (this->trace == "aaa") this->loop.stop();
+  });
+  EXPECT_THROW(this->host.runFor(100ms), std::runtime_error);
+  this->host.runFor(100ms);
+  EXPECT_EQ(this->trace.substr(0, 3), "aaa");
+}
+
 TYPED_TEST(RunLoopContractTest, SeveralThreadsMayPostAndEachKeepsItsOrder) {
   constexpr int kThreads = 4, kPosts = 2000;
   std::vector<std::vector<int>> seen(kThreads);

@@ -1,0 +1,107 @@
+#include "platform/linux/loop/linux_clock.h"
+
+#include <gtest/gtest.h>
+#include <time.h>
+
+#include <clocale>
+#include <cstdlib>
+#include <string>
+#include <thread>
+
+namespace zal {
+namespace {
+
+using namespace std::chrono_literals;
+
+/// Runs with TZ set; POSIX forms, so that no zone files are needed.
+class LinuxClockTest : public ::testing::Test {
+ protected:
+  void SetUp() override {
+    if (const char* zone = std::getenv("TZ")) _before = zone;
+  }
+  void TearDown() override { inZone(_before); }
+  static LinuxClock inZone(const std::string& zone) {
+    if (zone.empty()) {
+      ::unsetenv("TZ");
+    } else {
+      ::setenv("TZ", zone.c_str(), 1);
+    }
+    return LinuxClock();
+  }
+  static std::string text(const LocalTime& t) {
+    char buffer[64];
+    std::snprintf(buffer, sizeof buffer, "%04d-%02d-%02d %02d:%02d:%02d.%03d", t.year, t.month, t.day, t.hour,
+                  t.minute, t.second, t.millisecond);
+    return buffer;
+  }
+
+ private:
+  std::string _before;
+};
+
+TEST_F(LinuxClockTest, TakesAMomentApartInTheLocalZone) {
+  const LinuxClock clock = inZone("CET-1CEST,M3.5.0,M10.5.0/3");
+  EXPECT_EQ(text(clock.localTime(WallTime{1714651387251999us})), "2024-05-02 14:03:07.251");
+}
+
+TEST_F(LinuxClockTest, FollowsSummerTimeToTheMicrosecond) {
+  const LinuxClock clock = inZone("CET-1CEST,M3.5.0,M10.5.0/3");
+  EXPECT_EQ(text(clock.localTime(WallTime{1711846799999999us})), "2024-03-31 01:59:59.999");
+  EXPECT_EQ(text(clock.localTime(WallTime{1711846800000000us})), "2024-03-31 03:00:00.000");
+}
+
+TEST_F(LinuxClockTest, MomentsBefore1970CountTheirFractionForwards) {
+  const LinuxClock clock = inZone("UTC0");
+  EXPECT_EQ(text(clock.localTime(WallTime{-1us})), "1969-12-31 23:59:59.999");
+  EXPECT_EQ(text(clock.localTime(WallTime{-1000000us})), "1969-12-31 23:59:59.000");
+}
+
+TEST_F(LinuxClockTest, KnowsTheFirstAndTheLastSecondThatFourDigitsCanShow) {
+  const LinuxClock clock = inZone("UTC0");
+  EXPECT_EQ(text(clock.localTime(wallTimeFromSeconds(-1e300))), "0001-01-01 00:00:00.000");
+  EXPECT_EQ(text(clock.localTime(wallTimeFromSeconds(1e300))), "9999-12-31 23:59:59.000");
+}
+
+TEST_F(LinuxClockTest, AnswersFromTheZoneOfTheLatestClock) {
+  const WallTime moment{1714651387251000us};
+  EXPECT_EQ(text(inZone("UTC0").localTime(moment)), "2024-05-02 12:03:07.251");
+  EXPECT_EQ(text(inZone("EAST-5").localTime(moment)), "2024-05-02 17:03:07.251");
+}
+
+TEST_F(LinuxClockTest, SecondsAskedForInTurnDoNotMixUp) {
+  const LinuxClock clock = inZone("UTC0");
+  for (int round = 0; round < 3; ++round) {
+    EXPECT_EQ(text(clock.localTime(WallTime{5s + 1ms})), "1970-01-01 00:00:05.001");
+    EXPECT_EQ(text(clock.localTime(WallTime{6s + 2ms})), "1970-01-01 00:00:06.002");
+    EXPECT_EQ(text(clock.localTime(WallTime{6s + 3ms})), "1970-01-01 00:00:06.003");
+  }
+}
+
+TEST_F(LinuxClockTest, EveryThreadGetsTheSameAnswer) {
+  const LinuxClock clock = inZone("EAST-5");
+  std::string here = text(clock.localTime(WallTime{0us})), there;
+  std::jthread([&] { there = text(clock.localTime(WallTime{0us})); }).join();
+  EXPECT_EQ(here, there);
+}
+
+TEST_F(LinuxClockTest, NamesTheZoneAsItIsNow) {
+  EXPECT_EQ(inZone("EAST-5").zoneAbbreviation(), "EAST");
+  EXPECT_EQ(inZone("UTC0").zoneAbbreviation(), "UTC");
+}
+
+TEST_F(LinuxClockTest, SteadyTimeOnlyMovesForward) {
+  const LinuxClock clock;
+  const SteadyTime first = clock.steadyNow();
+  EXPECT_LE(first, clock.steadyNow());
+}
+
+TEST_F(LinuxClockTest, WallTimeIsTheSystemsOwn) {
+  const LinuxClock clock;
+  const auto before = std::chrono::system_clock::now();
+  const WallTime now = clock.wallNow();
+  EXPECT_GE(now, std::chrono::floor<std::chrono::microseconds>(before));
+  EXPECT_LE(now, std::chrono::system_clock::now());
+}
+
+}  // namespace
+}  // namespace zal
