@@ -2,6 +2,7 @@
 
 #include <chrono>
 #include <cstdint>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -44,8 +45,8 @@ struct Configuration {
   IpcSettings ipc;
   LogSettings log;
   std::string systemVersionFile;  ///< property list; empty: os-release and the kernel answer
-  /// For tests only: six minutes of idling shortened. `[testing] inactivityLimit`, seconds.
-  std::chrono::milliseconds inactivityLimit{360'000};
+  /// For tests only: the agent's six minutes of idling shortened. `[testing] inactivityLimit`, seconds.
+  std::optional<std::chrono::milliseconds> inactivityLimit;
 };
 
 }  // namespace zal

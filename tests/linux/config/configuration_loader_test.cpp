@@ -41,7 +41,7 @@ TEST_F(ConfigurationLoaderTest, AnEmptyFileLeavesTheDefaults) {
   EXPECT_EQ(loaded.configuration.log.maximumOpenFiles, 64U);
   EXPECT_EQ(loaded.configuration.ipc.maximumPayload, 16'777'216U);
   EXPECT_EQ(loaded.configuration.ipc.maximumReplyBacklog, 1'048'576U);
-  EXPECT_EQ(loaded.configuration.inactivityLimit, std::chrono::milliseconds{360'000});
+  EXPECT_EQ(loaded.configuration.inactivityLimit, std::nullopt);
   EXPECT_EQ(loaded.configuration.roots.UserLogRoot, "/home/ann/.local/state/lirra/Logs");
 }
 
@@ -223,7 +223,7 @@ TEST_F(ConfigurationLoaderTest, AnInactivityLimitOfNothingIsRefused) {
         loaded.warnings,
         ElementsAre(file + ":2: testing.inactivityLimit wants a number of seconds from 0.001 to 31536000"))
         << value;
-    EXPECT_EQ(loaded.configuration.inactivityLimit, std::chrono::milliseconds{360'000});
+    EXPECT_EQ(loaded.configuration.inactivityLimit, std::nullopt);
   }
 }
 
