@@ -1,0 +1,14 @@
+#pragma once
+
+#include <span>
+#include <string>
+#include <string_view>
+
+namespace zal {
+
+/// Deletes what earlier runs left of verbose logs: every visible entry of `logRoot`/<type> whose
+/// full path contains "-Verbose-", one level deep. A directory that cannot be listed is passed over
+/// and a failed deletion ignored, both without a word.
+void purgeVerboseLogs(const std::string& logRoot, std::span<const std::string_view> types);
+
+}  // namespace zal

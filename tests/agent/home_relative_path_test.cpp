@@ -1,0 +1,29 @@
+#include "agent/home_relative_path.h"
+
+#include <gtest/gtest.h>
+
+namespace zal {
+namespace {
+
+TEST(HomeRelativePathTest, WritesATildeForTheHomeDirectory) {
+  EXPECT_EQ(homeRelativePath("/home/user/Logs", "/home/user"), "~/Logs");
+  EXPECT_EQ(homeRelativePath("/home/user/Logs", "/home/user/"), "~/Logs");
+  EXPECT_EQ(homeRelativePath("/home/user", "/home/user"), "~");
+}
+
+TEST(HomeRelativePathTest, LeavesPathsElsewhereAlone) {
+  EXPECT_EQ(homeRelativePath("/home/user2/Logs", "/home/user"), "/home/user2/Logs");
+  EXPECT_EQ(homeRelativePath("/var/log", "/"), "/var/log");
+  EXPECT_EQ(homeRelativePath("~/Logs", "/home/user"), "~/Logs");
+}
+
+TEST(HomeRelativePathTest, ExpandsALeadingTildeOnly) {
+  EXPECT_EQ(expandHome("~/Logs", "/home/user"), "/home/user/Logs");
+  EXPECT_EQ(expandHome("~", "/home/user"), "/home/user");
+  EXPECT_EQ(expandHome("~/Logs", "/"), "/Logs");
+  EXPECT_EQ(expandHome("~other/Logs", "/home/user"), "~other/Logs");
+  EXPECT_EQ(expandHome("/a/~/b", "/home/user"), "/a/~/b");
+}
+
+}  // namespace
+}  // namespace zal
