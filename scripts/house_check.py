@@ -59,6 +59,12 @@ def owner(name):
     return max(fitting, key=len) if fitting else None
 
 
+def from_root(name, target):
+    """A header that is installed includes its neighbour by its bare name."""
+    neighbour = pathlib.PurePosixPath(name).parent / target
+    return str(neighbour) if "/" not in target and (ROOT / neighbour).exists() else target
+
+
 def code_lines(text):
     text = re.sub(r"/\*.*?\*/", lambda m: "\n" * m.group().count("\n"), text, flags=re.S)
     for number, line in enumerate(text.split("\n"), 1):
@@ -111,7 +117,7 @@ def main():
     for name in names:
         text = (ROOT / name).read_text(encoding="utf-8")
         lines = list(code_lines(text))
-        includes = [(n, m.group(1)) for n, line in lines if (m := INCLUDE.match(line))]
+        includes = [(n, from_root(name, m.group(1))) for n, line in lines if (m := INCLUDE.match(line))]
         graph[name] = [target for _, target in includes]
         if len(lines) > LARGEST + 1:
             breaches.append(f"{name}: {len(lines)} lines; look for a second subject")
