@@ -95,11 +95,14 @@ TEST_F(PosixShellTest, ABackgroundCommandOutlivesTheCallAndHoldsNoneOfOurDescrip
   const pid_t child = std::stoi(readFile(directory / "pid"));
   // A starting program opens its libraries for a moment; a descriptor of ours would stay for good.
   const Descriptors expected{{"0", "/dev/null"}, {"1", "/dev/null"}, {"2", "/dev/null"}};
+  const std::string nameFile = "/proc/" + std::to_string(child) + "/comm";
   const auto limit = std::chrono::steady_clock::now() + 10s;
-  while (descriptorsOf(child) != expected && std::chrono::steady_clock::now() < limit) {
+  Descriptors held;
+  do {
     std::this_thread::sleep_for(1ms);
-  }
-  EXPECT_EQ(descriptorsOf(child), expected);
+    held = descriptorsOf(child);
+  } while ((readFile(nameFile) != "sleep\n" || held != expected) && std::chrono::steady_clock::now() < limit);
+  EXPECT_EQ(held, expected);
   ::kill(child, SIGKILL);
   ::close(high);
   ::close(listener);
