@@ -1,0 +1,50 @@
+#include "agent/agent_entry.h"
+
+#include <exception>
+#include <string>
+#include <utility>
+
+#include "agent/zal_logging_agent_server.h"
+
+namespace zal {
+namespace {
+
+void followHostSignals(Platform& platform, ZalLoggingAgentServer& server) {
+  platform.hostSignals.onTerminate([&platform, &server] {
+    server.stop();
+    platform.logFacility.flush();
+    platform.processExit.exit(0);
+  });
+  platform.hostSignals.onReload([&server] { server.readLoggingPreferences(); });
+}
+
+void runMainLoop(Platform& platform) {
+  try {
+    platform.mainLoop.run();
+  } catch (const std::exception& exception) {
+    platform.agentLog.warning(std::string("ZalLoggingAgentServer exception caught on main thread: ") +
+                              exception.what());
+    platform.agentLog.backtrace();
+    platform.crashReporter.simulateCrashForException(exception.what());
+  }
+}
+
+}  // namespace
+
+int runAgent(Platform& platform, AgentHooks hooks) {
+  ZalLoggingAgentServer::lendPlatform(platform, std::move(hooks));
+  ZalLoggingAgentServer* const server = ZalLoggingAgentServer::sharedInstance();
+  if (server == nullptr) {
+    platform.agentLog.warning("Could not create ZalLoggingAgentServer server");
+    return 0;
+  }
+  followHostSignals(platform, *server);
+  server->start();
+  runMainLoop(platform);
+  platform.logFacility.flush();
+  return 0;
+}
+
+int runAgent(Platform& platform) { return runAgent(platform, {}); }
+
+}  // namespace zal
