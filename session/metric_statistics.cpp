@@ -21,6 +21,22 @@ Wide wide(const Number& number) {
 // The sign of a NaN says nothing, and "-nan" would be shown.
 double narrow(Wide value) { return std::isnan(value) ? kNoNumber : static_cast<double>(value); }
 
+// Adds up without letting many small rounding errors grow into a visible one.
+class CompensatedSum {
+ public:
+  void add(Wide value) {
+    const Wide next = _sum + value;
+    const Wide lost = std::abs(_sum) >= std::abs(value) ? (_sum - next) + value : (value - next) + _sum;
+    if (std::isfinite(next)) _lost += lost;
+    _sum = next;
+  }
+  [[nodiscard]] Wide value() const { return std::isfinite(_sum) ? _sum + _lost : _sum; }
+
+ private:
+  Wide _sum = 0;
+  Wide _lost = 0;
+};
+
 Wide middleOf(std::vector<Wide> values) {
   const auto middle = values.begin() + static_cast<std::ptrdiff_t>(values.size() / 2);
   std::nth_element(values.begin(), middle, values.end());
@@ -37,10 +53,10 @@ MetricStatistics statisticsOf(const std::vector<Number>& samples) {
   values.reserve(samples.size());
   const Number* least = nullptr;
   const Number* greatest = nullptr;
-  Wide sum = 0;
+  CompensatedSum sum;
   for (const Number& sample : samples) {
     const Wide value = wide(sample);
-    sum += value;
+    sum.add(value);
     if (std::isnan(value)) continue;
     values.push_back(value);
     if (least == nullptr || value < wide(*least)) least = &sample;
@@ -52,11 +68,11 @@ MetricStatistics statisticsOf(const std::vector<Number>& samples) {
   if (values.size() != samples.size()) return result;
 
   const auto count = static_cast<Wide>(values.size());
-  const Wide average = sum / count;
-  Wide squares = 0;
-  for (const Wide value : values) squares += (value - average) * (value - average);
+  const Wide average = sum.value() / count;
+  CompensatedSum squares;
+  for (const Wide value : values) squares.add((value - average) * (value - average));
   result.average = narrow(average);
-  result.deviation = narrow(std::sqrt(squares / count));
+  result.deviation = narrow(std::sqrt(squares.value() / count));
   result.median = narrow(middleOf(std::move(values)));
   return result;
 }

@@ -2,16 +2,26 @@
 
 #include <chrono>
 #include <cstdint>
+#include <functional>
+#include <map>
 #include <memory>
+#include <mutex>
 #include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
 
 #include "platform/clock.h"
+#include "platform/main_thread_check.h"
+#include "platform/run_loop.h"
 #include "platform/value.h"
+#include "session/collected_files.h"
+#include "session/entry_time_text.h"
+#include "session/log_lines.h"
 #include "session/optional_text.h"
+#include "session/quality_log_list.h"
 #include "session/session_services.h"
+#include "session/sorted_log_list.h"
 
 namespace zal {
 
@@ -37,7 +47,6 @@ class ZalLoggingAgentVistelSession : public std::enable_shared_from_this<ZalLogg
  public:
   /// The directory gets one subdirectory per session; a leading "~" is the user's home.
   ZalLoggingAgentVistelSession(std::string sessionType, std::string logDirectory, SessionServices& services);
-  ~ZalLoggingAgentVistelSession();
   ZalLoggingAgentVistelSession(const ZalLoggingAgentVistelSession&) = delete;
   ZalLoggingAgentVistelSession& operator=(const ZalLoggingAgentVistelSession&) = delete;
 
@@ -74,28 +83,78 @@ class ZalLoggingAgentVistelSession : public std::enable_shared_from_this<ZalLogg
   /// The same moment as a directory name without a role.
   [[nodiscard]] static std::string logStringForDate(const SessionServices& services, WallTime date);
 
-  [[nodiscard]] bool isActive() const;
-  [[nodiscard]] const std::string& sessionType() const;
-  [[nodiscard]] bool logCheckpointsToConsole() const;
-  void setLogCheckpointsToConsole(bool enabled);
-  [[nodiscard]] bool logDescriptionsToConsole() const;
-  void setLogDescriptionsToConsole(bool enabled);
-  [[nodiscard]] bool isInitiator() const;
-  void setIsInitiator(bool initiator);
-  [[nodiscard]] std::uint32_t endFlags() const;
-  void setEndFlags(std::uint32_t flags);
+  [[nodiscard]] bool isActive() const { return _active; }
+  [[nodiscard]] const std::string& sessionType() const { return _sessionType; }
+  [[nodiscard]] bool logCheckpointsToConsole() const { return _logCheckpoints; }
+  void setLogCheckpointsToConsole(bool enabled) { _logCheckpoints = enabled; }
+  [[nodiscard]] bool logDescriptionsToConsole() const { return _logDescriptions; }
+  void setLogDescriptionsToConsole(bool enabled) { _logDescriptions = enabled; }
+  [[nodiscard]] bool isInitiator() const { return _initiator; }
+  void setIsInitiator(bool initiator) { _initiator = initiator; }
+  [[nodiscard]] std::uint32_t endFlags() const { return _endFlags; }
+  void setEndFlags(std::uint32_t flags) { _endFlags = flags; }
 
   // Copied whole on both ways; any thread. Absent when never set or set to nothing.
-  [[nodiscard]] std::optional<std::string> failureReason() const;
-  void setFailureReason(OptionalText reason);
-  [[nodiscard]] std::optional<std::string> initiator() const;
-  void setInitiator(OptionalText initiator);
-  [[nodiscard]] std::optional<std::string> recipient() const;
-  void setRecipient(OptionalText recipient);
+  [[nodiscard]] std::optional<std::string> failureReason() const { return _property(_failureReason); }
+  void setFailureReason(OptionalText reason) { _setProperty(_failureReason, reason); }
+  [[nodiscard]] std::optional<std::string> initiator() const { return _property(_initiatorID); }
+  void setInitiator(OptionalText initiator) { _setProperty(_initiatorID, initiator); }
+  [[nodiscard]] std::optional<std::string> recipient() const { return _property(_recipientID); }
+  void setRecipient(OptionalText recipient) { _setProperty(_recipientID, recipient); }
 
  private:
-  struct State;
-  std::unique_ptr<State> _state;
+  void _markActive();
+  void _cancelInactivityTimer();
+  void _postInactive();
+
+  /// Valid until the next call.
+  [[nodiscard]] std::string_view _entryTime(WallTime moment);
+  [[nodiscard]] double _currentTimeOfDay() const;
+  void _beginUnlessActive(OptionalText sender);
+  void _addCallInfo(OptionalText value, OptionalText category);
+
+  [[nodiscard]] std::vector<std::string> _storedMetrics() const;
+  [[nodiscard]] std::vector<Number>& _metricsForKey(std::string_view name);
+  void _addQualityMetric(OptionalText name, std::optional<Number> value, OptionalText sender);
+  void _appendQualityMetrics();
+  void _gatherQualityMetrics();
+
+  void _addHeaderLine(OptionalText label, OptionalText value);
+  void _addTimeInformation();
+  void _addCallInfoInformation();
+  void _addBuildInformation();
+  void _addFailureInformation();
+  void _addRecipientInformation();
+  void _addInitiatorInformation();
+  static void _writeStrings(const LogLines& strings, const std::string& path, AgentLog& log);
+  [[nodiscard]] static const std::string& _timeZoneAbbreviation(const SessionServices& services);
+
+  [[nodiscard]] std::optional<std::string> _property(const std::optional<std::string>& field) const;
+  void _setProperty(std::optional<std::string>& field, OptionalText text);
+
+  SessionServices& _services;
+  std::optional<WallTime> _dateStarted;
+  std::optional<WallTime> _dateEnded;
+  std::string _logBasePath;
+  std::string _sessionType;
+  std::optional<std::string> _initiatorID, _recipientID, _failureReason;  // under the property lock
+  mutable std::mutex _propertyLock;
+  std::optional<std::string> _model;
+  _ZalLoggingAgentSessionSortedLogList _simpleLogs;
+  _ZalLoggingAgentSessionSortedLogList _verboseLogs;
+  QualityLogList _qualityLogs;
+  std::vector<std::string> _callInfoCategories, _callInfoStrings;  // parallel
+  std::map<std::string, std::vector<Number>, std::less<>> _qualityMetrics;
+  FilesByCategory _filesToCollect;
+  EntryTimeText _dateFormatter;
+  bool _initiator = false;
+  bool _active = false;
+  bool _logCheckpoints = false;
+  bool _logDescriptions = false;
+  std::uint32_t _endFlags = 0;
+  MainThreadCheck _mainThread;
+  ScopedTimer _qualityPulse;
+  ScopedTimer _inactivity;
 };
 
 }  // namespace zal

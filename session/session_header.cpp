@@ -1,0 +1,64 @@
+#include "platform/agent_log.h"
+#include "platform/device_registry.h"
+#include "session/reference_time.h"
+#include "session/session_lines.h"
+#include "session/text_encoding.h"
+#include "session/vistel_session.h"
+
+namespace zal {
+
+namespace {
+
+/// The raw property up to its NUL; nothing when that is no text.
+std::optional<std::string> modelText(const std::string& bytes) {
+  std::string text = bytes.substr(0, bytes.find('\0'));
+  if (!isValidUtf8(text)) return std::nullopt;
+  return text;
+}
+
+}  // namespace
+
+std::optional<std::string> ZalLoggingAgentVistelSession::model() {
+  if (_model) return _model;
+  if (const auto bytes = _services.deviceRegistry.modelBytes()) _model = modelText(*bytes);
+  return _model;
+}
+
+void ZalLoggingAgentVistelSession::_addHeaderLine(OptionalText label, OptionalText value) {
+  const auto line = headerLine(label, value);
+  if (!line) return;
+  if (_logCheckpoints || _logDescriptions) _services.agentLog.notice(echoOf(*line));
+  _simpleLogs.prependLog(*line);
+  _verboseLogs.prependLog(*line);
+  _qualityLogs.insertAtFront(*line);
+}
+
+void ZalLoggingAgentVistelSession::_addTimeInformation() {
+  _addHeaderLine("Time", "Separator");
+  _addHeaderLine("Reference Time", referenceTime(_services.commandRunner, _services.roots.TemporaryRoot));
+}
+
+void ZalLoggingAgentVistelSession::_addCallInfoInformation() {
+  for (std::size_t item = 0; item < _callInfoCategories.size(); ++item) {
+    _addHeaderLine(_callInfoCategories[item], _callInfoStrings[item]);
+  }
+}
+
+void ZalLoggingAgentVistelSession::_addBuildInformation() {
+  BuildInformationCache& build = _services.buildInformation;
+  build.refill(_services.systemVersion, [this] { return model(); });
+  _addHeaderLine("Build Version", build.buildVersion());
+  _addHeaderLine("Device", build.deviceModel());
+  _addHeaderLine("Product Version", build.osVersion());
+  _addHeaderLine("Product Name", build.osName());
+}
+
+void ZalLoggingAgentVistelSession::_addFailureInformation() {
+  _addHeaderLine("Failure Reason", failureReason());
+}
+
+void ZalLoggingAgentVistelSession::_addRecipientInformation() { _addHeaderLine("Recipient ID", recipient()); }
+
+void ZalLoggingAgentVistelSession::_addInitiatorInformation() { _addHeaderLine("Initiator ID", initiator()); }
+
+}  // namespace zal

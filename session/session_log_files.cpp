@@ -1,0 +1,98 @@
+#include <filesystem>
+#include <system_error>
+
+#include "collectors/file_collector.h"
+#include "collectors/rotated_log_sets.h"
+#include "platform/agent_log.h"
+#include "platform/file_placement.h"
+#include "platform/open_directories.h"
+#include "platform/standard_path.h"
+#include "session/date_text.h"
+#include "session/line_file.h"
+#include "session/vistel_session.h"
+
+namespace zal {
+
+namespace {
+
+/// A log of fewer lines says nothing but that there was a session.
+constexpr std::size_t kFewestLines = 4;
+
+void createIfMissing(const std::string& directory) {
+  std::error_code error;
+  // A failure shows in the files that cannot be written then.
+  if (!std::filesystem::exists(directory, error)) createDirectoriesWithMode0777(directory);
+}
+
+}  // namespace
+
+const std::string& ZalLoggingAgentVistelSession::_timeZoneAbbreviation(const SessionServices& services) {
+  return services.timeZone.abbreviation(services.clock);
+}
+
+std::string ZalLoggingAgentVistelSession::logStringForDate(const SessionServices& services, WallTime date) {
+  return sessionDateText(services.clock.localTime(date)) + " (" + _timeZoneAbbreviation(services) + ")";
+}
+
+std::string ZalLoggingAgentVistelSession::logPathForDate(const SessionServices& services, WallTime date,
+                                                         std::string_view basePath, bool isInitiator) {
+  const std::string joined = std::string(basePath) + "/" + logStringForDate(services, date) +
+                             (isInitiator ? " (Initiator)" : " (Receiver)");
+  return resolveAndStandardize(joined, services.files.homeDirectory());
+}
+
+void ZalLoggingAgentVistelSession::_writeStrings(const LogLines& strings, const std::string& path,
+                                                 AgentLog& log) {
+  writeStrings(strings.lines, path, log);
+}
+
+void ZalLoggingAgentVistelSession::writeSessionLog(bool endedByEndAll) {
+  _mainThread.check("ZalLoggingAgentVistelSession");
+  AgentLog& log = _services.agentLog;
+  if (_simpleLogs.count() < kFewestLines && _verboseLogs.count() < kFewestLines &&
+      _qualityLogs.count() < kFewestLines) {
+    log.log("Logging", "No logs to write, bailing");
+    return;
+  }
+  if (!_dateStarted) {
+    log.console("", "Cannot write session log: we never started!");
+    return;
+  }
+  if (hasControlCharacters(_logBasePath)) {
+    log.warning("Refused to write into \"" + printable(_logBasePath) +
+                "\": its name holds control characters");
+    return;
+  }
+
+  createIfMissing(resolveAndStandardize(_logBasePath, _services.files.homeDirectory()));
+  const std::string directory = logPathForDate(_services, *_dateStarted, _logBasePath, _initiator);
+  createIfMissing(directory);
+  const std::string fileEnding = "Log (" + fileTimeText(_services.clock.localTime(*_dateStarted)) + ").log";
+  LinkRecentLogSets(_services.fileCollector, _services.roots, log, {_sessionType}, directory);
+
+  _addTimeInformation();
+  _addCallInfoInformation();
+  _addBuildInformation();
+  _addFailureInformation();
+  _addRecipientInformation();
+  _addInitiatorInformation();
+
+  const LogLines simple = _simpleLogs.copySortedLogList();
+  const LogLines verbose = _verboseLogs.copySortedLogList();
+  const LogLines quality = _qualityLogs.copy();
+  _simpleLogs.removeAllObjects();
+  _verboseLogs.removeAllObjects();
+  _qualityLogs.removeAllObjects();
+  _writeStrings(simple, directory + "/" + fileEnding, log);
+  _writeStrings(verbose, directory + "/Verbose " + fileEnding, log);
+  _writeStrings(quality, directory + "/Quality " + fileEnding, log);
+
+  placeCollectedFiles(_filesToCollect, directory, _services.fileCollector, log);
+
+  CollectionRequest request{_sessionType, directory, std::nullopt, !endedByEndAll, _endFlags};
+  const auto reason = failureReason();
+  if (!isEmptyText(reason)) request.reason = _sessionType + " - " + *reason;
+  if (_services.CollectServiceLogs) _services.CollectServiceLogs(request);
+}
+
+}  // namespace zal

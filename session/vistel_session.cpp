@@ -1,0 +1,106 @@
+#include "session/vistel_session.h"
+
+#include <utility>
+
+#include "platform/agent_log.h"
+#include "platform/local_notifications.h"
+#include "session/session_lines.h"
+
+namespace zal {
+
+namespace {
+constexpr std::string_view kEndAllSender = "ENDALL";
+constexpr std::string_view kForcedEnd = "FORCE: ";
+}  // namespace
+
+ZalLoggingAgentVistelSession::ZalLoggingAgentVistelSession(std::string sessionType, std::string logDirectory,
+                                                           SessionServices& services)
+    : _services(services),
+      _logBasePath(std::move(logDirectory)),
+      _sessionType(std::move(sessionType)),
+      _dateFormatter(services.clock, services.timeZone) {}
+
+void ZalLoggingAgentVistelSession::beginSessionWithSender(OptionalText sender) {
+  _mainThread.check("ZalLoggingAgentVistelSession");
+  const std::string_view name = sender.value_or("");
+  if (_active) {
+    endSessionWithSender(std::string(kForcedEnd).append(name));
+    // The end wrote already, unless there was too little: then this says so, and what there is goes
+    // on into the new session.
+    writeSessionLog(false);
+  }
+  _dateStarted = _services.clock.wallNow();
+  _active = true;
+  const std::string line = beginLine(name, _entryTime(_services.clock.wallNow()));
+  if (_logCheckpoints) _services.agentLog.notice(echoOf(line));
+  _simpleLogs.addLog(line, _currentTimeOfDay());
+  _verboseLogs.addLog(line, _currentTimeOfDay());
+  if (!_qualityPulse.isSet()) {
+    _qualityPulse =
+        ScopedTimer(_services.mainLoop,
+                    _services.mainLoop.callEvery(kQualityPulseInterval, [this] { _gatherQualityMetrics(); }));
+  }
+  _markActive();
+}
+
+void ZalLoggingAgentVistelSession::endSessionWithSender(OptionalText sender) {
+  _mainThread.check("ZalLoggingAgentVistelSession");
+  _qualityPulse.cancel();
+  _dateEnded = _services.clock.wallNow();
+  _active = false;
+  if (_simpleLogs.count() == 0 && _verboseLogs.count() == 0) {
+    _cancelInactivityTimer();
+    return;
+  }
+  const std::string line = endLine(sender.value_or(""), _entryTime(_services.clock.wallNow()));
+  if (_logCheckpoints) _services.agentLog.notice(echoOf(line));
+  _simpleLogs.addLog(line, _currentTimeOfDay());
+  _verboseLogs.addLog(line, _currentTimeOfDay());
+  _qualityLogs.append(line);
+  _appendQualityMetrics();
+  writeSessionLog(sender == kEndAllSender);
+  _cancelInactivityTimer();
+}
+
+void ZalLoggingAgentVistelSession::pulseFromSender(OptionalText /*sender*/) {
+  _mainThread.check("ZalLoggingAgentVistelSession");
+  _markActive();
+}
+
+void ZalLoggingAgentVistelSession::_markActive() {
+  _cancelInactivityTimer();
+  _inactivity = ScopedTimer(
+      _services.mainLoop, _services.mainLoop.callAfter(kSessionInactivityLimit, [this] { _postInactive(); }));
+}
+
+void ZalLoggingAgentVistelSession::_cancelInactivityTimer() { _inactivity.cancel(); }
+
+void ZalLoggingAgentVistelSession::_postInactive() {
+  // Who is told may drop the last reference to this object.
+  const auto self = weak_from_this().lock();
+  _cancelInactivityTimer();
+  _services.localNotifications.post(kSessionBecameInactive, this);
+}
+
+std::string_view ZalLoggingAgentVistelSession::_entryTime(WallTime moment) {
+  return _dateFormatter.text(moment);
+}
+
+double ZalLoggingAgentVistelSession::_currentTimeOfDay() const {
+  return secondsSinceEpoch(_services.clock.wallNow());
+}
+
+std::optional<std::string> ZalLoggingAgentVistelSession::_property(
+    const std::optional<std::string>& field) const {
+  const std::scoped_lock lock(_propertyLock);
+  return field;
+}
+
+void ZalLoggingAgentVistelSession::_setProperty(std::optional<std::string>& field, OptionalText text) {
+  std::optional<std::string> copy;
+  if (text) copy.emplace(*text);
+  const std::scoped_lock lock(_propertyLock);
+  field.swap(copy);
+}
+
+}  // namespace zal

@@ -1,0 +1,87 @@
+#include "session/line_file.h"
+
+#include <gtest/gtest.h>
+
+#include "tests/support/fake_services.h"
+#include "tests/support/temporary_directory.h"
+
+namespace zal {
+namespace {
+
+class LineFileTest : public ::testing::Test {
+ protected:
+  testing::TemporaryDirectory directory;
+  testing::RecordingAgentLog log;
+  std::string path = directory / "Log.log";
+  void write(const std::vector<std::string_view>& lines) { writeStrings(lines, path, log); }
+  [[nodiscard]] std::string written() const { return testing::readFile(path); }
+};
+
+TEST_F(LineFileTest, EndsEveryLineWithANewline) {
+  write({"one", "", "two\nlines"});
+  EXPECT_EQ(written(), "one\n\ntwo\nlines\n");
+}
+
+TEST_F(LineFileTest, MakesAnEmptyFileOfNoLines) {
+  write({});
+  EXPECT_TRUE(std::filesystem::exists(path));
+  EXPECT_EQ(written(), "");
+}
+
+TEST_F(LineFileTest, ReplacesWhatWasThere) {
+  testing::writeFile(path, "something longer than what comes");
+  write({"new"});
+  EXPECT_EQ(written(), "new\n");
+}
+
+TEST_F(LineFileTest, ALineWithOneTwoByteCharacterLosesItsNewline) {
+  write({"café", "next"});
+  EXPECT_EQ(written(), "cafénext\n");
+}
+
+TEST_F(LineFileTest, ALineLosesAsManyBytesAsItsUtf8FormIsLonger) {
+  write({"€", "€uro", "é"});  // 2 of 4 bytes, 5 of 7, 2 of 3
+  EXPECT_EQ(written(),
+            "\xE2\x82"
+            "€ur"
+            "é" +
+                std::string(""));
+}
+
+TEST_F(LineFileTest, ACharacterOutsideTheBasicPlaneCountsTwoUnits) {
+  write({"😀", "x"});  // 3 of 5 bytes
+  EXPECT_EQ(written(),
+            "\xF0\x9F\x98"
+            "x\n");
+}
+
+TEST_F(LineFileTest, WritesMoreThanOneBuffer) {
+  const std::string large(700'001, 'a');
+  write({large, large, large, "end"});
+  EXPECT_EQ(written(), large + "\n" + large + "\n" + large + "\nend\n");
+}
+
+TEST_F(LineFileTest, AFullDiskCostsOneWarning) {
+  path = "/dev/full";
+  const std::string large(700'000, 'a');
+  write({large, large, large, large});
+  EXPECT_EQ(log.lines,
+            std::vector<std::string>{"warning: Could not write /dev/full: No space left on device"});
+}
+
+TEST_F(LineFileTest, AFullDiskIsNoticedByASmallFileToo) {
+  path = "/dev/full";
+  write({"x"});
+  EXPECT_EQ(log.lines,
+            std::vector<std::string>{"warning: Could not write /dev/full: No space left on device"});
+}
+
+TEST_F(LineFileTest, AFileThatCannotBeOpenedCostsOneWarning) {
+  path = directory / "missing/Log.log";
+  write({"x"});
+  EXPECT_EQ(log.lines,
+            std::vector<std::string>{"warning: Could not write " + path + ": No such file or directory"});
+}
+
+}  // namespace
+}  // namespace zal
