@@ -5,15 +5,22 @@
 #include <unistd.h>
 
 #include <cerrno>
+#include <cstdio>
+#include <filesystem>
+#include <string_view>
+
+#include "platform/linux/config/path_text.h"
 
 namespace zal {
 namespace {
+
+std::error_code lastError() { return {errno, std::generic_category()}; }
 
 constexpr std::size_t kLargestFile = 1U << 20U;
 
 std::error_code readOpenFile(int descriptor, std::string& content) {
   struct stat status {};
-  if (::fstat(descriptor, &status) != 0) return {errno, std::generic_category()};
+  if (::fstat(descriptor, &status) != 0) return lastError();
   if (S_ISDIR(status.st_mode)) return std::make_error_code(std::errc::is_a_directory);
   if (!S_ISREG(status.st_mode)) return std::make_error_code(std::errc::invalid_argument);
   content.resize(kLargestFile + 1);
@@ -21,7 +28,7 @@ std::error_code readOpenFile(int descriptor, std::string& content) {
   while (length < content.size()) {
     const ssize_t count = ::read(descriptor, content.data() + length, content.size() - length);
     if (count < 0 && errno == EINTR) continue;
-    if (count < 0) return {errno, std::generic_category()};
+    if (count < 0) return lastError();
     if (count == 0) break;
     length += static_cast<std::size_t>(count);
   }
@@ -30,15 +37,49 @@ std::error_code readOpenFile(int descriptor, std::string& content) {
   return {};
 }
 
+std::error_code writeAndSync(int descriptor, std::string_view content) {
+  while (!content.empty()) {
+    const ssize_t count = ::write(descriptor, content.data(), content.size());
+    if (count < 0 && errno == EINTR) continue;
+    if (count < 0) return lastError();
+    content.remove_prefix(static_cast<std::size_t>(count));
+  }
+  if (::fsync(descriptor) != 0) return lastError();
+  return {};
+}
+
 }  // namespace
 
 std::error_code readTextFile(const std::string& path, std::string& content) {
   content.clear();
   const int descriptor = ::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY);
-  if (descriptor < 0) return {errno, std::generic_category()};
+  if (descriptor < 0) return lastError();
   const std::error_code error = readOpenFile(descriptor, content);
   ::close(descriptor);
   if (error) content.clear();
+  return error;
+}
+
+std::error_code replaceTextFile(const std::string& path, const std::string& content) {
+  std::error_code error;
+  std::string target = path;
+  if (std::filesystem::is_symlink(path, error)) {
+    target = std::filesystem::canonical(path, error).string();
+    if (error) return error;
+  }
+  std::filesystem::create_directories(parentDirectory(target), error);
+  if (error) return error;
+  struct stat old {};
+  const mode_t mode = ::stat(target.c_str(), &old) == 0 ? old.st_mode & 07777U : 0644U;
+  const std::string temporary = target + "." + std::to_string(::getpid()) + ".tmp";
+  const int descriptor =
+      ::open(temporary.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_NOFOLLOW | O_CLOEXEC, mode);
+  if (descriptor < 0) return lastError();
+  error = writeAndSync(descriptor, content);
+  if (!error && ::fchmod(descriptor, mode) != 0) error = lastError();
+  ::close(descriptor);
+  if (!error && ::rename(temporary.c_str(), target.c_str()) != 0) error = lastError();
+  if (error) ::unlink(temporary.c_str());
   return error;
 }
 

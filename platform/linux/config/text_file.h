@@ -9,4 +9,8 @@ namespace zal {
 /// Returned: an error for what is missing, unreadable, no regular file, or larger than 1 MiB.
 [[nodiscard]] std::error_code readTextFile(const std::string& path, std::string& content);
 
+/// Puts a synced file in the place of the old one in one step, keeping the old one's mode and
+/// following a symbolic link; makes missing directories. Returned: why not; the old file stands.
+[[nodiscard]] std::error_code replaceTextFile(const std::string& path, const std::string& content);
+
 }  // namespace zal
