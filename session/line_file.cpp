@@ -7,6 +7,7 @@
 #include <algorithm>
 #include <memory>
 #include <system_error>
+#include <utility>
 
 #include "session/text_encoding.h"
 
@@ -45,11 +46,9 @@ class BufferedFile {
 
   /// Zero, or the error number of the first thing that went wrong.
   int close() {
-    if (_file != nullptr) {
-      _flush();
-      if (std::fclose(_file) != 0) _note();
-      _file = nullptr;
-    }
+    if (_file == nullptr) return _error;
+    _flush();
+    if (std::fclose(std::exchange(_file, nullptr)) != 0) _note();
     return _error;
   }
 
