@@ -1,0 +1,185 @@
+#include "platform/linux/ipc/unix_peer_connection.h"
+
+#include <sys/socket.h>
+
+#include <cerrno>
+
+#include <asio/post.hpp>
+
+#include "platform/linux/wire/message_builder.h"
+#include "platform/linux/wire/wire_message.h"
+
+namespace zal {
+namespace {
+
+using asio::posix::descriptor_base;
+
+bool isRetryLater(int error) { return error == EAGAIN || error == EWOULDBLOCK; }
+
+}  // namespace
+
+UnixPeerConnection::UnixPeerConnection(std::shared_ptr<IpcContext> context, Descriptor socket,
+                                       const PeerCredentials& credentials)
+    : _context(std::move(context)), _credentials(credentials), _decoder(_context->settings.maximumPayload) {
+  _socket.emplace(_context->io);
+  _socket->assign(socket.get());
+  static_cast<void>(socket.release());
+}
+
+void UnixPeerConnection::start() {
+  _context->peers.insert(shared_from_this());
+  _awaitInput();
+}
+
+void UnixPeerConnection::deliverError(IpcError error) {
+  if (!_finished) _deliver(error);
+}
+
+void UnixPeerConnection::_deliver(const IpcEvent& event) {
+  if (_context->delivering) _context->handler(shared_from_this(), event);
+}
+
+/// Waits instead of trying: after a read that did not fill the buffer another one would only find
+/// nothing. Waiting notices by itself what came meanwhile.
+void UnixPeerConnection::_awaitInput() {
+  _socket->async_wait(descriptor_base::wait_read, [self = shared_from_this()](const std::error_code& error) {
+    if (!error) self->_readTurn();
+  });
+}
+
+void UnixPeerConnection::_readTurn() {
+  _context->mainThread.check("UnixPeerConnection");
+  if (!_socket) return;
+  const auto keptAlive = shared_from_this();
+  char* const buffer = _context->readBuffer.get();
+  const auto size = ::recv(_socket->native_handle(), buffer, kReadBufferSize, MSG_DONTWAIT);
+  if (size < 0 && (isRetryLater(errno) || errno == EINTR)) return _awaitInput();
+  if (size <= 0) return _becomeInvalid();
+
+  _decoder.feed({buffer, static_cast<std::size_t>(size)});
+  _takeFrames();
+  if (!_socket) return;
+  if (static_cast<std::size_t>(size) == kReadBufferSize) {
+    asio::post(_context->io, [keptAlive] { keptAlive->_readTurn(); });
+  } else {
+    _awaitInput();
+  }
+}
+
+void UnixPeerConnection::_takeFrames() {
+  while (const auto frame = _decoder.next()) {
+    _takeFrame(*frame);
+    if (!_socket) return;  // cancelled by its handler, or dropped
+  }
+  if (_decoder.failed()) {
+    _context->log.warning(_name() + " cannot be understood: " + _decoder.failure() + "; it is disconnected");
+    _becomeInvalid();
+  }
+}
+
+void UnixPeerConnection::_takeFrame(const Frame& frame) {
+  switch (frame.header.kind) {
+    case FrameKind::message:
+    case FrameKind::messageExpectingReply:
+      return _takeMessage(frame);
+    case FrameKind::barrier: {
+      if (_context->flush) _context->flush();
+      FrameHeader passed;
+      passed.kind = FrameKind::barrierPassed;
+      passed.cookie = frame.header.cookie;
+      return _queue(passed, {});
+    }
+    case FrameKind::reply:
+    case FrameKind::barrierPassed:
+      return _skipFrame();  // nothing was asked of a client
+  }
+}
+
+void UnixPeerConnection::_takeMessage(const Frame& frame) {
+  const auto message = WireMessage::fromFrame(frame);
+  if (!message) return _skipFrame();
+  _deliver(&*message);
+}
+
+void UnixPeerConnection::_skipFrame() {
+  if (++_skippedFrames == 1) {
+    _context->log.warning(_name() + " sent a frame that is no request; it and others like it are skipped");
+  }
+  deliverError(IpcError::connectionInterrupted);
+}
+
+bool UnixPeerConnection::sendReply(std::uint64_t replyToken, const ValueMap& reply) {
+  _context->mainThread.check("UnixPeerConnection");
+  if (!_socket || _finished) return false;
+  FrameHeader header;
+  header.kind = FrameKind::reply;
+  header.cookie = replyToken;
+  _queue(header, encodeDictionary(reply));
+  return isConnected();
+}
+
+void UnixPeerConnection::_queue(const FrameHeader& header, std::string_view payload) {
+  appendFrame(_backlog, header, payload);
+  if (!_awaitingOutput) _sendBacklog();
+  if (_socket && _backlog.size() - _sent > _context->settings.maximumReplyBacklog) {
+    _context->log.warning(_name() + " does not read its replies; it is disconnected");
+    _close();
+    // The handler hears of it on a turn of its own: it may be the one that is replying.
+    asio::post(_context->io, [self = shared_from_this()] { self->_becomeInvalid(); });
+  }
+}
+
+void UnixPeerConnection::_sendBacklog() {
+  while (_sent < _backlog.size()) {
+    const auto sent = ::send(_socket->native_handle(), _backlog.data() + _sent, _backlog.size() - _sent,
+                             MSG_DONTWAIT | MSG_NOSIGNAL);
+    if (sent >= 0) {
+      _sent += static_cast<std::size_t>(sent);
+    } else if (isRetryLater(errno)) {
+      return _awaitOutput();
+    } else if (errno != EINTR) {
+      break;  // the peer is gone; reading will find what it still sent, and then the end
+    }
+  }
+  std::string().swap(_backlog);
+  _sent = 0;
+}
+
+void UnixPeerConnection::_awaitOutput() {
+  _backlog.erase(0, std::exchange(_sent, 0));
+  _awaitingOutput = true;
+  _socket->async_wait(descriptor_base::wait_write, [self = shared_from_this()](const std::error_code& error) {
+    self->_awaitingOutput = false;
+    if (!error && self->_socket) self->_sendBacklog();
+  });
+}
+
+void UnixPeerConnection::_becomeInvalid() {
+  if (std::exchange(_finished, true)) return;
+  const auto keptAlive = shared_from_this();
+  _close();
+  if (_skippedFrames > 1) {
+    _context->log.log("IPC", _name() + ": " + std::to_string(_skippedFrames) + " frames were skipped");
+  }
+  _deliver(IpcError::connectionInvalid);
+}
+
+void UnixPeerConnection::cancel() {
+  _context->mainThread.check("UnixPeerConnection");
+  _finished = true;
+  _close();
+}
+
+void UnixPeerConnection::_close() {
+  const auto keptAlive = shared_from_this();
+  _context->peers.erase(keptAlive);
+  _socket.reset();
+  std::string().swap(_backlog);
+  _sent = 0;
+}
+
+std::string UnixPeerConnection::_name() const {
+  return "peer(" + std::to_string(_credentials.process) + ") of user " + std::to_string(_credentials.user);
+}
+
+}  // namespace zal

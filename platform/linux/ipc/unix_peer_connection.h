@@ -1,0 +1,63 @@
+#pragma once
+
+#include <memory>
+#include <optional>
+#include <string>
+
+#include <asio/posix/stream_descriptor.hpp>
+
+#include "platform/linux/ipc/access_policy.h"
+#include "platform/linux/ipc/descriptor.h"
+#include "platform/linux/ipc/ipc_context.h"
+#include "platform/linux/wire/frame_decoder.h"
+
+namespace zal {
+
+/// One accepted client. Reads and decodes, hands events to the context's handler, answers barriers,
+/// sends replies. What a handler throws passes through to the loop. Main thread only.
+///
+/// At most one read of the shared buffer's size a turn: a client that fills it goes to the back of
+/// the loop's queue, one that does not has been drained.
+class UnixPeerConnection final : public PeerConnection,
+                                 public std::enable_shared_from_this<UnixPeerConnection> {
+ public:
+  UnixPeerConnection(std::shared_ptr<IpcContext> context, Descriptor socket,
+                     const PeerCredentials& credentials);
+
+  /// Begins to deliver; called once, after it is owned by a shared pointer.
+  void start();
+  /// Delivers an error that does not end the connection.
+  void deliverError(IpcError error);
+
+  [[nodiscard]] pid_t processId() const override { return _credentials.process; }
+  [[nodiscard]] bool isConnected() const override { return _socket.has_value(); }
+  bool sendReply(std::uint64_t replyToken, const ValueMap& reply) override;
+  void cancel() override;
+
+ private:
+  void _deliver(const IpcEvent& event);
+  void _awaitInput();
+  void _readTurn();
+  void _takeFrames();
+  void _takeFrame(const Frame& frame);
+  void _takeMessage(const Frame& frame);
+  void _skipFrame();
+  void _queue(const FrameHeader& header, std::string_view payload);
+  void _sendBacklog();
+  void _awaitOutput();
+  void _becomeInvalid();
+  void _close();
+  [[nodiscard]] std::string _name() const;
+
+  std::shared_ptr<IpcContext> _context;
+  std::optional<asio::posix::stream_descriptor> _socket;  // none: closed
+  const PeerCredentials _credentials;
+  FrameDecoder _decoder;
+  std::string _backlog;  // answers, of which the first _sent bytes are gone
+  std::size_t _sent = 0;
+  bool _awaitingOutput = false;
+  bool _finished = false;  // no event is delivered any more
+  std::uint64_t _skippedFrames = 0;
+};
+
+}  // namespace zal
