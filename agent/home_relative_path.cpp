@@ -8,22 +8,14 @@ std::string_view withoutTrailingSlashes(std::string_view path) {
   return path;
 }
 
-/// Whether the path begins with these whole components.
-bool beginsWith(std::string_view path, std::string_view components) {
-  return path.starts_with(components) && (path.size() == components.size() || path[components.size()] == '/');
-}
-
 }  // namespace
 
 std::string homeRelativePath(std::string_view path, std::string_view home) {
   home = withoutTrailingSlashes(home);
-  if (home.empty() || !beginsWith(path, home)) return std::string(path);
-  return "~" + std::string(path.substr(home.size()));
-}
-
-std::string expandHome(std::string_view path, std::string_view home) {
-  if (!beginsWith(path, "~")) return std::string(path);
-  return std::string(withoutTrailingSlashes(home)) + std::string(path.substr(1));
+  const bool isBelow = !home.empty() && path.starts_with(home);
+  const std::string_view rest = path.substr(isBelow ? home.size() : 0);
+  if (!isBelow || (!rest.empty() && rest.front() != '/')) return std::string(path);
+  return "~" + std::string(rest);
 }
 
 }  // namespace zal

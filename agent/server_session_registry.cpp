@@ -1,14 +1,12 @@
 // Which session of the server is open under which type: begin, end, inactivity.
 
-#include <filesystem>
 #include <string>
-#include <system_error>
 #include <utility>
-#include <vector>
 
 #include "agent/home_relative_path.h"
 #include "agent/session_type_key.h"
 #include "agent/zal_logging_agent_server.h"
+#include "platform/open_directories.h"
 
 namespace zal {
 namespace {
@@ -110,8 +108,8 @@ void ZalLoggingAgentServer::forceNetworkDump() {
   const std::string directory = ZalLoggingAgentVistelSession::logPathForDate(
       _sessionEnvironment.services(), _platform.clock.wallNow(),
       _platform.configuration.roots.DiagnosticReportRoot + "/Vistel", false);
-  std::error_code ignored;
-  std::filesystem::create_directories(directory, ignored);
+  // One that cannot be made is the dump's own affair: it says what it could not write.
+  createDirectoriesWithMode0777(directory);
   _hooks.ForceNetworkDump(directory, true);
   _notePoorNetworkConditions();
   _noteActivity();

@@ -4,9 +4,9 @@
 #include <exception>
 #include <utility>
 
-#include "agent/home_relative_path.h"
 #include "agent/message_handler.h"
 #include "agent/verbose_log_purge.h"
+#include "platform/standard_path.h"
 
 namespace zal {
 namespace {
@@ -65,8 +65,9 @@ ZalLoggingAgentServer::ZalLoggingAgentServer(Platform& platform, AgentHooks hook
   _inactiveSessionObserver = _platform.localNotifications.observe(
       std::string(kSessionBecameInactive), [this](void* session) { _sessionBecameInactive(session); });
   _noteActivity();
-  purgeVerboseLogs(expandHome(_platform.configuration.roots.MobileLogRoot, _platform.files.homeDirectory()),
-                   SessionTypeList);
+  purgeVerboseLogs(
+      resolveAndStandardize(_platform.configuration.roots.MobileLogRoot, _platform.files.homeDirectory()),
+      SessionTypeList);
 }
 
 ZalLoggingAgentServer::~ZalLoggingAgentServer() {

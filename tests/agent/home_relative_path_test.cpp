@@ -17,13 +17,5 @@ TEST(HomeRelativePathTest, LeavesPathsElsewhereAlone) {
   EXPECT_EQ(homeRelativePath("~/Logs", "/home/user"), "~/Logs");
 }
 
-TEST(HomeRelativePathTest, ExpandsALeadingTildeOnly) {
-  EXPECT_EQ(expandHome("~/Logs", "/home/user"), "/home/user/Logs");
-  EXPECT_EQ(expandHome("~", "/home/user"), "/home/user");
-  EXPECT_EQ(expandHome("~/Logs", "/"), "/Logs");
-  EXPECT_EQ(expandHome("~other/Logs", "/home/user"), "~other/Logs");
-  EXPECT_EQ(expandHome("/a/~/b", "/home/user"), "/a/~/b");
-}
-
 }  // namespace
 }  // namespace zal
