@@ -57,6 +57,7 @@ struct ClientChannelStatus {
   std::size_t queuedBytes = 0;  ///< accepted and not yet written
   std::uint64_t sent = 0;       ///< requests wholly written
   std::uint64_t sentBytes = 0;
+  std::uint64_t writes = 0;  ///< in how many pieces
   std::uint64_t dropped = 0;
   std::uint64_t unconfirmed = 0;  ///< written to connections that broke before a flush covered them
   std::uint64_t connections = 0;  ///< made so far
@@ -100,7 +101,8 @@ class ClientChannel {
   [[nodiscard]] virtual double now() const = 0;
 };
 
-/// The host's channel. Never fails; an agent that is not there shows in the outcomes.
+/// The host's channel; throws only when the host gives no memory, thread or descriptor. An agent that
+/// is not there shows in the outcomes.
 [[nodiscard]] std::unique_ptr<ClientChannel> openClientChannel(ClientChannelOptions options);
 /// Where the agent of this user listens: $LIRRA_SOCKET, else com.vendel.lirra in $XDG_RUNTIME_DIR,
 /// else in /run for the superuser; empty when no rule gives a place.

@@ -22,7 +22,10 @@ class DeliveryLedger {
  public:
   void noteAccepted();
   void noteDropped() { ++_status.dropped; }
-  void noteBytesWritten(std::size_t bytes) { _status.sentBytes += bytes; }
+  void noteWrite(std::size_t bytes) {
+    ++_status.writes;
+    _status.sentBytes += bytes;
+  }
   void noteWritten(FrameBatch::Count count);
 
   void noteConnected(pid_t agent);

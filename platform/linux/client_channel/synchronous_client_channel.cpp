@@ -106,7 +106,6 @@ ClientOutcome SynchronousClientChannel::_writeFrame(std::string_view frame, Mome
     if (!_socket.isOpen() && !_connect(deadline, atOnce || attempt != 0)) return ClientOutcome::unreachable;
     switch (_writeWhole(frame, deadline)) {
       case Written::whole:
-        _ledger.noteBytesWritten(frame.size());
         return ClientOutcome::done;
       case Written::late:
         // Part of the frame may be on its way; nothing can follow it on this stream.
@@ -126,6 +125,7 @@ SynchronousClientChannel::Written SynchronousClientChannel::_writeWhole(std::str
   while (!frame.empty()) {
     const auto taken = _socket.write(frame);
     if (!taken) return Written::broken;
+    if (*taken != 0) _ledger.noteWrite(*taken);
     frame.remove_prefix(*taken);
     if (*taken == 0 && !waitFor(_socket.descriptor(), POLLOUT, deadline)) return Written::late;
   }

@@ -79,7 +79,7 @@ void UnixClientChannel::_write() {
 
     const Lock lock(_mutex);
     _batchBytes = _batch.unwritten().size();
-    _ledger.noteBytesWritten(taken.value_or(0));
+    if (taken) _ledger.noteWrite(*taken);
     if (_batchBytes != 0) continue;
     _ledger.noteWritten(_batch.count());
     _batch.clear();
@@ -135,21 +135,22 @@ void UnixClientChannel::_reportDropped() {
 
 UnixClientChannel::Sleep UnixClientChannel::_planSleep() {
   if (_stop) return {false, 0ns};
+  const auto now = steady_clock::now();
+  const auto paused = now - _lastWrite;
   const bool nothing = _batch.isEmpty() && _queue.isEmpty();
-  if (nothing) {
+  if (nothing && (!_socket.isOpen() || paused >= kPause)) {
     _wakeAt = 1;
     _queue.trim();
     _batch.trim();
     return {};
   }
-  const auto now = steady_clock::now();
   if (!_socket.isOpen()) {
     if (_hurry) return {false, 0ns};
     return {false, std::max<std::chrono::nanoseconds>(_retry.due() - now, 0ns)};
   }
   if (!_batch.isEmpty()) return {true};  // the agent is slow to read
-  const auto paused = now - _lastWrite;
   if (_hurry || _queue.unwritten().size() >= kLargeWrite || paused >= kPause) return {false, 0ns};
+  // Empty or not: whoever has just sent something is likely to send more.
   _wakeAt = kLargeWrite;
   return {false, kPause - paused};
 }
