@@ -1,0 +1,131 @@
+// Writes the corpora's seeds anew: make_corpus <directory of the corpora>. Inputs that once broke
+// something lie beside them under names of their own and are left alone.
+
+#include <cstdio>
+#include <fstream>
+#include <functional>
+#include <string>
+
+#include <flatbuffers/flexbuffers.h>
+
+#include "platform/linux/wire/message_builder.h"
+
+namespace {
+
+using flexbuffers::Builder;
+
+std::string directory;
+
+void keep(const std::string& name, const std::string& bytes) {
+  std::ofstream(directory + "/" + name, std::ios::binary) << bytes;
+}
+
+void keepMessage(const std::string& name, const std::function<void(Builder&)>& fill,
+                 flexbuffers::BuilderFlag flags = flexbuffers::BUILDER_FLAG_SHARE_KEYS) {
+  Builder builder(256, flags);
+  builder.Map([&] { fill(builder); });
+  builder.Finish();
+  keep("message_fuzzer/" + name, {builder.GetBuffer().begin(), builder.GetBuffer().end()});
+}
+
+std::string frame(zal::FrameKind kind, std::uint64_t cookie, std::string_view payload) {
+  std::string bytes;
+  zal::FrameHeader header;
+  header.kind = kind;
+  header.cookie = cookie;
+  zal::appendFrame(bytes, header, payload);
+  return bytes;
+}
+
+/// The chunk sizes less one, then the stream.
+std::string cut(std::string sizes, const std::string& stream) {
+  return std::string(1, static_cast<char>(sizes.size())) + sizes + stream;
+}
+
+void makeFrames() {
+  using zal::FrameKind;
+  const std::string one = frame(FrameKind::message, 0, "payload");
+  const std::string barrier = frame(FrameKind::barrier, 0x1122334455667788U, "");
+  keep("frame_fuzzer/whole", cut("\xFF", one + barrier + one));
+  keep("frame_fuzzer/single_bytes",
+       cut(std::string(1, '\0'), one + frame(FrameKind::messageExpectingReply, 9, "eightchr")));
+  keep("frame_fuzzer/torn", cut("\x06\x11", (one + one + one).substr(0, 60)));
+  keep("frame_fuzzer/answers",
+       cut("\x0F", frame(FrameKind::reply, 1, "r") + frame(FrameKind::barrierPassed, 2, "")));
+  std::string bad = one;
+  bad[4] = 2;
+  keep("frame_fuzzer/unknown_version", cut("\x07", one + bad + one));
+  bad = one;
+  bad[6] = 5;
+  keep("frame_fuzzer/unknown_kind", cut("\x07", bad));
+  bad = one;
+  bad[3] = '\x7F';
+  keep("frame_fuzzer/huge_length", cut("\x07", bad));
+  bad = barrier;
+  bad[0] = 8;
+  keep("frame_fuzzer/barrier_with_payload", cut("\x03", bad));
+  keep("frame_fuzzer/largest", cut("\xFF\x10", frame(FrameKind::message, 0, std::string(4096, 'L')) + one));
+}
+
+void makeMessages() {
+  zal::MessageBuilder builder;
+  builder.setInt64("__ipc__event_code__", 6);
+  builder.setString("description", "rtt");
+  builder.setCodedNumber("number", 12.5);
+  builder.setString("session", "Vistel");
+  builder.setString("sender", "callservice");
+  std::string bytes;
+  builder.finish(bytes, zal::FrameKind::message, 0);
+  keep("message_fuzzer/metric", bytes.substr(zal::kFrameHeaderSize));
+  keepMessage("empty", [](Builder&) {});
+  keepMessage("every_type", [](Builder& b) {
+    b.Null("null");
+    b.Bool("bool", true);
+    b.Int("int", -1);
+    b.UInt("uint", 1U << 31U);
+    b.Double("real", 0.1);
+    b.Float("short", 0.5F);
+    b.IndirectInt("indirectInt", -5000);
+    b.IndirectUInt("indirectUInt", 5000);
+    b.IndirectDouble("indirectReal", 0.2);
+    b.String("text", "t\xC3\xBC\xFF");
+    b.Key("blob");
+    b.Blob("\x05\x04\x01", 3);
+  });
+  keepMessage("user_info", [](Builder& b) {
+    b.Map("userInfo", [&] {
+      b.Vector("list", [&] {
+        b.String("x");
+        b.Map([&] { b.Int("deep", 1); });
+      });
+      b.TypedVector("ints", [&] {
+        b.Int(1);
+        b.Int(300);
+      });
+      const double pair[] = {0.5, 0.25};
+      b.Key("pair");
+      b.FixedTypedVector(pair, 2);
+    });
+  });
+  keepMessage(
+      "shared",
+      [](Builder& b) {
+        b.Vector("userInfo", [&] {
+          for (int i = 0; i < 5; ++i) b.Map([&] { b.String("same", "same"); });
+        });
+      },
+      flexbuffers::BUILDER_FLAG_SHARE_ALL);
+  keepMessage("control_characters", [](Builder& b) { b.String("k\n", "a\nb\x1b[0m\xE2\x80\xAE"); });
+}
+
+}  // namespace
+
+int main(int count, char** arguments) {
+  if (count != 2) {
+    std::fprintf(stderr, "usage: make_corpus DIRECTORY\n");
+    return 2;
+  }
+  directory = arguments[1];
+  makeFrames();
+  makeMessages();
+}
