@@ -1,0 +1,192 @@
+// The agent beside its peers on this machine, in one table. Started by bench/run.
+//
+//     agent_bench PROGRAM_FOLDER [--quick]
+
+#include <sys/utsname.h>
+#include <unistd.h>
+
+#include <cstdio>
+#include <cstring>
+#include <filesystem>
+#include <vector>
+
+#include "bench/ingest/idle.h"
+#include "bench/ingest/list_figures.h"
+#include "bench/ingest/rounds.h"
+#include "bench/ingest/start_up.h"
+#include "bench/servers/agent_server.h"
+#include "bench/support/scratch_folder.h"
+#include "bench/support/statistics.h"
+#include "bench/support/table.h"
+
+namespace zal::bench {
+namespace {
+
+using Rows = std::vector<Row>;
+
+std::string mebibytes(double value) { return decimal(value, 2) + " MiB"; }
+std::string cpu(double seconds) { return decimal(seconds, 2) + " s"; }
+
+void addIngest(Rows& rows, const RoundResults& results) {
+  const auto add = [&](const char* figure, Subject ours, unsigned clients, Subject peer, double target,
+                       double IngestResult::*field = &IngestResult::recordsPerSecond) {
+    for (const Subject subject : {ours, peer}) {
+      if (results.ingest.contains({subject, clients})) continue;
+      rows.push_back(skipped(figure, results.missing.at(subject)));
+      return;
+    }
+    const double mine = results.ingest.at({ours, clients}).*field;
+    const double theirs = results.ingest.at({peer, clients}).*field;
+    if (field == &IngestResult::cpuSecondsPerMillion) {
+      rows.push_back(target > 0 ? atMost(figure, mine, theirs, target, cpu)
+                                : plain(figure, mine, theirs, cpu));
+    } else {
+      rows.push_back(target > 0 ? atLeast(figure, mine, theirs, target, rate)
+                                : plain(figure, mine, theirs, rate));
+    }
+  };
+  add("ingest, 4 clients, one record a write : journald", Subject::agent, 4, Subject::journald, 8);
+  add("ingest, 1 client,  one record a write : journald", Subject::agent, 1, Subject::journald, 0);
+  add("ingest, 4 clients, one record a write : rsyslog", Subject::agent, 4, Subject::rsyslog, 3.5);
+  add("ingest, 1 client,  one record a write : rsyslog", Subject::agent, 1, Subject::rsyslog, 0);
+  add("ingest, 4 clients, one record a write : undecoded", Subject::agent, 4, Subject::undecoded, 0);
+  add("ingest, 1 client,  one record a write : undecoded", Subject::agent, 1, Subject::undecoded, 0);
+  add("ingest, 4 clients, client library : journald", Subject::library, 4, Subject::journald, 14);
+  add("ingest, 1 client,  client library : journald", Subject::library, 1, Subject::journald, 0);
+  constexpr auto kCpu = &IngestResult::cpuSecondsPerMillion;
+  add("server CPU a million, 4 clients, one a write : journald", Subject::agent, 4, Subject::journald, 0.1,
+      kCpu);
+  add("server CPU a million, 1 client,  one a write : journald", Subject::agent, 1, Subject::journald, 0,
+      kCpu);
+  add("server CPU a million, 4 clients, library : journald", Subject::library, 4, Subject::journald, 0, kCpu);
+  add("server CPU a million, 4 clients, one a write : rsyslog", Subject::agent, 4, Subject::rsyslog, 0, kCpu);
+  add("server CPU a million, 4 clients, one a write : undecoded", Subject::agent, 4, Subject::undecoded, 0,
+      kCpu);
+}
+
+void addLatency(Rows& rows, const RoundResults& results) {
+  const auto add = [&](const char* figure, Subject peer, double std::pair<double, double>::*field,
+                       double target) {
+    if (!results.latency.contains(Subject::agent) || !results.latency.contains(peer)) {
+      rows.push_back(skipped(figure, results.missing.contains(peer) ? results.missing.at(peer) : "no agent"));
+      return;
+    }
+    const double mine = results.latency.at(Subject::agent).*field;
+    const double theirs = results.latency.at(peer).*field;
+    rows.push_back(target > 0 ? atMost(figure, mine, theirs, target, duration)
+                              : plain(figure, mine, theirs, duration));
+  };
+  using Pair = std::pair<double, double>;
+  add("send to line-in-file at 200/s, p50 : journald", Subject::journald, &Pair::first, 0.8);
+  add("send to line-in-file at 200/s, p99 : journald", Subject::journald, &Pair::second, 0.9);
+  add("send to line-in-file at 200/s, p50 : rsyslog", Subject::rsyslog, &Pair::first, 0);
+  add("send to line-in-file at 200/s, p99 : rsyslog", Subject::rsyslog, &Pair::second, 0);
+}
+
+Row memoryRow(const char* figure, double mebibytesUsed, double peerUsed, double limit) {
+  return {
+      figure, mebibytes(mebibytesUsed),      peerUsed > 0 ? mebibytes(peerUsed) : "",
+      "",     "at most " + mebibytes(limit), mebibytesUsed > 0 && mebibytesUsed <= limit ? "met" : "MISSED"};
+}
+
+void addMemory(Rows& rows, const RoundResults& results) {
+  const auto agent = results.ingest.find({Subject::agent, 4});
+  if (agent == results.ingest.end()) {
+    rows.push_back(skipped("memory of the agent", results.missing.at(Subject::agent)));
+    return;
+  }
+  const auto journald = results.ingest.find({Subject::journald, 4});
+  const IngestResult other = journald == results.ingest.end() ? IngestResult{} : journald->second;
+  const IngestResult& own = agent->second;
+  rows.push_back(
+      memoryRow("memory at rest (resident) : journald", own.residentAtRest, other.residentAtRest, 6));
+  rows.push_back(
+      memoryRow("memory after the records (resident) : journald", own.residentAfter, other.residentAfter, 8));
+  rows.push_back({"memory after the records (proportional) : journald", mebibytes(own.proportionalAfter),
+                  mebibytes(other.proportionalAfter), "", "", ""});
+}
+
+void addStartUp(Rows& rows, const std::filesystem::path& programs, unsigned runs) {
+  fprintf(stderr, "starting each daemon %u times\n", runs);
+  const ScratchFolder folder;
+  const ChildProcess::Options agent = AgentServer::options(programs, folder.path(), 1U << 30U);
+  ChildProcess::Options bare;
+  const auto bareSocket = folder.path() / "bare.sock";
+  bare.command = {(programs / "bare_daemon").string(), bareSocket.string(),
+                  (folder.path() / "bare.log").string()};
+  std::vector<double> ours;
+  std::vector<double> theirs;
+  for (unsigned run = 0; run < runs; ++run) {
+    ours.push_back(measureStartUp(agent, AgentServer::socketIn(folder.path())));
+    theirs.push_back(measureStartUp(bare, bareSocket));
+  }
+  constexpr const char* kFigure = "exec to listening socket : bare Asio + spdlog daemon";
+  if (percentile(ours, 0) < 0 || percentile(theirs, 0) < 0) {
+    rows.push_back(skipped(kFigure, "a daemon did not listen"));
+  } else {
+    rows.push_back(atMost(kFigure, median(ours), median(theirs), 1.5, duration));
+  }
+}
+
+void addLists(Rows& rows, std::map<std::string, double> figures) {
+  if (figures.empty()) {
+    rows.push_back(skipped("sorted insertion, session end", "list_bench failed"));
+    return;
+  }
+  for (const char* order : {"ascending", "descending", "random", "zigzag", "equal"}) {
+    rows.push_back(plain(std::string("timed entries, ") + order + " : multimap", figures[order],
+                         figures[std::string("multimap_") + order], duration));
+  }
+  rows.push_back(atMost("timed entries, worst order : multimap's worst", figures["worst"],
+                        figures["multimap_worst"], 0.25, duration));
+  rows.push_back(atMost("timed entries, worst order : own ascending", figures["worst"], figures["ascending"],
+                        3, duration));
+  rows.push_back(atMost("ending a session of verbose lines : plain write", figures["session_end"],
+                        figures["plain_write"], 2, duration));
+}
+
+int run(const std::filesystem::path& programs, bool quick) {
+  Extent extent;
+  if (quick) extent = {1, 5'000, 50, 3, 2, 20'000};
+  utsname host{};
+  uname(&host);
+  Rows rows;
+  RoundResults results = runRounds(programs, extent);
+  addIngest(rows, results);
+  addLatency(rows, results);
+  addMemory(rows, results);
+  addStartUp(rows, programs, extent.startUps);
+  {
+    // The idle agent idles on while the lists are measured: its own switches are counted, nobody else's.
+    IdleWatch idle(programs);
+    fprintf(stderr, "lists and session ends of %llu entries; an agent left alone for %u s\n",
+            static_cast<unsigned long long>(extent.entries), extent.idleSeconds);
+    addLists(rows, runListBench(programs, extent.entries, extent.rounds));
+    if (idle.missing().empty()) {
+      const auto switches = idle.switchesAfter(extent.idleSeconds);
+      rows.push_back({"wake-ups in " + std::to_string(extent.idleSeconds) + " idle seconds",
+                      std::to_string(switches), "", "", "0", switches == 0 ? "met" : "MISSED"});
+    } else {
+      rows.push_back(skipped("wake-ups when idle", idle.missing()));
+    }
+  }
+  printf("\n%s %s, %ld processors, files in %s, %llu records of 120 bytes a run, %u rounds\n\n", host.sysname,
+         host.release, sysconf(_SC_NPROCESSORS_ONLN), ScratchFolder::parent().c_str(),
+         static_cast<unsigned long long>(extent.records), extent.rounds);
+  printTable(rows);
+  const bool agentWorked =
+      !results.missing.contains(Subject::agent) && !results.missing.contains(Subject::library);
+  return agentWorked ? 0 : 1;
+}
+
+}  // namespace
+}  // namespace zal::bench
+
+int main(int count, char** arguments) {
+  const bool quick = count == 3 && strcmp(arguments[2], "--quick") == 0;
+  if (count < 2 || (count == 3 && !quick) || count > 3) {
+    fprintf(stderr, "usage: agent_bench PROGRAM_FOLDER [--quick]\n");
+    return 2;
+  }
+  return zal::bench::run(arguments[1], quick);
+}
