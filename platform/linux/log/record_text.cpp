@@ -1,0 +1,108 @@
+#include "platform/linux/log/record_text.h"
+
+#include <array>
+#include <bit>
+#include <charconv>
+#include <cstdint>
+#include <cstring>
+
+namespace zal {
+namespace {
+
+constexpr std::uint64_t kOnes = 0x0101010101010101U;
+constexpr std::uint64_t kTops = 0x8080808080808080U;
+
+/// Top bit of each byte that is zero; bytes above a zero one may be marked too, never below it.
+constexpr std::uint64_t zeroBytes(std::uint64_t word) { return (word - kOnes) & ~word & kTops; }
+constexpr std::uint64_t bytesBelow0x20(std::uint64_t word) { return (word - kOnes * 0x20) & ~word & kTops; }
+
+bool isSpecial(unsigned char c) { return c < 0x20 || c == 0x7f || c == 0xC2; }
+
+/// How many bytes at the start need no second look: neither a control character nor the lead byte
+/// that the control characters from U+0080 to U+009F begin with. Eight at a time, since nearly all
+/// of what is logged passes here.
+std::size_t plainLength(const char* text, std::size_t length) {
+  std::size_t at = 0;
+  if constexpr (std::endian::native == std::endian::little) {
+    for (; at + 8 <= length; at += 8) {
+      std::uint64_t word = 0;
+      std::memcpy(&word, text + at, 8);
+      const std::uint64_t found =
+          bytesBelow0x20(word) | zeroBytes(word ^ (kOnes * 0x7f)) | zeroBytes(word ^ (kOnes * 0xC2));
+      if (found != 0) return at + static_cast<std::size_t>(std::countr_zero(found)) / 8;
+    }
+  }
+  while (at < length && !isSpecial(static_cast<unsigned char>(text[at]))) ++at;
+  return at;
+}
+
+void appendEscaped(std::string& target, unsigned char c) {
+  constexpr std::string_view kDigits = "0123456789abcdef";
+  const std::array<char, 4> escaped{'\\', 'x', kDigits[c >> 4U], kDigits[c & 15U]};
+  target.append(escaped.data(), escaped.size());
+}
+
+template <class Integer>
+void appendNumber(std::string& target, Integer number) {
+  std::array<char, 24> digits;
+  const auto end = std::to_chars(digits.data(), digits.data() + digits.size(), number).ptr;
+  target.append(digits.data(), static_cast<std::size_t>(end - digits.data()));
+}
+
+}  // namespace
+
+void appendMarkedText(std::string& target, std::string_view text, std::string_view linePrefix) {
+  for (;;) {
+    const std::size_t plain = plainLength(text.data(), text.size());
+    target.append(text.data(), plain);
+    if (plain == text.size()) return;
+    const auto special = static_cast<unsigned char>(text[plain]);
+    text.remove_prefix(plain + 1);
+    if (special == '\n') {
+      target += '\n';
+      target.append(linePrefix).append(kContinuationMark);
+    } else if (special == '\t') {
+      target += '\t';
+    } else if (special != 0xC2) {
+      appendEscaped(target, special);
+    } else if (!text.empty() && static_cast<unsigned char>(text.front()) < 0xA0 &&
+               static_cast<unsigned char>(text.front()) >= 0x80) {
+      appendEscaped(target, static_cast<unsigned char>(text.front()));
+      text.remove_prefix(1);
+    } else {
+      target += static_cast<char>(special);
+    }
+  }
+}
+
+void appendRecord(std::string& target, const LogRecord& record, std::string_view timeText,
+                  std::string_view processText) {
+  target.append(timeText).append(" <");
+  appendNumber(target, record.level);
+  target.append("> ");
+  if (record.time != 0) {
+    target.append("t=");
+    appendNumber(target, record.time);
+    target += ' ';
+  }
+  if (record.processInformation) target.append(processText) += ' ';
+  appendMarkedText(target, record.line);
+  target += '\n';
+}
+
+std::size_t nextRecordStart(std::string_view text, std::size_t offset) {
+  for (;;) {
+    const std::size_t lineEnd = text.find('\n', offset);
+    if (lineEnd == std::string_view::npos) return text.size();
+    offset = lineEnd + 1;
+    if (!text.substr(offset).starts_with(kContinuationMark)) return offset;
+  }
+}
+
+std::size_t countRecords(std::string_view text) {
+  std::size_t count = 0;
+  for (std::size_t at = 0; at < text.size(); at = nextRecordStart(text, at)) ++count;
+  return count;
+}
+
+}  // namespace zal

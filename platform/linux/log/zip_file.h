@@ -1,0 +1,14 @@
+#pragma once
+
+#include <string>
+#include <system_error>
+
+namespace zal {
+
+/// Packs one file into a fresh zip archive, under `entryName` and with its time of modification, and
+/// syncs the archive to the disk. Any thread; takes its time. Returned: why not; then the target is
+/// gone.
+[[nodiscard]] std::error_code packIntoZip(const std::string& source, const std::string& target,
+                                          const std::string& entryName);
+
+}  // namespace zal
