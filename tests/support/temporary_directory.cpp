@@ -32,7 +32,7 @@ std::string readFile(const std::string& path) {
 std::string listTree(const std::string& directory) {
   std::set<std::string> names;
   for (const auto& entry : std::filesystem::recursive_directory_iterator(directory)) {
-    std::string name = std::filesystem::relative(entry.path(), directory).string();
+    std::string name = entry.path().lexically_relative(directory).string();
     if (entry.is_directory() && !entry.is_symlink()) name += '/';
     names.insert(name);
   }

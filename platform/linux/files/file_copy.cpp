@@ -1,0 +1,146 @@
+#include "platform/linux/files/file_copy.h"
+
+#include <dirent.h>
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <memory>
+#include <optional>
+#include <utility>
+#include <vector>
+
+#include "platform/linux/files/file_content.h"
+#include "platform/linux/files/system_error.h"
+#include "platform/linux/ipc/descriptor.h"
+
+namespace zal {
+
+namespace {
+
+// Without set-user-id and set-group-id: the copy is ours, and would lend our rights to its reader.
+constexpr mode_t kPermissionBits = S_IRWXU | S_IRWXG | S_IRWXO;
+constexpr int kOpenSource = O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC;
+constexpr int kOpenDirectory = O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC;
+
+/// A name in an open directory: a path that cannot be led elsewhere by a link put in its way.
+struct Place {
+  int directory;
+  const char* name;
+};
+
+class TreeCopy {
+ public:
+  explicit TreeCopy(CopyOptions options) : _options(options) {}
+
+  void copy(Place source, Place target) {
+    struct stat status {};
+    if (::fstatat(source.directory, source.name, &status, AT_SYMLINK_NOFOLLOW) != 0) {
+      _note(lastSystemError());
+    } else if (S_ISREG(status.st_mode)) {
+      _note(_copyFile(source, target));
+    } else if (S_ISLNK(status.st_mode)) {
+      _note(_copyLink(source, target, status));
+    } else if (S_ISDIR(status.st_mode)) {
+      _note(_copyDirectory(source, target));
+    } else if (_targetRoot) {
+      ++_outcome.skipped;
+    } else {
+      _note(std::make_error_code(std::errc::operation_not_supported));
+    }
+  }
+  [[nodiscard]] const CopyOutcome& outcome() const { return _outcome; }
+
+ private:
+  void _note(const std::error_code& error) {
+    if (error && !_outcome.error) _outcome.error = error;
+  }
+
+  /// Last, because writing moves the time, and a directory may get a mode that forbids writing.
+  std::error_code _finish(int target, const struct stat& status) {
+    const timespec times[2] = {status.st_atim, status.st_mtim};
+    if (::fchmod(target, status.st_mode & kPermissionBits) != 0) return lastSystemError();
+    if (::futimens(target, times) != 0) return lastSystemError();
+    if (_options.sync && ::fsync(target) != 0) return lastSystemError();
+    return {};
+  }
+
+  std::error_code _copyFile(Place source, Place target) {
+    const Descriptor from(::openat(source.directory, source.name, kOpenSource));
+    if (!from.isOpen()) return lastSystemError();
+    struct stat status {};
+    if (::fstat(from.get(), &status) != 0) return lastSystemError();
+    // Something else may have taken the name since it was looked at.
+    if (!S_ISREG(status.st_mode)) return std::make_error_code(std::errc::operation_not_supported);
+    Descriptor to(
+        ::openat(target.directory, target.name, O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, S_IRUSR | S_IWUSR));
+    if (!to.isOpen()) return lastSystemError();
+    std::error_code error = copyFileContent(from.get(), to.get());
+    if (!error) error = _finish(to.get(), status);
+    if (::close(to.release()) != 0 && !error) error = lastSystemError();
+    if (error) ::unlinkat(target.directory, target.name, 0);
+    return error;
+  }
+
+  static std::error_code _copyLink(Place source, Place target, const struct stat& status) {
+    // Room for more than the link says it has: generated ones say 0, and it may grow meanwhile.
+    std::vector<char> text(static_cast<std::size_t>(status.st_size) + 4096);
+    const ssize_t length = ::readlinkat(source.directory, source.name, text.data(), text.size());
+    if (length < 0) return lastSystemError();
+    if (static_cast<std::size_t>(length) == text.size()) {
+      return std::make_error_code(std::errc::filename_too_long);
+    }
+    text[static_cast<std::size_t>(length)] = '\0';
+    if (::symlinkat(text.data(), target.directory, target.name) != 0) return lastSystemError();
+    const timespec times[2] = {status.st_atim, status.st_mtim};
+    ::utimensat(target.directory, target.name, times, AT_SYMLINK_NOFOLLOW);
+    return {};
+  }
+
+  std::error_code _copyDirectory(Place source, Place target) {
+    Descriptor from(::openat(source.directory, source.name, kOpenDirectory));
+    struct stat status {};
+    if (!from.isOpen() || ::fstat(from.get(), &status) != 0) return lastSystemError();
+    if (_targetRoot == Identity{status.st_dev, status.st_ino}) return {};  // the copy itself
+    if (::mkdirat(target.directory, target.name, S_IRWXU) != 0) return lastSystemError();
+    const Descriptor to(::openat(target.directory, target.name, kOpenDirectory));
+    struct stat made {};
+    if (!to.isOpen() || ::fstat(to.get(), &made) != 0) return lastSystemError();
+    if (!_targetRoot) _targetRoot = Identity{made.st_dev, made.st_ino};
+
+    const std::unique_ptr<DIR, int (*)(DIR*)> listing(::fdopendir(from.get()), &::closedir);
+    if (!listing) return lastSystemError();
+    const int directory = from.release();  // the listing closes it
+    for (;;) {
+      errno = 0;
+      const dirent* entry = ::readdir(listing.get());
+      if (entry == nullptr) break;
+      const std::string name = entry->d_name;
+      if (name != "." && name != "..") copy({directory, name.c_str()}, {to.get(), name.c_str()});
+    }
+    if (errno != 0) _note(lastSystemError());
+    return _finish(to.get(), status);
+  }
+
+  using Identity = std::pair<dev_t, ino_t>;
+  const CopyOptions _options;
+  std::optional<Identity> _targetRoot;  // the outermost directory made, once there is one
+  CopyOutcome _outcome;
+};
+
+}  // namespace
+
+CopyOutcome copyTree(const std::string& source, const std::string& target, CopyOptions options) {
+  TreeCopy copy(options);
+  copy.copy({AT_FDCWD, source.c_str()}, {AT_FDCWD, target.c_str()});
+  return copy.outcome();
+}
+
+std::error_code syncDirectory(const std::string& directory) {
+  const Descriptor opened(::open(directory.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+  if (!opened.isOpen() || ::fsync(opened.get()) != 0) return lastSystemError();
+  return {};
+}
+
+}  // namespace zal

@@ -1,0 +1,96 @@
+#include "platform/linux/files/posix_file_placement.h"
+
+#include <fcntl.h>
+#include <unistd.h>
+
+#include <filesystem>
+#include <utility>
+
+#include "platform/linux/files/file_copy.h"
+#include "platform/linux/files/private_directory.h"
+#include "platform/linux/files/rename_no_replace.h"
+#include "platform/linux/files/system_error.h"
+
+namespace zal {
+
+namespace {
+
+constexpr int kMostSaveNames = 10'000;
+
+std::string parentOf(const std::string& path) {
+  const std::string parent = std::filesystem::path(path).parent_path().string();
+  return parent.empty() ? "." : parent;
+}
+
+void removeTree(const std::string& path) {
+  std::error_code ignored;  // the error that led here is the one to report
+  std::filesystem::remove_all(path, ignored);
+}
+
+/// Copies to a hidden name first, so that the target's own name never shows a half file.
+std::error_code copyIntoPlace(const std::string& source, const std::string& target) {
+  const std::string directory = parentOf(target);
+  const std::string temporary = directory + "/.zal-" + randomName();
+  const CopyOutcome copied = copyTree(source, temporary, {.sync = true});
+  std::error_code error = copied.error;
+  if (!error && copied.skipped > 0) error = std::make_error_code(std::errc::operation_not_supported);
+  if (!error) error = renameNoReplace(temporary, target);
+  if (error) {
+    removeTree(temporary);
+    return error;
+  }
+  return syncDirectory(directory);
+}
+
+}  // namespace
+
+PosixFilePlacement::PosixFilePlacement(std::string homeDirectory, std::string temporaryArea)
+    : _home(std::move(homeDirectory)), _temporaryArea(std::move(temporaryArea)) {}
+
+std::string PosixFilePlacement::randomTemporaryPath(std::string_view suffix) {
+  std::string area = _temporaryArea;
+  if (!ensurePrivateDirectory(area)) {
+    area += '-' + randomName();
+    // Nobody could know the name to stand in its way; a full disk shows when the path is used.
+    [[maybe_unused]] const bool made = ensurePrivateDirectory(area);
+  }
+  return area + '/' + randomName() + std::string(suffix);
+}
+
+std::optional<std::string> PosixFilePlacement::uniqueSavePath(const std::string& path) {
+  const std::filesystem::path wanted(path);
+  const std::string stem = (wanted.parent_path() / wanted.stem()).string();
+  const std::string extension = wanted.extension().string();
+  std::string candidate = path;
+  for (int number = 2; number <= kMostSaveNames + 1; ++number) {
+    std::error_code error;
+    if (!nameIsTaken(candidate, error)) {
+      if (error) return std::nullopt;
+      return candidate;
+    }
+    candidate = stem + '-' + std::to_string(number) + extension;
+  }
+  return std::nullopt;
+}
+
+std::error_code PosixFilePlacement::link(const std::string& source, const std::string& target) {
+  if (::linkat(AT_FDCWD, source.c_str(), AT_FDCWD, target.c_str(), 0) == 0) return {};
+  return lastSystemError();
+}
+
+std::error_code PosixFilePlacement::move(const std::string& source, const std::string& target) {
+  std::error_code error = renameNoReplace(source, target);
+  if (error != std::errc::cross_device_link) return error;
+  // Across file systems the kernel says so before it looks at the target.
+  if (nameIsTaken(target, error)) return std::make_error_code(std::errc::file_exists);
+  if (error) return error;
+  error = copyIntoPlace(source, target);
+  if (!error) std::filesystem::remove_all(source, error);
+  return error;
+}
+
+std::error_code PosixFilePlacement::copy(const std::string& source, const std::string& target) {
+  return copyTree(source, target, {}).error;
+}
+
+}  // namespace zal

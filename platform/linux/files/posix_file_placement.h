@@ -1,0 +1,36 @@
+#pragma once
+
+#include <string>
+
+#include "platform/file_placement.h"
+
+namespace zal {
+
+/// Places files with the kernel's own means. Any thread.
+///
+/// What a directory copy cannot take along, it leaves out and reports the first reason; pipes,
+/// sockets and devices are left out without an error. A move across file systems takes all or
+/// nothing: it copies under a hidden temporary name beside the target (".zal-" and 32 hex digits),
+/// syncs, renames, and only then removes the source. If that removal fails, both are there and the
+/// error says why.
+class PosixFilePlacement : public FilePlacement {
+ public:
+  /// The temporary area need not exist: it is made, for this user alone, when first needed.
+  PosixFilePlacement(std::string homeDirectory, std::string temporaryArea);
+
+  [[nodiscard]] std::string homeDirectory() const override { return _home; }
+  /// When the area cannot be had for this user alone, the path lies in a fresh private directory
+  /// beside it; when that fails too, the path is given all the same and using it fails.
+  [[nodiscard]] std::string randomTemporaryPath(std::string_view suffix) override;
+  /// Tries 10,000 names.
+  [[nodiscard]] std::optional<std::string> uniqueSavePath(const std::string& path) override;
+  std::error_code link(const std::string& source, const std::string& target) override;
+  std::error_code move(const std::string& source, const std::string& target) override;
+  std::error_code copy(const std::string& source, const std::string& target) override;
+
+ private:
+  const std::string _home;
+  const std::string _temporaryArea;
+};
+
+}  // namespace zal

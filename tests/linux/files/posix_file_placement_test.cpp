@@ -1,0 +1,263 @@
+#include "platform/linux/files/posix_file_placement.h"
+
+#include <gtest/gtest.h>
+#include <sys/stat.h>
+
+#include <filesystem>
+#include <set>
+#include <string>
+
+#include "platform/linux/files/rename_no_replace.h"
+#include "tests/linux/files/real_places.h"
+#include "tests/support/temporary_directory.h"
+
+namespace zal::testing {
+namespace {
+
+namespace fs = std::filesystem;
+
+class PosixFilePlacementTest : public ::testing::Test {
+ protected:
+  std::error_code move(const std::string& source, const std::string& target) {
+    return files.move(directory / source, directory / target);
+  }
+  /// What the path becomes, without the directory.
+  std::string uniqueName(const std::string& name) {
+    const auto path = files.uniqueSavePath(directory / name);
+    return path ? path->substr(directory.path().size() + 1) : "(none)";
+  }
+  TemporaryDirectory directory;
+  PosixFilePlacement files{directory / "home", directory / "temporary"};
+};
+
+TEST_F(PosixFilePlacementTest, SaysWhereHomeIs) { EXPECT_EQ(files.homeDirectory(), directory / "home"); }
+
+// Links
+
+TEST_F(PosixFilePlacementTest, ALinkIsASecondNameOfTheSameFile) {
+  writeFile(directory / "a", "content");
+  EXPECT_FALSE(files.link(directory / "a", directory / "b"));
+  EXPECT_EQ(fs::hard_link_count(directory / "b"), 2U);
+}
+
+TEST_F(PosixFilePlacementTest, ALinkNeverOverwrites) {
+  writeFile(directory / "a", "new");
+  writeFile(directory / "b", "old");
+  fs::create_symlink("elsewhere", directory / "dangling");
+  EXPECT_EQ(files.link(directory / "a", directory / "b"), std::errc::file_exists);
+  EXPECT_EQ(files.link(directory / "a", directory / "dangling"), std::errc::file_exists);
+  EXPECT_EQ(readFile(directory / "b"), "old");
+}
+
+TEST_F(PosixFilePlacementTest, ALinkToASymbolicLinkNamesTheSymbolicLink) {
+  writeFile(directory / "secret", "content");
+  fs::create_symlink("secret", directory / "a");
+  EXPECT_FALSE(files.link(directory / "a", directory / "b"));
+  EXPECT_TRUE(fs::is_symlink(directory / "b"));
+  EXPECT_EQ(fs::hard_link_count(directory / "secret"), 1U);
+}
+
+TEST_F(PosixFilePlacementTest, ALinkOfNothingOrAcrossFileSystemsIsAnError) {
+  EXPECT_EQ(files.link(directory / "a", directory / "b"), std::errc::no_such_file_or_directory);
+  const OtherFileSystem other;
+  if (other.path.empty()) GTEST_SKIP() << other.missing;
+  writeFile(directory / "a", "content");
+  EXPECT_EQ(files.link(directory / "a", other / "a"), std::errc::cross_device_link);
+}
+
+// Moves
+
+TEST_F(PosixFilePlacementTest, AMoveRenamesFilesDirectoriesAndLinks) {
+  writeFile(directory / "file", "content");
+  writeFile(directory / "dir/below", "content");
+  fs::create_symlink("file", directory / "link");
+  EXPECT_FALSE(move("file", "file2"));
+  EXPECT_FALSE(move("dir", "dir2"));
+  EXPECT_FALSE(move("link", "link2"));
+  EXPECT_EQ(listTree(directory.path()), "dir2/\ndir2/below\nfile2\nlink2\n");
+}
+
+TEST_F(PosixFilePlacementTest, AMoveOntoAnythingIsAnErrorAndChangesNothing) {
+  writeFile(directory / "file", "new");
+  writeFile(directory / "taken", "old");
+  fs::create_directory(directory / "empty");
+  fs::create_symlink("elsewhere", directory / "dangling");
+  for (const char* target : {"taken", "empty", "dangling"}) {
+    EXPECT_EQ(move("file", target), std::errc::file_exists) << target;
+  }
+  EXPECT_EQ(listTree(directory.path()), "dangling\nempty/\nfile\ntaken\n");
+  EXPECT_EQ(readFile(directory / "taken"), "old");
+}
+
+TEST_F(PosixFilePlacementTest, AMoveOfNothingOrIntoNoDirectoryIsAnError) {
+  EXPECT_EQ(move("missing", "b"), std::errc::no_such_file_or_directory);
+  writeFile(directory / "file", "content");
+  EXPECT_EQ(move("file", "no/such/directory"), std::errc::no_such_file_or_directory);
+  EXPECT_EQ(readFile(directory / "file"), "content");
+}
+
+TEST_F(PosixFilePlacementTest, AFileSystemWithoutSuchARenameGetsTheSameInSteps) {
+  writeFile(directory / "file", "content");
+  writeFile(directory / "taken", "old");
+  writeFile(directory / "dir/below", "content");
+  fs::create_directory(directory / "empty");
+  const auto inSteps = [&](const std::string& source, const std::string& target) {
+    return renameNoReplaceInSteps(directory / source, directory / target);
+  };
+  EXPECT_EQ(inSteps("file", "taken"), std::errc::file_exists);
+  EXPECT_EQ(inSteps("dir", "empty"), std::errc::file_exists);
+  EXPECT_FALSE(inSteps("file", "file2"));
+  EXPECT_FALSE(inSteps("dir", "dir2"));
+  EXPECT_EQ(listTree(directory.path()), "dir2/\ndir2/below\nempty/\nfile2\ntaken\n");
+  EXPECT_EQ(fs::hard_link_count(directory / "file2"), 1U);
+}
+
+class MoveAcrossFileSystemsTest : public PosixFilePlacementTest {
+ protected:
+  void SetUp() override {
+    if (other.path.empty()) GTEST_SKIP() << other.missing;
+  }
+  OtherFileSystem other;
+};
+
+TEST_F(MoveAcrossFileSystemsTest, AFileArrivesWholeWithModeAndTime) {
+  const std::string content(300'000, 'x');
+  writeFile(directory / "a", content);
+  ::chmod((directory / "a").c_str(), 0604);
+  setTime(directory / "a", 1500000000, 7);
+  const auto error = files.move(directory / "a", other / "b");
+  EXPECT_FALSE(error) << error.message();
+  EXPECT_EQ(readFile(other / "b"), content);
+  EXPECT_EQ(modeAndTime(other / "b"), "604 1500000000000000007");
+  EXPECT_EQ(listTree(directory.path()), "");
+  EXPECT_EQ(listTree(other.path), "b\n");
+}
+
+TEST_F(MoveAcrossFileSystemsTest, ADirectoryArrivesWithAllBelowIt) {
+  writeFile(directory / "a/deep/file", "content");
+  fs::create_symlink("deep", directory / "a/link");
+  EXPECT_FALSE(files.move(directory / "a", other / "b"));
+  EXPECT_EQ(listTree(other.path), "b/\nb/deep/\nb/deep/file\nb/link\n");
+  EXPECT_EQ(listTree(directory.path()), "");
+}
+
+TEST_F(MoveAcrossFileSystemsTest, ASymbolicLinkArrivesAsALink) {
+  writeFile(directory / "secret", "content");
+  fs::create_symlink("secret", directory / "a");
+  EXPECT_FALSE(files.move(directory / "a", other / "b"));
+  EXPECT_EQ(fs::read_symlink(other / "b"), "secret");
+  EXPECT_EQ(listTree(directory.path()), "secret\n");
+}
+
+TEST_F(MoveAcrossFileSystemsTest, ATakenTargetIsAnErrorAndChangesNothing) {
+  writeFile(directory / "a", "new");
+  writeFile(other / "taken", "old");
+  fs::create_symlink("elsewhere", other / "dangling");
+  EXPECT_EQ(files.move(directory / "a", other / "taken"), std::errc::file_exists);
+  EXPECT_EQ(files.move(directory / "a", other / "dangling"), std::errc::file_exists);
+  EXPECT_EQ(readFile(other / "taken"), "old");
+  EXPECT_EQ(readFile(directory / "a"), "new");
+  EXPECT_EQ(listTree(other.path), "dangling\ntaken\n");
+}
+
+TEST_F(MoveAcrossFileSystemsTest, WhatCannotBeTakenAlongStaysWhereItIs) {
+  writeFile(directory / "a/file", "content");
+  makeNamedPipe(directory / "a/pipe");
+  EXPECT_EQ(files.move(directory / "a", other / "b"), std::errc::operation_not_supported);
+  EXPECT_EQ(files.move(directory / "a/pipe", other / "b"), std::errc::operation_not_supported);
+  EXPECT_EQ(listTree(directory.path()), "a/\na/file\na/pipe\n");
+  EXPECT_EQ(listTree(other.path), "");
+}
+
+TEST_F(MoveAcrossFileSystemsTest, AFullTargetLeavesTheSourceAndNoRemains) {
+  const TinyFileSystem tiny(directory / "tiny");
+  if (!tiny.missing.empty()) GTEST_SKIP() << tiny.missing;
+  writeFile(directory / "a", std::string(200'000, 'x'));
+  writeFile(directory / "d/1", "small");
+  writeFile(directory / "d/2", std::string(200'000, 'x'));
+  EXPECT_EQ(move("a", "tiny/a"), std::errc::no_space_on_device);
+  EXPECT_EQ(move("d", "tiny/d"), std::errc::no_space_on_device);
+  EXPECT_EQ(listTree(directory.path()), "a\nd/\nd/1\nd/2\ntiny/\n");
+  EXPECT_EQ(fs::file_size(directory / "a"), 200'000U);
+}
+
+// Names
+
+TEST_F(PosixFilePlacementTest, AFreeNameIsTheUniqueName) { EXPECT_EQ(uniqueName("new.log"), "new.log"); }
+
+TEST_F(PosixFilePlacementTest, ATakenNameGetsTheFirstFreeNumberBeforeItsExtension) {
+  writeFile(directory / "a.log", "");
+  EXPECT_EQ(uniqueName("a.log"), "a-2.log");
+  writeFile(directory / "a-2.log", "");
+  fs::create_symlink("elsewhere", directory / "a-3.log");  // taken, though it leads nowhere
+  EXPECT_EQ(uniqueName("a.log"), "a-4.log");
+}
+
+TEST_F(PosixFilePlacementTest, NamesOfEveryShapeGetTheirNumber) {
+  for (const char* name : {"plain", ".hidden", "a.tar.gz", "dir.d/plain"}) writeFile(directory / name, "");
+  EXPECT_EQ(uniqueName("plain"), "plain-2");
+  EXPECT_EQ(uniqueName(".hidden"), ".hidden-2");
+  EXPECT_EQ(uniqueName("a.tar.gz"), "a.tar-2.gz");
+  EXPECT_EQ(uniqueName("dir.d/plain"), "dir.d/plain-2");
+  EXPECT_EQ(uniqueName("dir.d"), "dir-2.d");
+}
+
+TEST_F(PosixFilePlacementTest, ANameThatCannotExistHasNoUniqueName) {
+  EXPECT_EQ(uniqueName(std::string(300, 'x')), "(none)");
+}
+
+TEST_F(PosixFilePlacementTest, ANameWhoseNumberedFormsAreTooLongHasNoUniqueName) {
+  const std::string name(255, 'x');
+  writeFile(directory / name, "");
+  EXPECT_EQ(uniqueName(name), "(none)");
+}
+
+TEST_F(PosixFilePlacementTest, TheSearchForAFreeNameEnds) {
+  writeFile(directory / "a", "");
+  for (int number = 2; number <= 10'000; ++number) {
+    fs::create_symlink("x", directory / "a-" + std::to_string(number));
+  }
+  EXPECT_EQ(uniqueName("a"), "(none)");
+  fs::remove(directory / "a-10000");
+  EXPECT_EQ(uniqueName("a"), "a-10000");
+}
+
+// Temporary paths
+
+TEST_F(PosixFilePlacementTest, TemporaryPathsNameNothingAndCannotBeGuessed) {
+  std::set<std::string> paths;
+  for (int i = 0; i < 100; ++i) paths.insert(files.randomTemporaryPath(".zip"));
+  EXPECT_EQ(paths.size(), 100U);
+  const std::string path = *paths.begin();
+  const std::string prefix = directory / "temporary/";
+  EXPECT_TRUE(path.starts_with(prefix) && path.ends_with(".zip")) << path;
+  EXPECT_EQ(path.size(), prefix.size() + 32 + 4);  // 128 bits, 4 to a digit
+  EXPECT_FALSE(fs::exists(path));
+}
+
+TEST_F(PosixFilePlacementTest, TheTemporaryAreaIsMadeForThisUserAlone) {
+  EXPECT_FALSE(fs::exists(directory / "temporary"));
+  (void)files.randomTemporaryPath("");
+  EXPECT_EQ(modeAndTime(directory / "temporary").substr(0, 4), "700 ");
+}
+
+TEST_F(PosixFilePlacementTest, ATemporaryAreaOpenToOthersIsClosed) {
+  fs::create_directory(directory / "temporary");
+  ::chmod((directory / "temporary").c_str(), 0777);
+  (void)files.randomTemporaryPath("");
+  EXPECT_EQ(modeAndTime(directory / "temporary").substr(0, 4), "700 ");
+}
+
+TEST_F(PosixFilePlacementTest, ATemporaryAreaThatSomebodyPreparedIsNotUsed) {
+  fs::create_directory(directory / "trap");
+  fs::create_directory_symlink("trap", directory / "temporary");
+  const std::string path = files.randomTemporaryPath("");
+  const std::string area = fs::path(path).parent_path();
+  EXPECT_TRUE(area.starts_with(directory / "temporary-")) << area;
+  EXPECT_EQ(modeAndTime(area).substr(0, 4), "700 ");
+  writeFile(path, "works");
+  EXPECT_EQ(listTree(directory / "trap"), "");
+}
+
+}  // namespace
+}  // namespace zal::testing
