@@ -2,7 +2,7 @@
 
 BUILD := build
 JOBS := $(shell nproc 2>/dev/null || echo 2)
-CMAKE := cmake -Wno-dev
+CMAKE := cmake
 # Seconds that each fuzzer runs; `make test` gives them a short turn.
 FUZZ_SECONDS ?= 120
 TEST_FUZZ_SECONDS ?= 10
@@ -20,7 +20,7 @@ demo: build
 
 ## make build    the programs, in build/bin
 build: dependencies-build
-	$(CMAKE) -S . -B $(BUILD) -DCMAKE_BUILD_TYPE=Release -DZAL_TESTS=OFF -DZAL_BENCH=OFF
+	$(CMAKE) -Wno-dev -S . -B $(BUILD) -DCMAKE_BUILD_TYPE=Release -DZAL_TESTS=OFF -DZAL_BENCH=OFF
 	$(CMAKE) --build $(BUILD) -j $(JOBS)
 
 ## make test     all tests: plain, address and undefined sanitizers, thread sanitizer, a short fuzz run
@@ -35,18 +35,18 @@ house-check:
 	python3 scripts/house_check.py
 
 build-plain:
-	$(CMAKE) -S . -B $(BUILD)/plain -DCMAKE_BUILD_TYPE=Release -DZAL_TESTS=ON
+	$(CMAKE) -Wno-dev -S . -B $(BUILD)/plain -DCMAKE_BUILD_TYPE=Release -DZAL_TESTS=ON
 	$(CMAKE) --build $(BUILD)/plain -j $(JOBS)
 
 # clang here and GCC in the other two: both compilers read every line.
 build-address:
-	$(CMAKE) -S . -B $(BUILD)/address -DCMAKE_BUILD_TYPE=Debug -DZAL_TESTS=ON -DZAL_FUZZ=ON \
+	$(CMAKE) -Wno-dev -S . -B $(BUILD)/address -DCMAKE_BUILD_TYPE=Debug -DZAL_TESTS=ON -DZAL_FUZZ=ON \
 		-DZAL_SANITIZE=address,undefined -DCMAKE_C_COMPILER=clang -DCMAKE_CXX_COMPILER=clang++ \
 		-DCMAKE_CXX_FLAGS_DEBUG="-O1 -g1"
 	$(CMAKE) --build $(BUILD)/address -j $(JOBS)
 
 build-thread:
-	$(CMAKE) -S . -B $(BUILD)/thread -DCMAKE_BUILD_TYPE=Debug -DZAL_TESTS=ON \
+	$(CMAKE) -Wno-dev -S . -B $(BUILD)/thread -DCMAKE_BUILD_TYPE=Debug -DZAL_TESTS=ON \
 		-DZAL_SANITIZE=thread -DCMAKE_CXX_FLAGS_DEBUG="-O1 -g1"
 	$(CMAKE) --build $(BUILD)/thread -j $(JOBS)
 
@@ -68,7 +68,7 @@ fuzz: dependencies-build dependencies-test build-address
 
 ## make bench    the benchmarks against their peers, one table at the end
 bench: dependencies-build dependencies-test dependencies-bench
-	$(CMAKE) -S . -B $(BUILD)/bench -DCMAKE_BUILD_TYPE=Release -DZAL_TESTS=OFF -DZAL_BENCH=ON
+	$(CMAKE) -Wno-dev -S . -B $(BUILD)/bench -DCMAKE_BUILD_TYPE=Release -DZAL_TESTS=OFF -DZAL_BENCH=ON
 	$(CMAKE) --build $(BUILD)/bench -j $(JOBS)
 	bench/run $(BUILD)/bench/bin
 
