@@ -1,0 +1,13 @@
+#pragma once
+
+#include "platform/telephony.h"
+
+namespace zal {
+
+/// For a host without a telephony service: nobody can connect. Main thread only.
+class AbsentTelephony : public Telephony {
+ public:
+  [[nodiscard]] std::unique_ptr<TelephonyConnection> connect() override { return nullptr; }
+};
+
+}  // namespace zal
