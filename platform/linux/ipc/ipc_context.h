@@ -33,6 +33,7 @@ struct IpcContext {
   const std::function<void()> flush;
   PeerHandler handler;      // set once, before the first peer
   bool delivering = false;  // from the listener's resume to its end
+  std::function<void()> stopListening = [] {};  // by whoever listens
   std::unordered_set<std::shared_ptr<UnixPeerConnection>> peers;
   /// One for all peers: each is read, decoded and handled in one go. Not zeroed, so that a quiet
   /// agent's memory does not grow by what it never reads.

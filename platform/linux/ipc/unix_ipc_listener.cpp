@@ -40,7 +40,7 @@ UnixIpcListener::UnixIpcListener(std::shared_ptr<IpcContext> context, RunLoop& l
 
 UnixIpcListener::~UnixIpcListener() {
   _context->delivering = false;
-  if (_readiness) static_cast<void>(_readiness->release());  // _listening closes it
+  _stopListening();
   const std::vector<std::shared_ptr<UnixPeerConnection>> peers(_context->peers.begin(),
                                                                _context->peers.end());
   for (const auto& peer : peers) peer->cancel();
@@ -71,7 +71,17 @@ bool UnixIpcListener::_listen(std::optional<gid_t> group) {
   }
   _listening.emplace(*std::move(listening));
   _readiness.emplace(_context->io, _listening->descriptor());
+  _context->stopListening = [alive = std::weak_ptr(_alive)] {
+    if (const auto self = alive.lock()) (*self)->_stopListening();
+  };
   return true;
+}
+
+void UnixIpcListener::_stopListening() {
+  if (_readiness) static_cast<void>(_readiness->release());  // _listening closes it
+  _readiness.reset();
+  _listening.reset();
+  _retry.cancel();
 }
 
 void UnixIpcListener::_awaitPeers() {

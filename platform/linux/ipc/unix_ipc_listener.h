@@ -28,6 +28,7 @@ class UnixIpcListener final : public IpcListener {
 
  private:
   [[nodiscard]] bool _listen(std::optional<gid_t> group);
+  void _stopListening();
   void _awaitPeers();
   void _acceptTurn();
   void _admit(Descriptor socket);

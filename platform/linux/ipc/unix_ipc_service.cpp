@@ -37,4 +37,6 @@ void UnixIpcService::terminationImminent() {
   for (const auto& peer : peersOf(*_context)) peer->deliverError(IpcError::terminationImminent);
 }
 
+void UnixIpcService::stopListening() { _context->stopListening(); }
+
 }  // namespace zal

@@ -38,6 +38,9 @@ class UnixIpcService final : public IpcService {
   [[nodiscard]] std::unique_ptr<IpcListener> makeListener(std::string serviceName) override;
   /// Delivers that error to every peer.
   void terminationImminent();
+  /// Lets nobody in any more and gives up the socket with its file; for a process that ends without
+  /// destructors. Peers stay connected.
+  void stopListening();
   [[nodiscard]] std::size_t peerCount() const { return _context->peers.size(); }
 
  private:
