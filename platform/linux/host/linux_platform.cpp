@@ -1,0 +1,76 @@
+#include "platform/linux/host/linux_platform.h"
+
+#include <csignal>
+
+#include "platform/linux/config/host_paths.h"
+#include "platform/linux/notifications/notification_file.h"
+
+namespace zal {
+namespace {
+
+/// For one user alone; the number keeps users of one machine apart.
+std::string temporaryArea(const DirectoryRoots& roots, const HostEnvironment& environment) {
+  return roots.TemporaryRoot + "/com.vendel.lirra-" + std::to_string(environment.userId);
+}
+
+LinuxAgentLog::Options agentLogOptions(const Configuration& configuration,
+                                       const HostEnvironment& environment) {
+  LinuxAgentLog::Options options;
+  options.categories = configuration.log.categories;
+  options.forJournal = !environment.variable("JOURNAL_STREAM").empty();
+  return options;
+}
+
+}  // namespace
+
+LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
+    : _loaded(ConfigurationLoader(environment).load()),
+      _agentLog(_mainLoop, agentLogOptions(_loaded.configuration, environment)),
+      _queues(_mainLoop, [this](std::string_view line) { _agentLog.warning(line); }),
+      // Before what may give a job to a thread: it takes variables out of the environment.
+      _ipc(_mainLoop.context(), _mainLoop, _agentLog,
+           {.path = socketPath(environment).value_or(""),
+            .settings = _loaded.configuration.ipc,
+            .flush = [this] { _logFacility.flush(); }}),
+      _logFacility({_clock, _mainLoop, _queues, _agentLog}, _loaded.configuration.roots.UserLogRoot,
+                   _loaded.configuration.log),
+      _preferences(preferenceDirectory(environment), _agentLog),
+      _systemNotifications(_mainLoop.context(),
+                           notificationDirectory(_loaded.configuration.roots.RuntimeRoot), _agentLog),
+      _crashReporter(_agentLog),
+      _files(environment.homeDirectory, temporaryArea(_loaded.configuration.roots, environment)),
+      _shell(_agentLog),
+      _systemVersion(_loaded.configuration.systemVersionFile),
+      _pings(_mainLoop.context(), _loaded.configuration.interfaces, _agentLog),
+      _processExit([this] {
+        _ipc.stopListening();
+        _logFacility.flush();
+      }),
+      _hostSignals(_mainLoop, [this] { _ipc.terminationImminent(); }),
+      _services{_loaded.configuration,
+                _clock,
+                _mainLoop,
+                _queues,
+                _ipc,
+                _preferences,
+                _systemNotifications,
+                _localNotifications,
+                _logFacility,
+                _agentLog,
+                _crashReporter,
+                _files,
+                _shell,
+                _processes,
+                _deviceRegistry,
+                _systemVersion,
+                _networkStatus,
+                _telephony,
+                _pings,
+                _processExit,
+                _hostSignals} {
+  std::signal(SIGPIPE, SIG_IGN);
+  _agentLog.setLogFacility(&_logFacility);
+  for (const std::string& warning : _loaded.warnings) _agentLog.warning(warning);
+}
+
+}  // namespace zal

@@ -1,0 +1,67 @@
+#pragma once
+
+#include <optional>
+#include <string>
+
+#include "platform/linux/absent/absent_crash_reporter.h"
+#include "platform/linux/absent/absent_network_status.h"
+#include "platform/linux/absent/absent_telephony.h"
+#include "platform/linux/config/configuration_loader.h"
+#include "platform/linux/config/toml_preference_store.h"
+#include "platform/linux/files/posix_file_placement.h"
+#include "platform/linux/host/loop_host_signals.h"
+#include "platform/linux/host_identity/linux_device_registry.h"
+#include "platform/linux/host_identity/linux_system_version.h"
+#include "platform/linux/ipc/unix_ipc_service.h"
+#include "platform/linux/log/file_log_facility.h"
+#include "platform/linux/log/linux_agent_log.h"
+#include "platform/linux/loop/linux_clock.h"
+#include "platform/linux/loop/linux_run_loop.h"
+#include "platform/linux/loop/linux_work_queues.h"
+#include "platform/linux/notifications/runtime_directory_notifications.h"
+#include "platform/linux/ping/linux_ping_facility.h"
+#include "platform/linux/process/immediate_process_exit.h"
+#include "platform/linux/process/posix_shell.h"
+#include "platform/linux/process/procfs_process_table.h"
+#include "platform/platform.h"
+
+namespace zal {
+
+/// All of this host's services, each made once, from the configuration that the environment leads
+/// to. Made on the main thread, before there is any other. Nothing here starts a thread or waits for
+/// more than a small file. Services later in the list use earlier ones, and go before them.
+class LinuxPlatform {
+ public:
+  /// Broken pipes are errors of a write from now on, and end nothing.
+  explicit LinuxPlatform(const HostEnvironment& environment);
+  LinuxPlatform(const LinuxPlatform&) = delete;
+  LinuxPlatform& operator=(const LinuxPlatform&) = delete;
+
+  [[nodiscard]] Platform& services() { return _services; }
+
+ private:
+  LoadedConfiguration _loaded;
+  LinuxClock _clock;
+  LinuxRunLoop _mainLoop;
+  LinuxAgentLog _agentLog;
+  LinuxWorkQueues _queues;
+  UnixIpcService _ipc;
+  FileLogFacility _logFacility;
+  TomlPreferenceStore _preferences;
+  RuntimeDirectoryNotifications _systemNotifications;
+  LocalNotifications _localNotifications;
+  AbsentCrashReporter _crashReporter;
+  PosixFilePlacement _files;
+  PosixShell _shell;
+  ProcfsProcessTable _processes;
+  LinuxDeviceRegistry _deviceRegistry;
+  LinuxSystemVersion _systemVersion;
+  AbsentNetworkStatus _networkStatus;
+  AbsentTelephony _telephony;
+  LinuxPingFacility _pings;
+  ImmediateProcessExit _processExit;
+  LoopHostSignals _hostSignals;
+  Platform _services;
+};
+
+}  // namespace zal
