@@ -50,26 +50,34 @@ void sortByKey(std::vector<Keyed>& keyed) {
   }
 }
 
-bool isRising(const Entries& entries) {
-  return std::adjacent_find(entries.begin(), entries.end(), [](const auto& earlier, const auto& later) {
-           return !(earlier.second < later.second);
-         }) == entries.end();
+// Each time at most the one before it.
+bool isFalling(const Entries& entries) {
+  return std::is_sorted(entries.begin(), entries.end(),
+                        [](const auto& a, const auto& b) { return a.second > b.second; });
 }
 
-bool isFalling(const Entries& entries) {
-  return std::adjacent_find(entries.begin(), entries.end(), [](const auto& earlier, const auto& later) {
-           return earlier.second < later.second;
-         }) == entries.end();
+// The usual case, in one go: each time at least the one before it. Appends nothing and says false
+// when that does not hold.
+bool appendIfRising(const Entries& entries, std::vector<std::string_view>& texts) {
+  const std::size_t before = texts.size();
+  for (auto first = entries.begin(); first != entries.end();) {
+    auto last = first + 1;
+    while (last != entries.end() && last->second == first->second) ++last;
+    if (last != entries.end() && last->second < first->second) {
+      texts.resize(before);
+      return false;
+    }
+    for (auto entry = last; entry != first;) texts.push_back((--entry)->first);
+    first = last;
+  }
+  return true;
 }
 
 }  // namespace
 
 void appendInTimeOrder(const Entries& entries, std::vector<std::string_view>& texts) {
   texts.reserve(texts.size() + entries.size());
-  if (isRising(entries)) {
-    for (const auto& entry : entries) texts.push_back(entry.first);
-    return;
-  }
+  if (appendIfRising(entries, texts)) return;
   if (isFalling(entries)) {
     for (auto entry = entries.rbegin(); entry != entries.rend(); ++entry) texts.push_back(entry->first);
     return;

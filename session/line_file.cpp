@@ -1,6 +1,7 @@
 #include "session/line_file.h"
 
 #include <cerrno>
+#include <cstddef>
 #include <cstdio>
 #include <cstring>
 
@@ -15,8 +16,12 @@ namespace zal {
 
 namespace {
 
-// Few writes matter more than the memory of one buffer for the time of one file.
-constexpr std::size_t kBufferSize = 1U << 20U;
+// Small pieces are gathered: few writes matter more than the memory of one buffer.
+constexpr std::size_t kBufferSize = 256U * 1024U;
+// Larger ones go to the system as they are, for gathering them would only copy them once more.
+constexpr std::size_t kLargePiece = 64U * 1024U;
+// A stretch is cut here, so that it is still in the processor's cache when it is written.
+constexpr std::ptrdiff_t kLargestStretch = 256 * 1024;
 
 class BufferedFile {
  public:
@@ -35,13 +40,15 @@ class BufferedFile {
   [[nodiscard]] bool failed() const { return _error != 0; }
 
   void append(std::string_view bytes) {
-    while (!bytes.empty() && !failed()) {
-      const std::size_t part = std::min(bytes.size(), kBufferSize - _used);
-      std::memcpy(_buffer.get() + _used, bytes.data(), part);
-      _used += part;
-      bytes.remove_prefix(part);
-      if (_used == kBufferSize) _flush();
+    if (failed() || bytes.empty()) return;
+    if (bytes.size() > kBufferSize - _used) _flush();
+    if (bytes.size() >= kLargePiece) {
+      _flush();
+      _write(bytes);
+      return;
     }
+    std::memcpy(_buffer.get() + _used, bytes.data(), bytes.size());
+    _used += bytes.size();
   }
 
   /// Zero, or the error number of the first thing that went wrong.
@@ -54,8 +61,12 @@ class BufferedFile {
 
  private:
   void _flush() {
-    if (!failed() && std::fwrite(_buffer.get(), 1, _used, _file) != _used) _note();
+    _write({_buffer.get(), _used});
     _used = 0;
+  }
+  void _write(std::string_view bytes) {
+    if (failed() || bytes.empty()) return;
+    if (std::fwrite(bytes.data(), 1, bytes.size(), _file) != bytes.size()) _note();
   }
   void _note() {
     if (_error == 0) _error = errno != 0 ? errno : EIO;
@@ -69,14 +80,22 @@ class BufferedFile {
 
 }  // namespace
 
-void writeStrings(const std::vector<std::string_view>& strings, const std::string& path, AgentLog& log) {
+void writeStrings(const LogLines& strings, const std::string& path, AgentLog& log) {
   BufferedFile file(path);
-  for (const std::string_view line : strings) {
-    if (file.failed()) break;
-    const std::size_t bytes = utf16Length(line) + 1;
-    file.append(line.substr(0, bytes));
-    if (bytes > line.size()) file.append("\n");
+  // Neighbours in the file are mostly neighbours in the arena too, newline included; they go together.
+  const bool plain = !strings.texts || strings.texts->isAscii();
+  const char* begin = nullptr;
+  const char* end = nullptr;
+  for (const std::string_view line : strings.lines) {
+    const std::size_t units = plain ? line.size() : std::min(utf16Length(line), line.size());
+    if (line.data() != end || end - begin >= kLargestStretch) {
+      file.append({begin, static_cast<std::size_t>(end - begin)});
+      if (file.failed()) break;
+      begin = line.data();
+    }
+    end = line.data() + units + 1;
   }
+  file.append({begin, static_cast<std::size_t>(end - begin)});
   if (const int error = file.close(); error != 0) {
     log.warning("Could not write " + path + ": " + std::generic_category().message(error));
   }

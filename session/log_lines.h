@@ -8,8 +8,8 @@
 
 namespace zal {
 
-/// The lines of one log in the order of writing. Copying it copies references; the texts live on
-/// with the last copy, whatever becomes of the list they came from.
+/// The lines of one log in the order of writing, all kept by the arena. Copying it copies references;
+/// the texts live on with the last copy, whatever becomes of the list they came from.
 struct LogLines {
   std::vector<std::string_view> lines;
   std::shared_ptr<const TextArena> texts;

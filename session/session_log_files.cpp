@@ -43,7 +43,7 @@ std::string ZalLoggingAgentVistelSession::logPathForDate(const SessionServices& 
 
 void ZalLoggingAgentVistelSession::_writeStrings(const LogLines& strings, const std::string& path,
                                                  AgentLog& log) {
-  writeStrings(strings.lines, path, log);
+  writeStrings(strings, path, log);
 }
 
 void ZalLoggingAgentVistelSession::writeSessionLog(bool endedByEndAll) {

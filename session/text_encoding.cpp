@@ -10,12 +10,20 @@ namespace {
 
 constexpr std::uint64_t kHighBits = 0x8080808080808080U;
 
+std::uint64_t wordAt(const char* bytes) {
+  std::uint64_t word = 0;
+  std::memcpy(&word, bytes, sizeof word);
+  return word;
+}
+
 std::size_t asciiPrefix(std::string_view text) {
+  constexpr std::size_t kWord = sizeof(std::uint64_t);
+  const char* const bytes = text.data();
   std::size_t at = 0;
-  for (; at + sizeof(std::uint64_t) <= text.size(); at += sizeof(std::uint64_t)) {
-    std::uint64_t word = 0;
-    std::memcpy(&word, text.data() + at, sizeof word);
-    if ((word & kHighBits) != 0) break;
+  for (; at + 4 * kWord <= text.size(); at += 4 * kWord) {
+    const std::uint64_t together = wordAt(bytes + at) | wordAt(bytes + at + kWord) |
+                                   wordAt(bytes + at + 2 * kWord) | wordAt(bytes + at + 3 * kWord);
+    if ((together & kHighBits) != 0) break;
   }
   while (at < text.size() && static_cast<unsigned char>(text[at]) < 0x80) ++at;
   return at;
@@ -47,6 +55,8 @@ constexpr std::array<std::string_view, 19> kWideWhite = {
 constexpr std::string_view kWhite = " \t\n\v\f\r";
 
 }  // namespace
+
+bool isAscii(std::string_view text) { return asciiPrefix(text) == text.size(); }
 
 std::size_t utf16Length(std::string_view text) {
   std::size_t units = asciiPrefix(text);

@@ -5,6 +5,8 @@
 
 namespace zal {
 
+[[nodiscard]] bool isAscii(std::string_view text);
+
 /// Length of well-formed UTF-8 in UTF-16 units; never more than its bytes.
 [[nodiscard]] std::size_t utf16Length(std::string_view text);
 

@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include "session/quality_log_list.h"
 #include "tests/support/fake_services.h"
 #include "tests/support/temporary_directory.h"
 
@@ -13,7 +14,17 @@ class LineFileTest : public ::testing::Test {
   testing::TemporaryDirectory directory;
   testing::RecordingAgentLog log;
   std::string path = directory / "Log.log";
-  void write(const std::vector<std::string_view>& lines) { writeStrings(lines, path, log); }
+  void write(const std::vector<std::string_view>& lines) {
+    QualityLogList list;
+    for (const auto line : lines) list.append(line);
+    writeStrings(list.copy(), path, log);
+  }
+  /// Written last line first, so that no two lines are neighbours in memory as they are in the file.
+  void writeReversed(const std::vector<std::string_view>& lines) {
+    QualityLogList list;
+    for (const auto line : lines) list.insertAtFront(line);
+    writeStrings(list.copy(), path, log);
+  }
   [[nodiscard]] std::string written() const { return testing::readFile(path); }
 };
 
@@ -55,6 +66,24 @@ TEST_F(LineFileTest, WritesMoreThanOneBuffer) {
   const std::string large(700'001, 'a');
   write({large, large, large, "end"});
   EXPECT_EQ(written(), large + "\n" + large + "\n" + large + "\nend\n");
+}
+
+TEST_F(LineFileTest, WritesManyLinesInAnyOrderOfMemory) {
+  std::vector<std::string> lines;
+  for (int number = 0; number < 100'000; ++number) lines.push_back("line " + std::to_string(number));
+  std::string forward;
+  std::string backward;
+  for (const auto& line : lines) forward += line + "\n";
+  for (auto line = lines.rbegin(); line != lines.rend(); ++line) backward += *line + "\n";
+  write({lines.begin(), lines.end()});
+  EXPECT_TRUE(written() == forward);
+  writeReversed({lines.begin(), lines.end()});
+  EXPECT_TRUE(written() == backward);
+}
+
+TEST_F(LineFileTest, NeverWritesMoreThanTheLineOfBytesThatAreNoText) {
+  write({"\xFF\xFF\xFF", "x"});
+  EXPECT_EQ(written(), "\xFF\xFF\xFF\nx\n");
 }
 
 TEST_F(LineFileTest, AFullDiskCostsOneWarning) {
