@@ -10,17 +10,16 @@
 #include <string_view>
 
 #include "platform/linux/config/path_text.h"
+#include "platform/linux/files/system_error.h"
 
 namespace zal {
 namespace {
-
-std::error_code lastError() { return {errno, std::generic_category()}; }
 
 constexpr std::size_t kLargestFile = 1U << 20U;
 
 std::error_code readOpenFile(int descriptor, std::string& content) {
   struct stat status {};
-  if (::fstat(descriptor, &status) != 0) return lastError();
+  if (::fstat(descriptor, &status) != 0) return lastSystemError();
   if (S_ISDIR(status.st_mode)) return std::make_error_code(std::errc::is_a_directory);
   if (!S_ISREG(status.st_mode)) return std::make_error_code(std::errc::invalid_argument);
   content.resize(kLargestFile + 1);
@@ -28,7 +27,7 @@ std::error_code readOpenFile(int descriptor, std::string& content) {
   while (length < content.size()) {
     const ssize_t count = ::read(descriptor, content.data() + length, content.size() - length);
     if (count < 0 && errno == EINTR) continue;
-    if (count < 0) return lastError();
+    if (count < 0) return lastSystemError();
     if (count == 0) break;
     length += static_cast<std::size_t>(count);
   }
@@ -41,10 +40,10 @@ std::error_code writeAndSync(int descriptor, std::string_view content) {
   while (!content.empty()) {
     const ssize_t count = ::write(descriptor, content.data(), content.size());
     if (count < 0 && errno == EINTR) continue;
-    if (count < 0) return lastError();
+    if (count < 0) return lastSystemError();
     content.remove_prefix(static_cast<std::size_t>(count));
   }
-  if (::fsync(descriptor) != 0) return lastError();
+  if (::fsync(descriptor) != 0) return lastSystemError();
   return {};
 }
 
@@ -53,7 +52,7 @@ std::error_code writeAndSync(int descriptor, std::string_view content) {
 std::error_code readTextFile(const std::string& path, std::string& content) {
   content.clear();
   const int descriptor = ::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY);
-  if (descriptor < 0) return lastError();
+  if (descriptor < 0) return lastSystemError();
   const std::error_code error = readOpenFile(descriptor, content);
   ::close(descriptor);
   if (error) content.clear();
@@ -74,11 +73,11 @@ std::error_code replaceTextFile(const std::string& path, const std::string& cont
   const std::string temporary = target + "." + std::to_string(::getpid()) + ".tmp";
   const int descriptor =
       ::open(temporary.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_NOFOLLOW | O_CLOEXEC, mode);
-  if (descriptor < 0) return lastError();
+  if (descriptor < 0) return lastSystemError();
   error = writeAndSync(descriptor, content);
-  if (!error && ::fchmod(descriptor, mode) != 0) error = lastError();
+  if (!error && ::fchmod(descriptor, mode) != 0) error = lastSystemError();
   ::close(descriptor);
-  if (!error && ::rename(temporary.c_str(), target.c_str()) != 0) error = lastError();
+  if (!error && ::rename(temporary.c_str(), target.c_str()) != 0) error = lastSystemError();
   if (error) ::unlink(temporary.c_str());
   return error;
 }

@@ -10,6 +10,7 @@
 #include <map>
 #include <optional>
 
+#include "platform/linux/files/system_error.h"
 #include "platform/linux/log/rotation_names.h"
 #include "platform/linux/log/zip_file.h"
 
@@ -23,21 +24,19 @@ struct Waiting {
   bool isReady = false;
 };
 
-std::error_code lastError() { return {errno, std::generic_category()}; }
-
 std::error_code renameFile(const std::string& from, const std::string& to) {
-  return ::rename(from.c_str(), to.c_str()) == 0 ? std::error_code{} : lastError();
+  return ::rename(from.c_str(), to.c_str()) == 0 ? std::error_code{} : lastSystemError();
 }
 
 std::error_code removeFile(const std::string& path) {
-  return ::unlink(path.c_str()) == 0 || errno == ENOENT ? std::error_code{} : lastError();
+  return ::unlink(path.c_str()) == 0 || errno == ENOENT ? std::error_code{} : lastSystemError();
 }
 
 /// Makes renames and removals in the directory outlive a power cut, in this order.
 std::error_code syncDirectory(const std::string& directory) {
   const int descriptor = ::open(directory.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
-  if (descriptor < 0) return lastError();
-  const std::error_code error = ::fsync(descriptor) == 0 ? std::error_code{} : lastError();
+  if (descriptor < 0) return lastSystemError();
+  const std::error_code error = ::fsync(descriptor) == 0 ? std::error_code{} : lastSystemError();
   ::close(descriptor);
   return error;
 }

@@ -8,6 +8,7 @@
 #include <cstdio>
 #include <system_error>
 
+#include "platform/linux/files/rename_no_replace.h"
 #include "platform/linux/log/record_text.h"
 #include "platform/linux/log/rotation_names.h"
 
@@ -133,26 +134,25 @@ bool RotatingLogFile::_wasReplaced() const {
   return ::stat(path().c_str(), &named) != 0 || named.st_ino != open.st_ino || named.st_dev != open.st_dev;
 }
 
-bool RotatingLogFile::_renameAway(std::uint64_t& sequence) const {
-  const std::string from = path();
+std::error_code RotatingLogFile::_renameAway(std::uint64_t& sequence) const {
   for (;; ++sequence) {
-    const std::string to = _directoryPath() + "/" + pendingName(_place.fileName, sequence);
     // A second agent may have taken the number; nothing that waits may be overwritten.
-    if (::renameat2(AT_FDCWD, from.c_str(), AT_FDCWD, to.c_str(), RENAME_NOREPLACE) == 0) return true;
-    if (errno == EINVAL) return ::rename(from.c_str(), to.c_str()) == 0;  // unknown to this file system
-    if (errno != EEXIST) return false;
+    const std::error_code error =
+        renameNoReplace(path(), _directoryPath() + "/" + pendingName(_place.fileName, sequence));
+    if (error != std::errc::file_exists) return error;
   }
 }
 
 bool RotatingLogFile::rotateAway(std::uint64_t& sequence) {
-  if (_renameAway(sequence)) {
+  const std::error_code error = _renameAway(sequence);
+  if (!error) {
     close();
     _rotationLimit = _rotationSize;
     _rotationFailed = false;
     if (!_open()) _beginOutage(errno);
     return true;
   }
-  if (!_rotationFailed) _messages.push_back(path() + ": cannot be rotated: " + errorText(errno));
+  if (!_rotationFailed) _messages.push_back(path() + ": cannot be rotated: " + error.message());
   _rotationFailed = true;
   _rotationLimit = _size + _rotationSize;
   return false;

@@ -3,6 +3,7 @@
 #include <cstdint>
 #include <string>
 #include <string_view>
+#include <system_error>
 #include <vector>
 
 namespace zal {
@@ -65,7 +66,7 @@ class RotatingLogFile {
   void _endTornLine();
   void _forgetTornRecord();
   [[nodiscard]] bool _wasReplaced() const;
-  bool _renameAway(std::uint64_t& sequence) const;
+  std::error_code _renameAway(std::uint64_t& sequence) const;
   int _write();
   void _beginOutage(int error);
   void _endOutage();

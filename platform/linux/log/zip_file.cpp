@@ -10,6 +10,8 @@
 #include <ctime>
 #include <memory>
 
+#include "platform/linux/ipc/descriptor.h"
+
 namespace zal {
 namespace {
 
@@ -19,20 +21,6 @@ constexpr int kLevel = Z_BEST_SPEED;
 constexpr unsigned long kMadeByUnix = (3U << 8U) | 20U;
 
 std::error_code lastError() { return {errno != 0 ? errno : EIO, std::generic_category()}; }
-
-class Descriptor {
- public:
-  explicit Descriptor(int value) : _value(value) {}
-  ~Descriptor() {
-    if (_value >= 0) ::close(_value);
-  }
-  Descriptor(const Descriptor&) = delete;
-  Descriptor& operator=(const Descriptor&) = delete;
-  [[nodiscard]] int value() const { return _value; }
-
- private:
-  int _value;
-};
 
 zip_fileinfo entryInformation(const struct stat& status) {
   zip_fileinfo information{};
@@ -82,12 +70,12 @@ std::error_code packIntoZip(const std::string& source, const std::string& target
                             const std::string& entryName) {
   const Descriptor from(::open(source.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
   struct stat status {};
-  if (from.value() < 0 || ::fstat(from.value(), &status) != 0) return lastError();
+  if (from.get() < 0 || ::fstat(from.get(), &status) != 0) return lastError();
   // Made here for its mode, and kept open for the sync: the zip library knows neither.
   const Descriptor to(::open(target.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC, 0640));
-  if (to.value() < 0) return lastError();
-  std::error_code error = packIntoCreated(from.value(), status, target, entryName);
-  if (!error && ::fsync(to.value()) != 0) error = lastError();
+  if (to.get() < 0) return lastError();
+  std::error_code error = packIntoCreated(from.get(), status, target, entryName);
+  if (!error && ::fsync(to.get()) != 0) error = lastError();
   if (error) ::unlink(target.c_str());
   return error;
 }

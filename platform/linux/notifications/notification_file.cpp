@@ -10,13 +10,13 @@
 #include <cstdio>
 #include <filesystem>
 
+#include "platform/linux/files/system_error.h"
+
 namespace zal {
 namespace {
 
 constexpr mode_t kDirectoryMode = 0700;
 constexpr std::size_t kLongestName = 200;
-
-std::error_code lastError() { return {errno, std::generic_category()}; }
 
 std::string temporaryName() {
   static std::atomic<unsigned> counter{0};
@@ -38,7 +38,7 @@ std::error_code makeNotificationDirectory(const std::string& directory) {
   std::filesystem::create_directories(std::filesystem::path(directory).parent_path(), error);
   if (error) return error;
   if (::mkdir(directory.c_str(), kDirectoryMode) == 0) return {};
-  if (errno != EEXIST) return lastError();
+  if (errno != EEXIST) return lastSystemError();
   return std::filesystem::is_directory(directory, error) ? std::error_code{}
                                                          : std::make_error_code(std::errc::not_a_directory);
 }
@@ -49,11 +49,11 @@ std::error_code postNotification(const std::string& directory, std::string_view 
   const std::string temporary = directory + temporaryName();
   const int descriptor =
       ::open(temporary.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_NOFOLLOW | O_CLOEXEC, 0600);
-  if (descriptor < 0) return lastError();
+  if (descriptor < 0) return lastSystemError();
   ::close(descriptor);
   // A rename of the same name over an older post is an event of its own.
   if (::rename(temporary.c_str(), (directory + "/" + std::string(name)).c_str()) == 0) return {};
-  const std::error_code error = lastError();
+  const std::error_code error = lastSystemError();
   ::unlink(temporary.c_str());
   return error;
 }
