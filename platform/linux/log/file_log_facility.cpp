@@ -48,7 +48,10 @@ FileLogFacility::~FileLogFacility() { flush(); }
 void FileLogFacility::record(const LogRecord& record) {
   _mainThread.check("FileLogFacility");
   RotatingLogFile* file = _fileFor(record);
-  if (file == nullptr) return;
+  if (file == nullptr) {
+    _deliverMessages();
+    return;
+  }
   if (file->isRotationDue()) _rotate(*file);
   file->lastUse = ++_uses;
   if (file->bufferedBytes() == 0) file->swapBuffer(_spareBuffer);
