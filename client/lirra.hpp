@@ -1,7 +1,9 @@
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
 #include <string>
+#include <type_traits>
 #include <utility>
 
 #include "lirra.h"
@@ -61,8 +63,8 @@ class Dictionary {
 class Client {
  public:
   struct Options {
-    std::string socketPath;  ///< empty: where the agent of this user listens
-    std::string sender;      ///< empty: none
+    std::string socketPath = {};  ///< empty: where the agent of this user listens
+    std::string sender = {};      ///< empty: none
     std::size_t queueLimit = 0;
     bool synchronous = false;
     int closeTimeoutMs = 1000;  ///< how long the destructor waits for the agent
@@ -123,14 +125,16 @@ class Client {
   Result callQuality(Text session, Text description, Text log) {
     return lirra_call_quality(_raw, session, description, log);
   }
-  Result callMetric(Text session, Text metric, double value) {
-    return lirra_call_metric(_raw, session, metric, value);
-  }
-  Result callMetric(Text session, Text metric, std::int64_t value) {
-    return lirra_call_metric_int64(_raw, session, metric, value);
-  }
-  Result callMetric(Text session, Text metric, std::uint64_t value) {
-    return lirra_call_metric_uint64(_raw, session, metric, value);
+  /// Keeps the kind of the number: real, signed or unsigned.
+  template <class Number, class = std::enable_if_t<std::is_arithmetic_v<Number>>>
+  Result callMetric(Text session, Text metric, Number value) {
+    if constexpr (std::is_floating_point_v<Number>) {
+      return lirra_call_metric(_raw, session, metric, static_cast<double>(value));
+    } else if constexpr (std::is_signed_v<Number>) {
+      return lirra_call_metric_int64(_raw, session, metric, value);
+    } else {
+      return lirra_call_metric_uint64(_raw, session, metric, value);
+    }
   }
   Result pulse(Text session) { return lirra_pulse(_raw, session); }
   Result sessionEvent(Text session, std::int64_t event) { return lirra_session_event(_raw, session, event); }

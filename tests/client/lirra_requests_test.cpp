@@ -64,6 +64,7 @@ TEST_F(LirraRequestsTest, MetricTravelsAsACodedValueOfItsOwnKind) {
             begin + "<-3>" + end);
   EXPECT_EQ(sent([](auto& c) { return c.callMetric("Vistel", "rtt", std::uint64_t{7}); }),
             begin + "<7u>" + end);
+  EXPECT_EQ(sent([](auto& c) { return c.callMetric("Vistel", "rtt", 41); }), begin + "<41>" + end);
 }
 
 TEST_F(LirraRequestsTest, PulseHasTheSessionAlone) {

@@ -1,0 +1,102 @@
+#include "cli/host.h"
+
+#include <unistd.h>
+
+#include <cstdlib>
+#include <filesystem>
+#include <optional>
+#include <ostream>
+#include <string>
+#include <thread>
+
+#include "platform/agent_log.h"
+#include "platform/linux/config/configuration_loader.h"
+#include "platform/linux/config/host_environment.h"
+#include "platform/linux/config/host_paths.h"
+#include "platform/linux/config/toml_preference_store.h"
+#include "platform/linux/notifications/notification_file.h"
+
+namespace zal {
+namespace {
+
+constexpr std::string_view kDomain = "com.vendel.logging";
+
+/// What the preference store has to say is for the person at the terminal.
+class ToolLog final : public AgentLog {
+ public:
+  explicit ToolLog(std::ostream& err) : _err(err) {}
+  [[nodiscard]] bool isEnabled(std::string_view) const override { return false; }
+  void log(std::string_view, std::string_view) override {}
+  void notice(std::string_view) override {}
+  void warning(std::string_view text) override { _err << "lirractl: " << text << "\n"; }
+  void console(std::string_view, std::string_view) override {}
+  void backtrace() override {}
+
+ private:
+  std::ostream& _err;
+};
+
+class ThisMachine final : public ToolHost {
+ public:
+  explicit ThisMachine(std::ostream& err)
+      : _environment(HostEnvironment::ofThisProcess()),
+        _preferenceDirectory(preferenceDirectory(_environment)),
+        _log(err),
+        _preferences(_preferenceDirectory, _log) {}
+
+  [[nodiscard]] const ToolSettings& settings() override {
+    if (!_settings) _settings = _load();
+    return *_settings;
+  }
+  [[nodiscard]] std::optional<bool> preference(std::string_view key) override {
+    return _preferences.boolean(kDomain, key);
+  }
+  [[nodiscard]] std::optional<std::string> setPreference(std::string_view key, bool value) override {
+    return TomlPreferenceStore::setBoolean(_preferenceDirectory, kDomain, key, value);
+  }
+  [[nodiscard]] std::optional<std::string> postNotification(std::string_view name) override {
+    const std::string directory = notificationDirectory(settings().roots.RuntimeRoot);
+    const std::error_code error = zal::postNotification(directory, name);
+    if (!error) return std::nullopt;
+    return directory + ": " + error.message();
+  }
+  [[nodiscard]] bool outputIsTerminal() const override { return ::isatty(STDOUT_FILENO) != 0; }
+  [[nodiscard]] bool wantsColour() const override {
+    return outputIsTerminal() && _environment.variable("NO_COLOR").empty() &&
+           _environment.variable("TERM") != "dumb";
+  }
+  [[nodiscard]] bool isSuperuser() const override { return _environment.isSystem(); }
+  [[nodiscard]] std::string absolutePath(const std::string& path) const override {
+    std::error_code error;
+    const auto absolute = std::filesystem::absolute(path, error);
+    return error ? path : absolute.lexically_normal().string();
+  }
+  [[nodiscard]] std::chrono::steady_clock::time_point now() const override {
+    return std::chrono::steady_clock::now();
+  }
+  void pause(std::chrono::milliseconds duration) override { std::this_thread::sleep_for(duration); }
+
+ private:
+  ToolSettings _load() {
+    LoadedConfiguration loaded = ConfigurationLoader(_environment).load();
+    ToolSettings settings;
+    settings.socketPath = socketPath(_environment).value_or("");
+    settings.configurationFile = std::move(loaded.file);
+    settings.warnings = std::move(loaded.warnings);
+    settings.preferenceFile = TomlPreferenceStore::filePath(_preferenceDirectory, kDomain);
+    settings.roots = std::move(loaded.configuration.roots);
+    return settings;
+  }
+
+  HostEnvironment _environment;
+  std::string _preferenceDirectory;
+  ToolLog _log;
+  TomlPreferenceStore _preferences;
+  std::optional<ToolSettings> _settings;
+};
+
+}  // namespace
+
+std::unique_ptr<ToolHost> thisMachine(std::ostream& err) { return std::make_unique<ThisMachine>(err); }
+
+}  // namespace zal
