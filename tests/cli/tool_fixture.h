@@ -1,0 +1,94 @@
+#pragma once
+
+#include <filesystem>
+#include <map>
+#include <memory>
+#include <sstream>
+#include <string>
+#include <vector>
+
+#include <gtest/gtest.h>
+
+#include "cli/tool.h"
+#include "tests/client_support/scripted_agent.h"
+#include "tests/support/temporary_directory.h"
+
+namespace zal::testing {
+
+/// A machine whose answers a test sets.
+class ScriptedMachine final : public ToolHost {
+ public:
+  [[nodiscard]] const ToolSettings& settings() override { return toolSettings; }
+  [[nodiscard]] std::optional<bool> preference(std::string_view key) override {
+    const auto found = switches.find(key);
+    return found == switches.end() ? std::nullopt : std::optional(found->second);
+  }
+  [[nodiscard]] std::optional<std::string> setPreference(std::string_view key, bool value) override {
+    if (storeTrouble.empty()) switches[std::string(key)] = value;
+    return storeTrouble.empty() ? std::nullopt : std::optional(storeTrouble);
+  }
+  [[nodiscard]] std::optional<std::string> postNotification(std::string_view name) override {
+    posted.emplace_back(name);
+    return postTrouble.empty() ? std::nullopt : std::optional(postTrouble);
+  }
+  [[nodiscard]] bool outputIsTerminal() const override { return terminal; }
+  [[nodiscard]] bool wantsColour() const override { return terminal; }
+  [[nodiscard]] bool isSuperuser() const override { return false; }
+  [[nodiscard]] std::string absolutePath(const std::string& path) const override {
+    return path.starts_with('/') ? path : workingDirectory + "/" + path;
+  }
+  /// Stands still but for pauses.
+  [[nodiscard]] std::chrono::steady_clock::time_point now() const override { return moment; }
+  void pause(std::chrono::milliseconds duration) override {
+    moment += duration;
+    ++pauses;
+    if (onPause) onPause();
+  }
+
+  ToolSettings toolSettings;
+  std::map<std::string, bool, std::less<>> switches;
+  std::vector<std::string> posted;
+  std::string storeTrouble;
+  std::string postTrouble;
+  std::string workingDirectory;
+  bool terminal = false;
+  std::chrono::steady_clock::time_point moment;
+  int pauses = 0;
+  std::function<void()> onPause;
+};
+
+/// Runs the tool with arguments as one would type them, split already.
+class ToolFixture : public ::testing::Test {
+ protected:
+  ToolFixture() {
+    machine.toolSettings.socketPath = directory / "agent";
+    machine.toolSettings.roots.DiagnosticReportRoot = directory / "Reports";
+    machine.toolSettings.preferenceFile = "/config/com.vendel.logging.toml";
+    machine.workingDirectory = directory.path();
+  }
+  int run(const std::vector<std::string>& arguments, const std::string& input = "") {
+    std::istringstream in(input);
+    std::ostringstream outStream;
+    std::ostringstream errStream;
+    const int code = runTool(arguments, machine, in, outStream, errStream);
+    out = outStream.str();
+    err = errStream.str();
+    return code;
+  }
+  void startAgent() { agent = std::make_unique<ScriptedAgent>(directory / "agent"); }
+  /// The tree's own path replaced by "ROOT", so that whole outputs can be compared.
+  [[nodiscard]] std::string plain(std::string text) const {
+    for (std::size_t at = 0; (at = text.find(directory.path(), at)) != std::string::npos;) {
+      text.replace(at, directory.path().size(), "ROOT");
+    }
+    return text;
+  }
+
+  TemporaryDirectory directory;
+  ScriptedMachine machine;
+  std::unique_ptr<ScriptedAgent> agent;
+  std::string out;
+  std::string err;
+};
+
+}  // namespace zal::testing
