@@ -6,7 +6,6 @@
 #include <sys/wait.h>
 
 #include <ctime>
-#include <fstream>
 
 #include "tests/linux/ipc/ipc_fixture.h"
 
@@ -261,6 +260,13 @@ TEST_F(UnixIpcListenerTest, APassedDescriptorThatDoesNotListenIsRefused) {
 
 TEST_F(UnixIpcListenerTest, OutOfDescriptorsItSaysSoOnceWithoutSpinningAndGoesOnLater) {
   startService();
+  // The sanitizer looks at each kind of object once with a descriptor of its own: now, by a failure
+  // that uses the same ones, not later.
+  UnixIpcService lost(loop.context(), loop, log, {directory / "none/socket", settings, {}});
+  const auto door = lost.makeListener("com.vendel.lirra");
+  door->resume([] {}, [](const auto&, const auto&) {});
+  runFor(1ms);
+  log.lines.clear();
   const TestClient client(path);
   ASSERT_TRUE(client.send(requestFrame(1, "patient")));
   rlimit before{};
