@@ -47,8 +47,8 @@ TEST_F(LinuxRunLoopTest, DoesNotWakeUpWhileNoTimerIsDue) {
 TEST_F(LinuxRunLoopTest, SleepObserversRunOnceForEachSleep) {
   int sleeps = 0;
   loop.addSleepObserver([&] { ++sleeps; });
-  loop.callAfter(20ms, [] {});
-  runFor(60ms);
+  loop.callAfter(50ms, [this] { loop.callAfter(100ms, [this] { loop.stop(); }); });
+  loop.run();
   // Before the first timer, after it, and at most once more after a handler that only woke the loop.
   EXPECT_GE(sleeps, 2);
   EXPECT_LE(sleeps, 4);
