@@ -101,6 +101,21 @@ TEST_F(FileLogFacilityTest, ALargeBufferDoesNotWaitForTheLoop) {
   EXPECT_GE(content("Vistel/Vistel.log").size(), 262'144U);
 }
 
+TEST_F(FileLogFacilityTest, AFileThatWasTakenAwayIsMissedOnceASecond) {
+  start();
+  record("Vistel", "one");
+  loop.drain();
+  std::filesystem::rename(root + "/Vistel/Vistel.log", root + "/taken");
+  loop.advance(999ms);
+  record("Vistel", "two");
+  loop.drain();
+  EXPECT_EQ(content("taken"), line("one") + "2024-05-02 14:03:08.250 <6> two\n");
+  loop.advance(1ms);
+  record("Vistel", "three");
+  loop.drain();
+  EXPECT_EQ(content("Vistel/Vistel.log"), "2024-05-02 14:03:08.251 <6> three\n");
+}
+
 TEST_F(FileLogFacilityTest, NoTypeLeadsOutOfTheRoot) {
   start();
   for (const char* type : {"../../Vistel", "..", "/etc/passwd", "a/../..", "a\nb"}) record(type, type);
