@@ -1,0 +1,68 @@
+#include "platform/linux/host/linux_platform.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <csignal>
+
+#include "tests/support/temporary_directory.h"
+
+namespace zal {
+namespace {
+
+using testing::readFile;
+using testing::TemporaryDirectory;
+using testing::writeFile;
+
+class LinuxPlatformTest : public ::testing::Test {
+ protected:
+  HostEnvironment environment() const {
+    HostEnvironment result;
+    result.userId = 1234;
+    result.homeDirectory = home.path();
+    result.variables = {{"LIRRA_CONFIG", home / "config/lirra.toml"},
+                        {"LIRRA_SOCKET", home / "agent.socket"},
+                        {"XDG_RUNTIME_DIR", home / "run"}};
+    return result;
+  }
+  void configure(const std::string& text) const { writeFile(home / "config/lirra.toml", text); }
+
+  TemporaryDirectory home;
+};
+
+TEST_F(LinuxPlatformTest, HandsOutServicesOfTheConfigurationThatTheEnvironmentLeadsTo) {
+  configure("[roots]\nUserLogRoot = '" + (home / "logs") + "'\n");
+  writeFile(home / "config/com.vendel.logging.toml", "CallLogging = true\n");
+  LinuxPlatform platform(environment());
+  Platform& services = platform.services();
+  EXPECT_EQ(services.configuration.roots.UserLogRoot, home / "logs");
+  EXPECT_EQ(services.files.homeDirectory(), home.path());
+  EXPECT_EQ(services.preferences.boolean("com.vendel.logging", "CallLogging"), true);
+  services.logFacility.record({.type = "Set", .category = "Set", .line = "a line"});
+  services.logFacility.flush();
+  EXPECT_THAT(readFile(home / "logs/Set/Set.log"), ::testing::EndsWith("a line\n"));
+}
+
+TEST_F(LinuxPlatformTest, ListensAtTheSocketOfTheEnvironment) {
+  LinuxPlatform platform(environment());
+  auto listener = platform.services().ipc.makeListener("com.vendel.lirra");
+  listener->resume([] {}, [](const std::shared_ptr<PeerConnection>&, const IpcEvent&) {});
+  EXPECT_TRUE(std::filesystem::is_socket(home / "agent.socket"));
+}
+
+TEST_F(LinuxPlatformTest, WarningsOfTheConfigurationReachTheAgentsOwnLogSet) {
+  configure("[roots]\nUserLogRoot = '" + (home / "logs") + "'\nNoSuchRoot = 'x'\n");
+  LinuxPlatform platform(environment());
+  platform.services().logFacility.flush();
+  EXPECT_THAT(readFile(home / "logs/ZalLogging/ZalLogging.log"),
+              ::testing::HasSubstr("lirra.toml:3: unknown key roots.NoSuchRoot"));
+}
+
+TEST_F(LinuxPlatformTest, ABrokenPipeEndsNothing) {
+  std::signal(SIGPIPE, SIG_DFL);
+  const LinuxPlatform platform(environment());
+  EXPECT_EQ(std::signal(SIGPIPE, SIG_IGN), SIG_IGN);
+}
+
+}  // namespace
+}  // namespace zal
