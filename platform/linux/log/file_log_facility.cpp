@@ -19,6 +19,9 @@ constexpr std::size_t kFlushSize = 256U << 10U;
 constexpr std::size_t kLargestSpareBuffer = 1U << 20U;
 /// While the disk refuses, the next attempt when nothing else makes one.
 constexpr auto kRetryDelay = 1s;
+/// A file that somebody takes away is as good as taken away this much later; looking at each write
+/// would cost the writer of a single record more than the write.
+constexpr auto kLookInterval = 1s;
 /// Files that fill faster than that are compressed a little later, together: of a flood only the
 /// newest nine are worth it.
 constexpr auto kFloodInterval = 2s;
@@ -186,7 +189,13 @@ void FileLogFacility::_schedule(const UnfinishedRotation& rotation, std::chrono:
 }
 
 void FileLogFacility::_flushDirty() {
-  std::erase_if(_dirty, [this](RotatingLogFile* file) {
+  if (_dirty.empty()) return;
+  const SteadyTime now = _host.clock.steadyNow();
+  std::erase_if(_dirty, [this, now](RotatingLogFile* file) {
+    if (now - file->lastLook >= kLookInterval) {
+      file->lastLook = now;
+      file->leaveIfReplaced();
+    }
     if (!file->flush()) return false;
     _keepSpareBuffer(*file);
     file->isListedDirty = false;

@@ -58,7 +58,7 @@ void RotatingLogFile::endRecord() {
 
 bool RotatingLogFile::flush() {
   if (_buffer.empty() && !_inOutage) return true;
-  if (_descriptor >= 0 && _wasReplaced()) close();
+  if (_inOutage) leaveIfReplaced();
   const int error = _descriptor >= 0 || _open() ? _write() : errno;
   if (error == 0) {
     if (_inOutage) _endOutage();
@@ -123,6 +123,10 @@ void RotatingLogFile::_forgetTornRecord() {
   _buffer.erase(0, nextRecordStart(_buffer, 0));
   _startsInsideRecord = false;
   ++_dropped;
+}
+
+void RotatingLogFile::leaveIfReplaced() {
+  if (_descriptor >= 0 && _wasReplaced()) close();
 }
 
 /// Whether somebody took the file away or put another one in its place: what is written to the open

@@ -6,6 +6,8 @@
 #include <system_error>
 #include <vector>
 
+#include "platform/clock.h"
+
 namespace zal {
 
 /// One current log file: collects records, appends them in one write, steps aside for a rotation.
@@ -37,6 +39,9 @@ class RotatingLogFile {
 
   /// Appends what is buffered to the file. Returned: whether nothing is left over.
   bool flush();
+  /// Gives up a file that somebody removed or renamed, so that the next flush makes a new one. Costs
+  /// more than a small write, so it is not for each of them; in an outage flush() does it by itself.
+  void leaveIfReplaced();
   /// Whether the file with what is buffered has reached its size, so that the next record belongs
   /// into a new one.
   [[nodiscard]] bool isRotationDue() const {
@@ -58,6 +63,7 @@ class RotatingLogFile {
   void swapBuffer(std::string& other) { _buffer.swap(other); }
 
   std::uint64_t lastUse = 0;  ///< for whoever keeps many of these
+  SteadyTime lastLook{};      ///< when leaveIfReplaced() was called, likewise
   bool isListedDirty = false;
 
  private:
