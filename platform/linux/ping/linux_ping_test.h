@@ -1,27 +1,22 @@
 #pragma once
 
 #include <atomic>
-#include <chrono>
 #include <memory>
 #include <string>
-#include <vector>
 
 #include <asio/io_context.hpp>
-#include <asio/ip/address.hpp>
-#include <asio/ip/udp.hpp>
-#include <asio/steady_timer.hpp>
 
 #include "platform/linux/ping/linux_ping_facility.h"
 #include "platform/linux/ping/ping_report.h"
-#include "platform/linux/ping/ping_run.h"
 #include "platform/ping_test.h"
 
 namespace zal {
 
 class AgentLog;
+class PingAttempt;
 
-/// One ping on the loop: finds the address, then the first way of pinging that the host permits,
-/// then lets it run until the time is over. See LinuxPingFacility for threads and lifetimes.
+/// One ping, as any thread sees it; the work is its attempt's, on the loop. See LinuxPingFacility
+/// for threads and lifetimes.
 class LinuxPingTest : public PingTest, public std::enable_shared_from_this<LinuxPingTest> {
  public:
   /// A minute shows what a call suffers from, periodic trouble included, in a file that one still reads.
@@ -39,31 +34,13 @@ class LinuxPingTest : public PingTest, public std::enable_shared_from_this<Linux
   void stop() override;
 
  private:
-  void _begin();
-  void _armDeadline(std::chrono::nanoseconds duration);
-  void _timeIsOver();
-  void _resolve();
-  void _pingFirstReachable(const std::vector<asio::ip::address>& candidates);
-  void _openRun(const asio::ip::address& peer, const SourceProbe& probe);
-  void _start(std::shared_ptr<PingRun> run);
-  void _addHeading(const asio::ip::address& peer, const SourceProbe& probe);
-  void _fail(std::string reason);
-  void _complete();
-
   asio::io_context& _context;
   AgentLog& _log;
   const std::string _host, _interface;
   const PingMethods _methods;
   const std::shared_ptr<PingReport> _report;
   std::atomic<double> _secondsToRun{0};
-
-  // Loop thread only from here on.
-  std::chrono::nanoseconds _duration{0};
-  WorkQueue* _queue = nullptr;  // not null while it runs
-  CompletionHandler _handler;
-  std::shared_ptr<PingRun> _run;
-  asio::ip::udp::resolver _resolver;
-  asio::steady_timer _deadline;  // its pending wait keeps a running test alive
+  std::weak_ptr<PingAttempt> _attempt;  // loop thread only; the loop's pending work owns it
 };
 
 }  // namespace zal

@@ -8,6 +8,7 @@
 #include <cstdlib>
 #include <random>
 #include <stdexcept>
+#include <utility>
 
 namespace zal::testing {
 namespace {
@@ -59,16 +60,18 @@ bool NetworkNamespaces::_build() const {
              "ip addr add 10.78.0.2/24 dev far1; ip link set far0 up; ip link set far1 up");
 }
 
-NamespaceLoop::NamespaceLoop(const std::string& name) {
+std::thread threadIn(const std::string& name, std::function<void()> work) {
   const int space = ::open(("/run/netns/" + name).c_str(), O_RDONLY | O_CLOEXEC);
   if (space < 0) throw std::runtime_error("no such network namespace: " + name);
-  _thread = std::thread([this, space] {
+  return std::thread([space, work = std::move(work)] {
     const bool entered = ::setns(space, CLONE_NEWNET) == 0;
     ::close(space);
     if (!entered) std::abort();  // the packets of a test must not leave it
-    context.run();
+    work();
   });
 }
+
+NamespaceLoop::NamespaceLoop(const std::string& name) : _thread(threadIn(name, [this] { context.run(); })) {}
 
 NamespaceLoop::~NamespaceLoop() {
   context.stop();

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <functional>
 #include <memory>
 #include <string>
 #include <thread>
@@ -32,6 +33,7 @@ class NetworkNamespaces {
     return near("n=0; until ping -q -c 1 -w 1 fd77::2; do n=$((n + 1)); [ $n -lt 100 ]; done");
   }
   [[nodiscard]] const std::string& nearName() const { return _near; }
+  [[nodiscard]] const std::string& farName() const { return _far; }
 
  private:
   NetworkNamespaces();
@@ -39,6 +41,9 @@ class NetworkNamespaces {
   [[nodiscard]] static bool _in(const std::string& name, const std::string& command);
   const std::string _near, _far;
 };
+
+/// A thread whose sockets live in the namespace. Throws when there is no such namespace.
+[[nodiscard]] std::thread threadIn(const std::string& name, std::function<void()> work);
 
 /// A loop on a thread that lives in a namespace. The thread ends with the object; the context goes
 /// after it, and with it what still ran.
