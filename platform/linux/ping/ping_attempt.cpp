@@ -134,7 +134,7 @@ void PingAttempt::_openRun(const asio::ip::address& peer, const SourceProbe& pro
       _task.report, onEnd));
 }
 
-void PingAttempt::_start(std::shared_ptr<PingRun> run) {
+void PingAttempt::_start(const std::shared_ptr<PingRun>& run) {
   _run = run;
   run->start();  // may end at once and let go of _run
 }

@@ -45,7 +45,7 @@ class PingAttempt : public std::enable_shared_from_this<PingAttempt> {
   void _resolve();
   void _pingFirstReachable(const std::vector<asio::ip::address>& candidates);
   void _openRun(const asio::ip::address& peer, const SourceProbe& probe);
-  void _start(std::shared_ptr<PingRun> run);
+  void _start(const std::shared_ptr<PingRun>& run);
   void _addHeading(const asio::ip::address& peer, const SourceProbe& probe);
   void _fail(std::string reason);
   void _complete();
