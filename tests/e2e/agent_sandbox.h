@@ -10,7 +10,7 @@
 namespace zal::testing {
 
 /// Longest time that any condition of these tests may take to come true.
-inline constexpr std::chrono::seconds kDeadline{60};
+inline constexpr std::chrono::seconds kDeadline{180};
 
 /// Asks again and again, with short waits, until the condition holds. False after the deadline.
 bool eventually(const std::function<bool()>& condition, std::chrono::milliseconds deadline = kDeadline);
