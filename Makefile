@@ -35,8 +35,8 @@ house-check:
 	python3 scripts/house_check.py
 
 build-plain:
-	$(CMAKE) -Wno-dev -S . -B $(BUILD)/plain -DCMAKE_BUILD_TYPE=Release -DZAL_TESTS=ON
-	$(CMAKE) --build $(BUILD)/plain -j $(JOBS)
+	$(CMAKE) -Wno-dev -S . -B $(BUILD) -DCMAKE_BUILD_TYPE=Release -DZAL_TESTS=ON -DZAL_BENCH=ON
+	$(CMAKE) --build $(BUILD) -j $(JOBS)
 
 # clang here and GCC in the other two: both compilers read every line.
 build-address:
@@ -51,7 +51,7 @@ build-thread:
 	$(CMAKE) --build $(BUILD)/thread -j $(JOBS)
 
 test-plain: build-plain
-	cd $(BUILD)/plain && ctest --output-on-failure -j $(JOBS)
+	cd $(BUILD) && ctest --output-on-failure -j $(JOBS)
 
 test-address: build-address
 	cd $(BUILD)/address && UBSAN_OPTIONS=print_stacktrace=1 ctest --output-on-failure -j $(JOBS)
@@ -68,15 +68,15 @@ fuzz: dependencies-build dependencies-test build-address
 
 ## make bench    the benchmarks against their peers, one table at the end
 bench: dependencies-build dependencies-test dependencies-bench
-	$(CMAKE) -Wno-dev -S . -B $(BUILD)/bench -DCMAKE_BUILD_TYPE=Release -DZAL_TESTS=OFF -DZAL_BENCH=ON
-	$(CMAKE) --build $(BUILD)/bench -j $(JOBS)
-	bench/run $(BUILD)/bench/bin
+	$(CMAKE) -Wno-dev -S . -B $(BUILD) -DCMAKE_BUILD_TYPE=Release -DZAL_TESTS=OFF -DZAL_BENCH=ON
+	$(CMAKE) --build $(BUILD) -j $(JOBS)
+	bench/run $(BUILD)/bin
 
 ## make lint     clang-tidy and the format check over the whole tree
 lint: dependencies-build dependencies-develop build-plain
 	git ls-files '*.cpp' '*.h' '*.hpp' | xargs clang-format --dry-run -Werror
 	git ls-files 'platform/*.cpp' 'collectors/*.cpp' 'session/*.cpp' 'agent/*.cpp' 'client/*.cpp' 'cli/*.cpp' \
-		| xargs -P $(JOBS) -n 4 clang-tidy -p $(BUILD)/plain --quiet
+		| xargs -P $(JOBS) -n 4 clang-tidy -p $(BUILD) --quiet
 
 ## make format   lays out the sources as .clang-format says
 format: dependencies-develop
