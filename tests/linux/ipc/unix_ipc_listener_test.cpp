@@ -322,5 +322,18 @@ TEST_F(UnixIpcListenerTest, AnUnknownGroupIsSaidAndLetsNobodyElseIn) {
                   "user may talk to it"});
 }
 
+TEST_F(UnixIpcListenerTest, StoppingToListenTakesTheFileAwayAndKeepsThePeers) {
+  startService();
+  TestClient client(path);
+  ASSERT_TRUE(client.send(bareFrame(FrameKind::barrier, 1)));
+  ASSERT_TRUE(runUntil([&] { return service->peerCount() == 1; }));
+  service->stopListening();
+  EXPECT_FALSE(exists(path));
+  EXPECT_FALSE(TestClient(path).isConnected());
+  EXPECT_EQ(service->peerCount(), 1U);
+  service->stopListening();  // once more is fine
+  EXPECT_EQ(invalidations, 0);
+}
+
 }  // namespace
 }  // namespace zal
