@@ -10,6 +10,8 @@
 namespace zal {
 namespace {
 
+std::string inside(const std::string& directory, const std::string& name) { return directory + "/" + name; }
+
 bool isCopied(const std::string& name) {
   return name.find("beacond") != std::string::npos || name.find(".log.gz") == std::string::npos;
 }
@@ -45,7 +47,7 @@ void FileCollector::CopyDirectoryContents(const std::string& sourceDirectory, co
   if (!names) return;
   std::error_code errorSlot;
   for (const auto& name : *names) {
-    if (isCopied(name)) _copy(source + "/" + name, directory + "/" + name, errorSlot);
+    if (isCopied(name)) _copy(inside(source, name), inside(directory, name), errorSlot);
   }
 }
 
@@ -58,8 +60,8 @@ void FileCollector::CopyCrashReportsMatching(const std::vector<std::string>& fra
   std::error_code errorSlot;
   for (const auto& name : *names) {
     std::error_code notThere;
-    if (std::filesystem::is_directory(source + "/" + name, notThere)) continue;
-    if (containsAny(name, fragments)) _copy(source + "/" + name, directory + "/" + name, errorSlot);
+    if (std::filesystem::is_directory(inside(source, name), notThere)) continue;
+    if (containsAny(name, fragments)) _copy(inside(source, name), inside(directory, name), errorSlot);
   }
 }
 

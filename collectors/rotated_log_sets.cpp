@@ -1,6 +1,7 @@
 #include "collectors/rotated_log_sets.h"
 
 #include <filesystem>
+#include <span>
 #include <string_view>
 #include <system_error>
 
@@ -26,6 +27,15 @@ bool isPlainName(const std::string& name) {
          name.find('\0') == std::string::npos;
 }
 
+void linkFiles(FileCollector& collector, const DirectoryRoots& roots, const std::string& name,
+               const std::string& destination, std::span<const std::string_view> endings) {
+  const std::string start = roots.UserLogRoot + "/" + name + "/" + name;
+  const std::string directory = destination + "/" + name;
+  for (const auto ending : endings) {
+    collector.LinkFileIntoDirectory(std::string(start).append(ending), directory, "");
+  }
+}
+
 }  // namespace
 
 void LinkRotatedLogSets(FileCollector& collector, const DirectoryRoots& roots, AgentLog& log,
@@ -38,13 +48,8 @@ void LinkRotatedLogSets(FileCollector& collector, const DirectoryRoots& roots, A
       log.warning("Refused the log set \"" + name + "\": its name leads out of the log directory");
       continue;
     }
-    const auto link = [&](std::string_view ending) {
-      collector.LinkFileIntoDirectory((roots.UserLogRoot + "/" + name + "/" + name).append(ending),
-                                      destination + "/" + name, "");
-    };
-    for (const auto ending : kRecent) link(ending);
-    if (!includeAllGenerations) continue;
-    for (const auto ending : kOlder) link(ending);
+    linkFiles(collector, roots, name, destination, kRecent);
+    if (includeAllGenerations) linkFiles(collector, roots, name, destination, kOlder);
   }
 }
 

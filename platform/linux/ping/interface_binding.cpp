@@ -32,7 +32,7 @@ std::optional<asio::ip::address> ownAddress(const std::string& interface, const 
   for (const ifaddrs* entry = list; entry != nullptr; entry = entry->ifa_next) {
     if (interface != entry->ifa_name) continue;
     if (entry->ifa_addr == nullptr) continue;
-    const auto address = addressIn(*entry->ifa_addr);
+    auto address = addressIn(*entry->ifa_addr);
     if (!address || address->is_v4() != peer.is_v4()) continue;
     if (isLinkLocal(*address) == isLinkLocal(peer)) return address;
   }

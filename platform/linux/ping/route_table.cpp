@@ -107,7 +107,7 @@ std::optional<DefaultRoute> defaultRouteV6(std::string_view table, std::string_v
 }
 
 std::optional<DefaultRoute> currentDefaultRoute(const std::string& interface) {
-  const auto v4 = defaultRouteV4(readAll(kTableV4), interface);
+  auto v4 = defaultRouteV4(readAll(kTableV4), interface);
   if (v4 && v4->gateway) return v4;
   auto v6 = defaultRouteV6(readAll(kTableV6), interface);
   if (!v6 || !v6->gateway) return v4 ? v4 : v6;

@@ -32,6 +32,7 @@ int ChildSetup::start(pid_t& child, const std::string& file, std::vector<std::st
                       char* const* environment) {
   ::posix_spawn_file_actions_addclosefrom_np(&_actions, STDERR_FILENO + 1);
   std::vector<char*> pointers;
+  pointers.reserve(arguments.size() + 1);
   for (auto& argument : arguments) pointers.push_back(argument.data());
   pointers.push_back(nullptr);
   return ::posix_spawnp(&child, file.c_str(), &_actions, &_attributes, pointers.data(), environment);
