@@ -88,7 +88,9 @@ hooks: dependencies-develop
 
 ## make install  the programs, library, headers and unit files; DESTDIR and PREFIX as usual
 install: build
-	$(CMAKE) --install $(BUILD) --prefix $(or $(PREFIX),/usr/local)
+	$(CMAKE) -S . -B $(BUILD) -DCMAKE_INSTALL_PREFIX=$(or $(PREFIX),/usr/local)
+	$(CMAKE) --build $(BUILD) -j $(JOBS)
+	$(CMAKE) --install $(BUILD)
 
 clean:
 	rm -rf $(BUILD)

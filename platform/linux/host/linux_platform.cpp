@@ -73,4 +73,9 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
   for (const std::string& warning : _loaded.warnings) _agentLog.warning(warning);
 }
 
+LinuxPlatform::~LinuxPlatform() {
+  // The services that go after the facility may still have something to say.
+  _agentLog.setLogFacility(nullptr);
+}
+
 }  // namespace zal

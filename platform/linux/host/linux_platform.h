@@ -34,6 +34,7 @@ class LinuxPlatform {
  public:
   /// Broken pipes are errors of a write from now on, and end nothing.
   explicit LinuxPlatform(const HostEnvironment& environment);
+  ~LinuxPlatform();
   LinuxPlatform(const LinuxPlatform&) = delete;
   LinuxPlatform& operator=(const LinuxPlatform&) = delete;
 

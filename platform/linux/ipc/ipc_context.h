@@ -31,8 +31,8 @@ struct IpcContext {
   AgentLog& log;
   const IpcSettings settings;
   const std::function<void()> flush;
-  PeerHandler handler;      // set once, before the first peer
-  bool delivering = false;  // from the listener's resume to its end
+  PeerHandler handler;                          // set once, before the first peer
+  bool delivering = false;                      // from the listener's resume to its end
   std::function<void()> stopListening = [] {};  // by whoever listens
   std::unordered_set<std::shared_ptr<UnixPeerConnection>> peers;
   /// One for all peers: each is read, decoded and handled in one go. Not zeroed, so that a quiet
