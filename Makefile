@@ -95,5 +95,5 @@ install: build
 clean:
 	rm -rf $(BUILD)
 
-dependencies-%:
-	@scripts/install-dependencies $*
+dependencies-build dependencies-test dependencies-bench dependencies-develop:
+	@scripts/install-dependencies $(@:dependencies-%=%)
