@@ -3,6 +3,8 @@
 #include <cstdint>
 #include <map>
 #include <string>
+#include <type_traits>
+#include <utility>
 #include <variant>
 #include <vector>
 
@@ -19,9 +21,12 @@ struct Value {
   Storage storage;
 
   Value() : storage(nullptr) {}
+  /// From anything that the storage takes, so that dictionaries read as they are written.
   template <class T>
-  requires std::is_constructible_v<Storage, T> Value(T&& value)
-      : storage(std::forward<T>(value)) {}  // NOLINT(google-explicit-constructor)
+  requires(!std::is_same_v<std::remove_cvref_t<T>, Value> && std::is_constructible_v<Storage, T>)
+      // NOLINTNEXTLINE(bugprone-forwarding-reference-overload)
+      Value(T&& value)
+      : storage(std::forward<T>(value)) {}
 
   template <class T>
   [[nodiscard]] const T* as() const {
