@@ -18,7 +18,7 @@ void purgeVerboseLogs(const std::string& logRoot, std::span<const std::string_vi
   for (const std::string_view type : types) {
     const std::string directory = logRoot + "/" + std::string(type);
     for (const std::string& name : listDirectory(directory, HiddenEntries::skipped).value_or(Names{})) {
-      const std::string path = directory + "/" + name;
+      const std::string path = std::string(directory).append("/").append(name);
       if (path.find(kVerboseLogMarker) == std::string::npos) continue;
       std::error_code ignored;
       std::filesystem::remove_all(path, ignored);
