@@ -52,12 +52,15 @@ build-thread:
 
 test-plain: build-plain
 	cd $(BUILD) && ctest --output-on-failure -j $(JOBS)
+	@scripts/skipped-tests $(BUILD)
 
 test-address: build-address
 	cd $(BUILD)/address && UBSAN_OPTIONS=print_stacktrace=1 ctest --output-on-failure -j $(JOBS)
+	@scripts/skipped-tests $(BUILD)/address
 
 test-thread: build-thread
 	cd $(BUILD)/thread && TSAN_OPTIONS="halt_on_error=1 second_deadlock_stack=1" ctest --output-on-failure -j $(JOBS)
+	@scripts/skipped-tests $(BUILD)/thread
 
 fuzz-short: build-address
 	scripts/fuzz $(BUILD)/address $(TEST_FUZZ_SECONDS)
@@ -84,7 +87,7 @@ format: dependencies-develop
 
 ## make hooks    installs the commit hook: format, house check
 hooks: dependencies-develop
-	install -m 755 scripts/pre-commit "$$(git rev-parse --git-path hooks)/pre-commit"
+	install -D -m 755 scripts/pre-commit "$$(git rev-parse --git-path hooks)/pre-commit"
 
 ## make install  the programs, library, headers and unit files; DESTDIR and PREFIX as usual
 install: build
