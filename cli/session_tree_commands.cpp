@@ -57,6 +57,7 @@ ExitCode list(ToolContext& tool) {
   const std::vector<SessionDirectory> sessions = findSessions(root(tool));
   if (tool.options.json) {
     std::vector<std::string> elements;
+    elements.reserve(sessions.size());
     for (const SessionDirectory& session : sessions) elements.push_back(jsonOf(session));
     tool.out << jsonArray(elements) << "\n";
     return ExitCode::done;
