@@ -1,6 +1,9 @@
 #include <sys/mount.h>
 #include <unistd.h>
 
+#include <cerrno>
+#include <cstring>
+
 #include "tests/e2e/e2e_fixture.h"
 
 namespace zal {
@@ -17,8 +20,9 @@ class FullDiskE2eTest : public testing::E2eFixture {
     _disk = sandbox / "disk";
     std::filesystem::create_directories(_disk);
     if (::mount("tmpfs", _disk.c_str(), "tmpfs", 0, "size=1m") != 0) {
+      const int error = errno;
       _disk.clear();
-      GTEST_SKIP() << "mounting a small file system is not allowed here";
+      GTEST_SKIP() << "a tmpfs cannot be mounted here: " << std::strerror(error);
     }
     sandbox.stateRoot = _disk;
   }

@@ -60,7 +60,7 @@ class PingFixture : public ::testing::Test {
  protected:
   void SetUp() override {
     network = NetworkNamespaces::make();
-    if (!network) GTEST_SKIP() << "network namespaces are not permitted here";
+    if (!network) GTEST_SKIP() << "ip could not make a pair of network namespaces here";
     loop = std::make_unique<NamespaceLoop>(network->nearName());
   }
   void TearDown() override { loop.reset(); }
