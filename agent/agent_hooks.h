@@ -2,24 +2,13 @@
 
 #include <cstdint>
 #include <functional>
-#include <memory>
 #include <string>
 
-#include "platform/ipc_peer.h"
-#include "session/optional_text.h"
+#include "dump/action_request.h"
+#include "dump/action_server.h"
 #include "session/session_services.h"
 
 namespace zal {
-
-/// One action that a client asks for. Borrowed for the call.
-struct ActionRequest {
-  std::int64_t action = 0;
-  OptionalText session;
-  OptionalText sender;
-  const std::shared_ptr<PeerConnection>& peer;  ///< may be empty
-  const Message* request = nullptr;             ///< the message to reply to; may be absent
-  const ValueMap* userInfo = nullptr;           ///< may be absent
-};
 
 /// What the server sets going in the diagnostics behind it. Each is called on the main thread and
 /// does nothing unless it is given.
@@ -32,7 +21,8 @@ struct AgentHooks {
   /// The last step of writing a session.
   std::function<void(const CollectionRequest&)> CollectServiceLogs = [](const CollectionRequest&) {};
   /// Carries out one action; activity is noted around it.
-  std::function<void(const ActionRequest&)> performAction = [](const ActionRequest&) {};
+  std::function<void(const ActionRequest&, ActionServer&)> performAction = [](const ActionRequest&,
+                                                                              ActionServer&) {};
 };
 
 }  // namespace zal

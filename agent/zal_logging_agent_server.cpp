@@ -103,8 +103,12 @@ void ZalLoggingAgentServer::performAction(std::int64_t action, OptionalText sess
                                           const std::shared_ptr<PeerConnection>& peer, const Message* request,
                                           const ValueMap* userInfo) {
   _noteActivity();
-  _hooks.performAction(ActionRequest{action, session, sender, peer, request, userInfo});
+  _hooks.performAction(ActionRequest{action, session, sender, peer, request, userInfo}, *this);
   _noteActivity();
+}
+
+void ZalLoggingAgentServer::startPing(OptionalText sessionType, bool useWifi) {
+  if (const Session session = _sessionForSessionType(sessionType, false)) session->startPing(useWifi);
 }
 
 }  // namespace zal

@@ -31,7 +31,7 @@ inline constexpr std::int64_t kBeginFlagInitiator = 4;
 /// records what clients log, and ends the process after six idle minutes. Requests are never
 /// refused with an error: absent texts take defaults, unknown sessions and switched-off call logging
 /// make an operation do nothing. Main thread only; the platform outlives it.
-class ZalLoggingAgentServer {
+class ZalLoggingAgentServer : public ActionServer {
  public:
   using Sessions = std::map<std::string, std::shared_ptr<ZalLoggingAgentVistelSession>>;
 
@@ -44,7 +44,7 @@ class ZalLoggingAgentServer {
   static void resetSharedInstanceForTests();
 
   ZalLoggingAgentServer(Platform& platform, AgentHooks hooks);
-  ~ZalLoggingAgentServer();
+  ~ZalLoggingAgentServer() override;
   ZalLoggingAgentServer(const ZalLoggingAgentServer&) = delete;
   ZalLoggingAgentServer& operator=(const ZalLoggingAgentServer&) = delete;
 
@@ -92,8 +92,13 @@ class ZalLoggingAgentServer {
   void performAction(std::int64_t action, OptionalText session, OptionalText sender,
                      const std::shared_ptr<PeerConnection>& peer, const Message* request,
                      const ValueMap* userInfo);
-  /// A running automation keeps an idle process alive.
-  void setAutomationRunning(bool running) { _automationRunning = running; }
+
+  // What actions ask of the server.
+  void notePoorNetworkConditions() override { _notePoorNetworkConditions(); }
+  void startPing(OptionalText sessionType, bool useWifi) override;
+  void setAutomationRunning(bool running) override { _automationRunning = running; }
+  /// Does nothing: a dump is over when its alert is posted.
+  void userNotificationDidFinish() override {}
 
   // What the server is at this moment.
   [[nodiscard]] const Sessions& sessions() const { return _sessions; }

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <chrono>
+#include <optional>
 #include <string>
 
 namespace zal {
@@ -29,6 +30,9 @@ class Clock {
   [[nodiscard]] virtual WallTime wallNow() const = 0;
   /// Any moment of the years 1 to 9999 works; the process locale plays no part.
   [[nodiscard]] virtual LocalTime localTime(WallTime moment) const = 0;
+  /// The moment at which the local calendar shows this; nothing when there is no such date. A time
+  /// that a change of the clocks skips or repeats is one of the moments around it.
+  [[nodiscard]] virtual std::optional<WallTime> momentOf(const LocalTime& time) const = 0;
   /// The local zone's abbreviation as it is now ("CET"); empty when the zone has none.
   [[nodiscard]] virtual std::string zoneAbbreviation() const = 0;
 };

@@ -2,6 +2,7 @@
 
 #include <chrono>
 #include <cstdint>
+#include <map>
 #include <optional>
 #include <string>
 #include <vector>
@@ -15,6 +16,13 @@ struct Endpoints {
   std::string reportServer;    ///< ping target of a session's ping request
   std::string cellPingServer;  ///< relay server pinged over the cellular interface
   std::string wifiPingServer;  ///< second server, pinged over Wi-Fi
+  // Names and addresses that the network dump asks for and traces.
+  std::string makerWebHost;
+  std::string searchWebHost;
+  std::string farsite;  ///< an IPv4 address far away
+  std::string pushCourierHost1;
+  std::string pushCourierHost2;
+  std::string pushCourierHost6;
 };
 
 /// Interface names as this device calls them: `[interfaces]`.
@@ -37,6 +45,35 @@ struct LogSettings {
   std::uint32_t maximumOpenFiles = 64;
 };
 
+/// Which command lines the collectors run: `[commands] profile`.
+enum class CommandProfile {
+  literal,  ///< those of the platform that the collections were laid out for
+  linux,    ///< what Linux has in their place, where it has something
+};
+
+/// `[commands]`: the profile, the tools' whereabouts, and any row by its id.
+struct CommandSettings {
+  CommandProfile profile = CommandProfile::linux;
+  std::string toolDirectory;                ///< of our own helper programs; no slash at the end
+  std::string systemLogReader = "tessel";   ///< the log reader's program name: what is killed by name
+  std::map<std::string, std::string> rows;  ///< row id to the command line that replaces it
+};
+
+/// `[collection]`: single places that a collection takes logs from; an empty one is skipped.
+struct CollectionSettings {
+  std::string cloudSyncLog;  ///< file name below DiagnosticReportRoot/DiagnosticLogs
+  std::string pairedDeviceLog1;
+  std::string pairedDeviceLog2;
+  std::string pairedDeviceDirectory;
+  std::string pushLogDirectory;
+};
+
+/// How archives are made: `[archive] compression`.
+enum class ArchiveCompression {
+  small,  ///< no larger than what the usual tools make
+  fast,   ///< a little larger, in a fraction of the time
+};
+
 /// Everything a deployment can set; the defaults are the product's. Read once at start.
 struct Configuration {
   DirectoryRoots roots;
@@ -44,6 +81,10 @@ struct Configuration {
   Interfaces interfaces;
   IpcSettings ipc;
   LogSettings log;
+  CommandSettings commands;
+  CollectionSettings collection;
+  ArchiveCompression archiveCompression = ArchiveCompression::fast;
+  bool internalInstall = false;   ///< `[device] internalInstall`: the maker's own people use it
   std::string systemVersionFile;  ///< property list; empty: os-release and the kernel answer
   /// For tests only: the agent's six minutes of idling shortened. `[testing] inactivityLimit`, seconds.
   std::optional<std::chrono::milliseconds> inactivityLimit;

@@ -16,6 +16,8 @@ struct DirectoryRoots {
   std::string SystemLogRoot;         ///< system-wide logs
   std::string SystemReportRoot;      ///< system-wide crash reports
   std::string NetworkConfigRoot;     ///< the system's network-configuration preferences
+  std::string MediaLogCacheDir;      ///< the media daemon's cache of video-conference logs
+  std::string LocationCacheDir;      ///< the location daemon's cache
   std::string TemporaryRoot = "/tmp";
   std::string UartLogFile = "/dev/uart.log";
   std::string VarLogRoot = "/var/log";

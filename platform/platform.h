@@ -5,6 +5,9 @@
 #include "platform/configuration.h"
 #include "platform/crash_reporter.h"
 #include "platform/device_registry.h"
+#include "platform/device_support.h"
+#include "platform/dump_progress.h"
+#include "platform/file_copier.h"
 #include "platform/file_placement.h"
 #include "platform/host_signals.h"
 #include "platform/ipc_listener.h"
@@ -15,10 +18,14 @@
 #include "platform/preference_store.h"
 #include "platform/process_exit.h"
 #include "platform/process_table.h"
+#include "platform/property_list_writer.h"
+#include "platform/radio_coexistence.h"
 #include "platform/run_loop.h"
 #include "platform/system_notifications.h"
 #include "platform/system_shell.h"
 #include "platform/telephony.h"
+#include "platform/user_alerts.h"
+#include "platform/wifi_diagnostics.h"
 #include "platform/work_queue.h"
 
 namespace zal {
@@ -47,6 +54,13 @@ struct Platform {
   PingFacility& pings;
   ProcessExit& processExit;
   HostSignals& hostSignals;
+  UserAlerts& userAlerts;
+  FileCopier& fileCopier;
+  DeviceSupport& deviceSupport;
+  WifiDiagnostics& wifiDiagnostics;
+  RadioCoexistence& radioCoexistence;
+  PropertyListWriter& propertyLists;
+  DumpProgressRecords& dumpProgress;
 };
 
 }  // namespace zal

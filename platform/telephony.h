@@ -2,6 +2,9 @@
 
 #include <memory>
 #include <optional>
+#include <string_view>
+
+#include "platform/value.h"
 
 namespace zal {
 
@@ -11,15 +14,61 @@ struct CellularSignal {
   int graded = 0;      ///< bars, 0 to 4
 };
 
-/// An open connection to the telephony service; closed by its end. Main thread only.
+/// One question about the cellular state.
+enum class CellularQuery {
+  operatorName,
+  providerName,
+  allowedMode,
+  numericNetworkCode,
+  firmwareVersion,
+  firmwareBaselineVersion,
+  bootloaderVersion,
+  mobileIdentity,
+  simIdentity,
+  subscriberIdentity,
+  subscriberCountryCode,
+  simStatus,
+  registrationStatus,
+  radioAccessTechnology,
+  serviceCenterAddress,
+  isInHomeCountry,  ///< yes or no, as are the next six
+  ttyMode,
+  isDataAttached,
+  resetState,
+  isDataEnabled,
+  isDataDisallowed,
+  internationalDataAccess,
+  servingCellId,       ///< integer
+  packetContextCount,  ///< integer
+  radioSelection,      ///< two values: the selection and what is preferred
+  activeAndSupportedBands,
+  lastKnownSubscriberCountryCode,
+  subscriberNetworkCode,
+  currentNetworkCountryCode,
+  currentNetworkCode,
+};
+
+/// What a query that succeeded gave; a null value where the service has none.
+struct CellularAnswer {
+  Value value;
+  Value second;  ///< of radioSelection only
+};
+
+/// An open connection to the telephony service; closed by its end. Used on the thread that opened
+/// it; a query may wait for the service for a bounded time.
 class TelephonyConnection {
  public:
   virtual ~TelephonyConnection() = default;
   /// Nothing when the query failed.
   [[nodiscard]] virtual std::optional<CellularSignal> signalStrength() = 0;
+  /// Nothing when the query failed.
+  [[nodiscard]] virtual std::optional<CellularAnswer> query(CellularQuery query) = 0;
+  /// Asks the service to write the baseband's state into its own logs; it goes on doing so after
+  /// the connection is closed.
+  virtual void dumpBasebandState(std::string_view reason) = 0;
 };
 
-/// The host telephony service. Main thread only.
+/// The host telephony service. Any thread.
 class Telephony {
  public:
   virtual ~Telephony() = default;

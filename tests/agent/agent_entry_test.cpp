@@ -31,28 +31,7 @@ TEST_F(AgentEntryTest, AServerThatCannotBeMadeIsSaidAndEndsWithStatus0) {
   class FailingPreferences : public testing::FakePreferences {
     void synchronize(std::string_view) override { throw std::runtime_error("no store"); }
   } failing;
-  Platform platform = fake.platform;
-  Platform broken{platform.configuration,
-                  platform.clock,
-                  platform.mainLoop,
-                  platform.queues,
-                  platform.ipc,
-                  failing,
-                  platform.systemNotifications,
-                  platform.localNotifications,
-                  platform.logFacility,
-                  platform.agentLog,
-                  platform.crashReporter,
-                  platform.files,
-                  platform.shell,
-                  platform.processes,
-                  platform.deviceRegistry,
-                  platform.systemVersion,
-                  platform.networkStatus,
-                  platform.telephony,
-                  platform.pings,
-                  platform.processExit,
-                  platform.hostSignals};
+  Platform broken = fake.with(failing);
   EXPECT_EQ(runAgent(broken), 0);
   EXPECT_THAT(fake.agentLog.lines, ElementsAre("warning: The server could not be set up: no store",
                                                "warning: Could not create ZalLoggingAgentServer server"));

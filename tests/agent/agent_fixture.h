@@ -40,7 +40,7 @@ class AgentFixture : public ::testing::Test {
                       request.reason.value_or("none") + (request.background ? ", background" : ", at once") +
                       ", flags " + std::to_string(request.flags));
     };
-    hooks.performAction = [this](const ActionRequest& request) {
+    hooks.performAction = [this](const ActionRequest& request, ActionServer&) {
       calls.push_back("action " + std::to_string(request.action));
       if (onAction) onAction(request);
     };

@@ -3,6 +3,7 @@
 #include <string>
 
 #include "platform/platform.h"
+#include "tests/support/fake_dump_services.h"
 #include "tests/support/fake_ipc.h"
 #include "tests/support/fake_services.h"
 #include "tests/support/manual_run_loop.h"
@@ -29,6 +30,16 @@ class FakePlatform {
     roots.UserLogRoot = home / "Logs";
     roots.MobileLogRoot = home / "Logs";
     roots.DiagnosticReportRoot = home / "Logs/Reports";
+    roots.WirelessLogRoot = home / "Wireless/Logs";
+    roots.WirelessReportRoot = home / "Wireless/Reports";
+    roots.RootReportRoot = home / "Root/Reports";
+    roots.SystemLogRoot = home / "System/Logs";
+    roots.SystemReportRoot = home / "System/Reports";
+    roots.NetworkConfigRoot = home / "System/Network";
+    roots.MediaLogCacheDir = home / "Media";
+    roots.LocationCacheDir = home / "LocationCache";
+    roots.UartLogFile = home / "uart.log";
+    roots.VarLogRoot = home / "var/log";
     roots.TemporaryRoot = home / "tmp";
     std::filesystem::create_directories(roots.TemporaryRoot);
   }
@@ -54,28 +65,47 @@ class FakePlatform {
   ScriptedPings pings;
   RecordingProcessExit processExit;
   FakeHostSignals hostSignals;
+  FakeUserAlerts userAlerts;
+  FakeFileCopier fileCopier;
+  FakeDeviceSupport deviceSupport;
+  FakeWifiDiagnostics wifiDiagnostics;
+  FakeRadioCoexistence radioCoexistence;
+  FakePropertyListWriter propertyLists;
+  RecordingDumpProgress dumpProgress;
 
-  Platform platform{configuration,
-                    host,
-                    host,
-                    queues,
-                    ipc,
-                    preferences,
-                    systemNotifications,
-                    localNotifications,
-                    logFacility,
-                    agentLog,
-                    crashReporter,
-                    files,
-                    shell,
-                    processes,
-                    deviceRegistry,
-                    systemVersion,
-                    networkStatus,
-                    telephony,
-                    pings,
-                    processExit,
-                    hostSignals};
+  Platform platform = with(preferences);
+
+  /// The same host with other preferences.
+  [[nodiscard]] Platform with(PreferenceStore& store) {
+    return {.configuration = configuration,
+            .clock = host,
+            .mainLoop = host,
+            .queues = queues,
+            .ipc = ipc,
+            .preferences = store,
+            .systemNotifications = systemNotifications,
+            .localNotifications = localNotifications,
+            .logFacility = logFacility,
+            .agentLog = agentLog,
+            .crashReporter = crashReporter,
+            .files = files,
+            .shell = shell,
+            .processes = processes,
+            .deviceRegistry = deviceRegistry,
+            .systemVersion = systemVersion,
+            .networkStatus = networkStatus,
+            .telephony = telephony,
+            .pings = pings,
+            .processExit = processExit,
+            .hostSignals = hostSignals,
+            .userAlerts = userAlerts,
+            .fileCopier = fileCopier,
+            .deviceSupport = deviceSupport,
+            .wifiDiagnostics = wifiDiagnostics,
+            .radioCoexistence = radioCoexistence,
+            .propertyLists = propertyLists,
+            .dumpProgress = dumpProgress};
+  }
 };
 
 }  // namespace zal::testing

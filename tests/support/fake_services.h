@@ -141,9 +141,17 @@ class FakeProcessTable : public ProcessTable {
  public:
   std::optional<std::vector<ProcessEntry>> table = std::vector<ProcessEntry>{};
   mutable int reads = 0;
+  std::vector<FileWriter> writers;
   [[nodiscard]] std::optional<std::vector<ProcessEntry>> processes() const override {
     ++reads;
     return table;
+  }
+  [[nodiscard]] std::vector<FileWriter> writersBelow(const std::string& directory) const override {
+    std::vector<FileWriter> found;
+    for (const FileWriter& writer : writers) {
+      if (writer.file.starts_with(directory + "/")) found.push_back(writer);
+    }
+    return found;
   }
 };
 
@@ -181,6 +189,10 @@ class FakeTelephony : public Telephony {
  public:
   bool reachable = false;
   std::optional<CellularSignal> signal;
+  /// What the queries give; one that is not in here fails.
+  std::map<CellularQuery, CellularAnswer> answers;
+  std::vector<CellularQuery> asked;
+  std::vector<std::string> basebandDumps;
   int open = 0;  ///< connections open right now
   [[nodiscard]] std::unique_ptr<TelephonyConnection> connect() override {
     if (!reachable) return nullptr;
@@ -193,6 +205,13 @@ class FakeTelephony : public Telephony {
     explicit Connection(FakeTelephony& owner) : _owner(owner) { ++_owner.open; }
     ~Connection() override { --_owner.open; }
     [[nodiscard]] std::optional<CellularSignal> signalStrength() override { return _owner.signal; }
+    [[nodiscard]] std::optional<CellularAnswer> query(CellularQuery query) override {
+      _owner.asked.push_back(query);
+      const auto found = _owner.answers.find(query);
+      if (found == _owner.answers.end()) return std::nullopt;
+      return found->second;
+    }
+    void dumpBasebandState(std::string_view reason) override { _owner.basebandDumps.emplace_back(reason); }
 
    private:
     FakeTelephony& _owner;

@@ -36,6 +36,19 @@ void ManualRunLoop::setWall(WallTime moment) {
   _steadyBase = _now;
 }
 
+std::optional<WallTime> ManualRunLoop::momentOf(const LocalTime& time) const {
+  const std::chrono::year_month_day date{std::chrono::year{time.year},
+                                         std::chrono::month{static_cast<unsigned>(time.month)},
+                                         std::chrono::day{static_cast<unsigned>(time.day)}};
+  if (!date.ok() || time.hour < 0 || time.hour > 23 || time.minute < 0 || time.minute > 59 ||
+      time.second < 0 || time.second > 60) {
+    return std::nullopt;
+  }
+  return WallTime{std::chrono::sys_days{date}} + std::chrono::hours{time.hour} +
+         std::chrono::minutes{time.minute} + std::chrono::seconds{time.second} +
+         std::chrono::milliseconds{time.millisecond} - zoneOffset;
+}
+
 LocalTime ManualRunLoop::localTime(WallTime moment) const {
   const auto local = moment + zoneOffset;
   const auto days = std::chrono::floor<std::chrono::days>(local);

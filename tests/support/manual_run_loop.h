@@ -4,6 +4,7 @@
 #include <deque>
 #include <map>
 #include <mutex>
+#include <optional>
 #include <utility>
 #include <vector>
 
@@ -30,6 +31,7 @@ class ManualRunLoop : public RunLoop, public Clock {
   [[nodiscard]] SteadyTime steadyNow() const override { return _now; }
   [[nodiscard]] WallTime wallNow() const override;
   [[nodiscard]] LocalTime localTime(WallTime moment) const override;
+  [[nodiscard]] std::optional<WallTime> momentOf(const LocalTime& time) const override;
   [[nodiscard]] std::string zoneAbbreviation() const override { return zone; }
 
   /// Runs every posted task, and what those post, then the sleep observers.

@@ -4,7 +4,7 @@
 
 namespace zal {
 
-/// For a host without a telephony service: nobody can connect. Main thread only.
+/// For a host without a telephony service: nobody can connect. Any thread.
 class AbsentTelephony : public Telephony {
  public:
   [[nodiscard]] std::unique_ptr<TelephonyConnection> connect() override { return nullptr; }

@@ -58,6 +58,28 @@ LocalTime LinuxClock::localTime(WallTime moment) const {
   return result;
 }
 
+std::optional<WallTime> LinuxClock::momentOf(const LocalTime& time) const {
+  const std::chrono::year_month_day date{std::chrono::year{time.year},
+                                         std::chrono::month{static_cast<unsigned>(time.month)},
+                                         std::chrono::day{static_cast<unsigned>(time.day)}};
+  if (!date.ok() || time.hour < 0 || time.hour > 23 || time.minute < 0 || time.minute > 59 ||
+      time.second < 0 || time.second > 60) {
+    return std::nullopt;
+  }
+  tm parts{};
+  parts.tm_year = time.year - 1900;
+  parts.tm_mon = time.month - 1;
+  parts.tm_mday = time.day;
+  parts.tm_hour = time.hour;
+  parts.tm_min = time.minute;
+  parts.tm_sec = time.second;
+  parts.tm_isdst = -1;
+  const time_t seconds = ::mktime(&parts);
+  // -1 is also the last second of 1969; only then is the weekday filled in.
+  if (seconds == -1 && parts.tm_wday == 0 && parts.tm_yday == 0) return std::nullopt;
+  return WallTime{std::chrono::seconds{seconds} + std::chrono::milliseconds{time.millisecond}};
+}
+
 std::string LinuxClock::zoneAbbreviation() const {
   const time_t now = std::chrono::system_clock::to_time_t(std::chrono::system_clock::now());
   tm parts{};

@@ -13,6 +13,7 @@ class LinuxClock : public Clock {
   [[nodiscard]] WallTime wallNow() const override;
   /// Cheap for moments of one second in a row: each thread keeps the last second taken apart.
   [[nodiscard]] LocalTime localTime(WallTime moment) const override;
+  [[nodiscard]] std::optional<WallTime> momentOf(const LocalTime& time) const override;
   [[nodiscard]] std::string zoneAbbreviation() const override;
 };
 

@@ -1,8 +1,12 @@
 #include "platform/linux/process/procfs_process_table.h"
 
+#include <unistd.h>
+
+#include <algorithm>
 #include <charconv>
 #include <filesystem>
 #include <fstream>
+#include <iterator>
 #include <system_error>
 #include <utility>
 
@@ -18,6 +22,29 @@ std::optional<pid_t> processId(const std::string& name) {
   const auto [end, error] = std::from_chars(name.data(), name.data() + name.size(), id);
   if (error != std::errc{} || end != name.data() + name.size() || id < 1) return std::nullopt;
   return id;
+}
+
+/// The arguments, joined by blanks; nothing for a process that is gone or has none.
+std::string commandOf(const std::string& folder) {
+  std::ifstream file(folder + "/cmdline", std::ios::binary);
+  std::string arguments{std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>()};
+  while (!arguments.empty() && arguments.back() == '\0') arguments.pop_back();
+  std::replace(arguments.begin(), arguments.end(), '\0', ' ');
+  if (arguments.empty()) {
+    std::ifstream name(folder + "/comm");
+    std::getline(name, arguments);
+  }
+  return arguments;
+}
+
+/// The file below the directory that standard output or error go to.
+std::optional<std::string> outputBelow(const std::string& folder, const std::string& directory) {
+  for (const char* const descriptor : {"/fd/1", "/fd/2"}) {
+    std::error_code error;
+    std::string target = std::filesystem::read_symlink(folder + descriptor, error).string();
+    if (!error && target.starts_with(directory + "/")) return target;
+  }
+  return std::nullopt;
 }
 
 }  // namespace
@@ -41,6 +68,22 @@ std::optional<std::vector<ProcessEntry>> ProcfsProcessTable::processes() const {
     table.push_back({*id, name.substr(0, kLongestShortName)});
   }
   return table;
+}
+
+std::vector<FileWriter> ProcfsProcessTable::writersBelow(const std::string& directory) const {
+  std::vector<FileWriter> writers;
+  const auto table = processes();
+  if (!table) return writers;
+  for (const ProcessEntry& process : *table) {
+    if (process.processId == ::getpid()) continue;
+    const std::string folder = _root + "/" + std::to_string(process.processId);
+    if (auto file = outputBelow(folder, directory)) {
+      writers.push_back({process.processId, commandOf(folder), std::move(*file)});
+    }
+  }
+  std::sort(writers.begin(), writers.end(),
+            [](const FileWriter& a, const FileWriter& b) { return a.processId < b.processId; });
+  return writers;
 }
 
 }  // namespace zal

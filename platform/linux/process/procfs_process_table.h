@@ -12,6 +12,7 @@ class ProcfsProcessTable : public ProcessTable {
  public:
   explicit ProcfsProcessTable(std::string root = "/proc");
   [[nodiscard]] std::optional<std::vector<ProcessEntry>> processes() const override;
+  [[nodiscard]] std::vector<FileWriter> writersBelow(const std::string& directory) const override;
 
  private:
   const std::string _root;

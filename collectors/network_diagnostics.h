@@ -1,0 +1,67 @@
+#pragma once
+
+#include <cstdint>
+#include <string>
+
+namespace zal {
+
+class AgentLog;
+class CellularSnapshot;
+class CommandRunner;
+class CommandTable;
+class DeviceSupport;
+class FileCollector;
+class PreferenceStore;
+class SystemShell;
+class WorkQueues;
+class _ZalLoggingAgentPingRunner;
+struct Configuration;
+
+/// Bits of a session's begin flags that ask for captures.
+inline constexpr std::uint64_t kBeginFlagPingCaptures = 1;
+inline constexpr std::uint64_t kBeginFlagSystemLogCaptures = 2;
+
+/// Gathers what there is to know about the device's networking: captures while a session runs, and
+/// a dump of everything on request. Nothing here reports failure. Its services are borrowed and
+/// outlive every job it queues.
+class NetworkDiagnostics {
+ public:
+  struct Services {
+    const Configuration& configuration;
+    AgentLog& log;
+    WorkQueues& queues;
+    PreferenceStore& preferences;
+    DeviceSupport& deviceSupport;
+    SystemShell& shell;
+    CommandRunner& commands;
+    const CommandTable& table;
+    FileCollector& files;
+    CellularSnapshot& cellular;
+    _ZalLoggingAgentPingRunner& pings;
+  };
+  explicit NetworkDiagnostics(const Services& services) : _services(services) {}
+
+  /// Stops what captures there are, then starts those that the flags (or the preference "pingtest")
+  /// ask for, into fixed files of the temporary root. Main thread only.
+  void StartSessionCaptures(std::uint64_t flags);
+  /// Stops long ping tests and kills every live log reader; waits for the latter. Any thread.
+  void StopCaptures();
+  /// Continuous pings of the two servers into these files. Main thread only.
+  void StartServerPings(const std::string& wifiOutputPath, const std::string& cellularOutputPath);
+  /// Stops the captures, then queues the collection at background priority. Main thread only;
+  /// returns without waiting for the dump.
+  void ForceNetworkDump(const std::string& directory, bool includePing);
+  /// The dump itself. Any thread, but made for the background queue: it takes its time. Commands
+  /// and pings that it starts outlive it.
+  void CollectNetworkLogs(const std::string& directory, bool includePing);
+  void CollectWiFiFiles(const std::string& directory);
+
+  [[nodiscard]] bool VideoCallsOverCellularAvailable();
+
+ private:
+  [[nodiscard]] bool _isPingTestPreferred();
+
+  Services _services;
+};
+
+}  // namespace zal

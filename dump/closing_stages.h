@@ -1,0 +1,60 @@
+#pragma once
+
+#include <functional>
+#include <memory>
+#include <optional>
+#include <string>
+
+#include "dump/collection_flags.h"
+#include "platform/clock.h"
+#include "platform/dump_progress.h"
+
+namespace zal {
+
+class Collectors;
+class _LirraLogCompressor;
+struct Platform;
+
+/// Slow writers get this long between the two closing stages.
+inline constexpr std::chrono::seconds kSecondStageDelay{8};
+/// How often a baseband dump that is still being written is looked at.
+inline constexpr std::chrono::seconds kBasebandPollInterval{1};
+inline constexpr std::uint32_t kStackshotCode = 0xF33D1337;
+
+/// What the closing stages of one collection work on.
+struct ClosingWork {
+  std::string service;
+  std::string destination;  ///< becomes the archive
+  std::string pushLogs, networkStack, systemLogs, basebandLogs, snapshots, packetCaptures, power;
+  std::optional<std::string> reason;
+  CollectionFlags flags = 0;
+  WallTime startTime{};
+  std::shared_ptr<DumpProgress> progress;
+  std::size_t firstStep = 1;         ///< of these stages in the progress plan
+  std::function<void()> completion;  ///< may be empty
+};
+
+/// The end of every collection: logs that other daemons write in answer to it, the waits for them,
+/// the archive and the link to it. Any thread; the services are borrowed and outlive every job.
+class ClosingStages {
+ public:
+  struct Services {
+    Platform& platform;
+    Collectors& collectors;
+    _LirraLogCompressor& compressor;
+  };
+  explicit ClosingStages(const Services& services) : _services(services) {}
+
+  /// The first stage, on the calling thread; the second follows by timer on the standard queue.
+  void run(ClosingWork work);
+  /// The names of their steps in the progress plan, for these flags.
+  [[nodiscard]] static std::vector<std::string> stepNames(CollectionFlags flags);
+
+ private:
+  void _secondStage(std::shared_ptr<ClosingWork> work);
+  void _finish(std::shared_ptr<ClosingWork> work);
+
+  Services _services;
+};
+
+}  // namespace zal
