@@ -46,6 +46,10 @@ class _LirraLogCompressor {
   [[nodiscard]] std::size_t runningJobs() const;
 
  private:
+  void _settle(FileCopierJob& job, const std::string& temporary, const std::string& archive,
+               std::function<void()> completion);
+  std::shared_ptr<FileCopierJob> _take(const FileCopierJob& job);
+
   Services _services;
   mutable std::mutex _lock;  ///< guards _archivers: they come from any thread and go on the main one
   std::list<std::shared_ptr<FileCopierJob>> _archivers;
