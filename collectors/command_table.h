@@ -3,6 +3,7 @@
 #include <span>
 #include <string>
 #include <string_view>
+#include <vector>
 
 namespace zal {
 
@@ -50,7 +51,11 @@ class CommandTable {
 
   /// All rows of a group, in order.
   [[nodiscard]] static std::span<const CommandRow> rows(CommandGroup group);
-  /// The row's command line in this configuration, placeholders filled in.
+  /// The rows of all groups, in the order of the groups, and last the one that ends the readers.
+  [[nodiscard]] static std::vector<CommandRow> allRows();
+  /// The row's command line in this configuration, placeholders filled in: the one of `[commands]`,
+  /// else the profile's. A substitute that needs our helper programs counts as none while their
+  /// directory is not configured; one that needs an endpoint that is not says so in its place.
   [[nodiscard]] std::string commandLine(const CommandRow& row) const;
   /// Starts every command of the group, in order, without waiting for any.
   void runInBackground(CommandRunner& runner, CommandGroup group, std::string_view directory) const;
