@@ -1,26 +1,13 @@
 #include "platform/agent_log.h"
-#include "platform/device_registry.h"
+#include "session/device_model.h"
 #include "session/reference_time.h"
 #include "session/session_lines.h"
-#include "session/text_encoding.h"
 #include "session/vistel_session.h"
 
 namespace zal {
 
-namespace {
-
-/// The raw property up to its NUL; nothing when that is no text.
-std::optional<std::string> modelText(const std::string& bytes) {
-  std::string text = bytes.substr(0, bytes.find('\0'));
-  if (!isValidUtf8(text)) return std::nullopt;
-  return text;
-}
-
-}  // namespace
-
 std::optional<std::string> ZalLoggingAgentVistelSession::model() {
-  if (_model) return _model;
-  if (const auto bytes = _services.deviceRegistry.modelBytes()) _model = modelText(*bytes);
+  if (!_model) _model = deviceModel(_services.deviceRegistry);
   return _model;
 }
 

@@ -68,6 +68,20 @@ std::size_t utf16Length(std::string_view text) {
   return units;
 }
 
+std::string_view utf16Prefix(std::string_view text, std::size_t units) {
+  std::size_t at = 0;
+  while (at < text.size()) {
+    const auto lead = static_cast<unsigned char>(text[at]);
+    const std::size_t cost = lead >= 0xF0 ? 2 : 1;
+    if (cost > units) break;
+    units -= cost;
+    do {
+      ++at;
+    } while (at < text.size() && isContinuation(static_cast<unsigned char>(text[at])));
+  }
+  return text.substr(0, at);
+}
+
 bool isValidUtf8(std::string_view text) {
   for (;;) {
     text.remove_prefix(asciiPrefix(text));

@@ -17,6 +17,18 @@ TEST(TextEncodingTest, CountsUtf16Units) {
   EXPECT_EQ(utf16Length(std::string(1000, 'a') + "é"), 1001U);
 }
 
+TEST(TextEncodingTest, CutsAfterUtf16UnitsAndNeverInsideACharacter) {
+  EXPECT_EQ(utf16Prefix("", 3), "");
+  EXPECT_EQ(utf16Prefix("abcd", 0), "");
+  EXPECT_EQ(utf16Prefix("abcd", 3), "abc");
+  EXPECT_EQ(utf16Prefix("abcd", 4), "abcd");
+  EXPECT_EQ(utf16Prefix("abcd", 9), "abcd");
+  EXPECT_EQ(utf16Prefix("é€x", 2), "é€");
+  EXPECT_EQ(utf16Prefix("a😀b", 1), "a");
+  EXPECT_EQ(utf16Prefix("a😀b", 2), "a");
+  EXPECT_EQ(utf16Prefix("a😀b", 3), "a😀");
+}
+
 TEST(TextEncodingTest, AcceptsWellFormedText) {
   for (const char* text :
        {"", "plain ascii, longer than one word", "é", "€", "😀", "\uD7FF\uE000\U0010FFFF"}) {
