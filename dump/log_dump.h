@@ -1,10 +1,12 @@
 #pragma once
 
+#include <functional>
 #include <optional>
 #include <string>
-#include <vector>
+#include <utility>
 
 #include "dump/dump_request.h"
+#include "dump/report_hook.h"
 
 namespace zal {
 
@@ -26,27 +28,24 @@ class LogDump {
     ServiceCollection& collection;
     _LirraLogCompressor& compressor;
   };
-  explicit LogDump(const Services& services) : _services(services) {}
+  using ReportHook = std::function<decltype(FileReportHook)>;
+  explicit LogDump(const Services& services, ReportHook fileReport = FileReportHook)
+      : _services(services), _fileReport(std::move(fileReport)) {}
 
   /// Returns once the collection was started. The server is borrowed beyond that: it outlives every
-  /// dump. A directory that would lie outside the report root is refused with one warning, and
-  /// then there is no archive and no path in a reply.
+  /// dump. A directory that would lie outside the report root is refused with one warning; then
+  /// nothing is gathered, and only the client hears of it: by a reply without a path.
   void run(const DumpRequest& request, const std::optional<std::string>& description, ActionServer& server);
 
  private:
-  Services _services;
-};
+  /// The dump is over; without an archive when it was refused.
+  void _complete(const DumpRequest& request, const std::optional<std::string>& reason,
+                 const std::optional<std::string>& archive, ActionServer& server);
+  void _alert(const DumpRequest& request, const std::string& archive, ActionServer& server);
+  [[nodiscard]] std::string _deviceInfo();
 
-/// Where a dump of this type, time and description goes, standardised; nothing when that would not
-/// lie below the report root.
-[[nodiscard]] std::optional<std::string> dumpDirectoryPath(const std::string& reportRoot,
-                                                           const std::string& home,
-                                                           const DumpRequest& request,
-                                                           const std::optional<std::string>& description);
-/// The log sets that belong to a session type, in the order they are taken.
-[[nodiscard]] std::vector<std::string> dumpLogSets(const std::string& sessionType);
-/// Where a bug-report system would be called. It does nothing and returns 0.
-int FileReportHook(const std::optional<std::string>& description, const std::string& component,
-                   const std::string& componentVersion, const std::vector<std::string>& archives);
+  Services _services;
+  ReportHook _fileReport;
+};
 
 }  // namespace zal

@@ -1,0 +1,34 @@
+#include "dump/shell_word.h"
+
+#include <algorithm>
+
+namespace zal {
+namespace {
+
+constexpr std::string_view kPlain = "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789@+._:-";
+
+std::string wordOf(std::string_view text, std::string_view alsoPlain) {
+  text = text.substr(0, text.find('\0'));
+  const auto isPlain = [alsoPlain](char c) {
+    return kPlain.find(c) != std::string_view::npos || alsoPlain.find(c) != std::string_view::npos;
+  };
+  if (!text.empty() && std::all_of(text.begin(), text.end(), isPlain)) return std::string(text);
+  std::string word = "'";
+  for (const char c : text) {
+    // Nothing can stand for a quote inside quotes: they are closed, one follows, they are opened.
+    if (c == '\'') {
+      word += "'\\''";
+    } else {
+      word += c;
+    }
+  }
+  return word + "'";
+}
+
+}  // namespace
+
+std::string shellWord(std::string_view text) { return wordOf(text, ""); }
+
+std::string shellPath(std::string_view path) { return wordOf(path, "/"); }
+
+}  // namespace zal
