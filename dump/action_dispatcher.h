@@ -4,12 +4,12 @@
 #include <string>
 
 #include "dump/action_request.h"
+#include "dump/automation.h"
 #include "platform/clock.h"
 
 namespace zal {
 
 class ActionServer;
-class Automation;
 class Collectors;
 class LogDump;
 class ServiceCollection;
@@ -32,12 +32,13 @@ class ActionDispatcher {
     _LirraLogCompressor& compressor;
     LogDump& logDump;
   };
-  explicit ActionDispatcher(const Services& services) : _services(services) {}
+  explicit ActionDispatcher(const Services& services) : _services(services), _automation(services.platform) {}
 
   /// Unknown numbers do nothing. Noting activity around it is the server's affair.
   void performAction(const ActionRequest& request, ActionServer& server);
 
  private:
+  [[nodiscard]] std::string _reportRoot() const;
   /// Makes the dated directory below the reports of video calls; its path.
   std::string _makeSessionDirectory();
   void _dumpBaseband(const ActionRequest& request);
@@ -48,6 +49,7 @@ class ActionDispatcher {
   void _dumpLogsForUser(const ActionRequest& request, ActionServer& server);
 
   Services _services;
+  Automation _automation;
   std::optional<WallTime> _lastNetworkDump;
 };
 

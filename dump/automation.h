@@ -1,24 +1,27 @@
 #pragma once
 
+#include <cstdint>
 #include <string>
+#include <string_view>
 
 #include "platform/value.h"
 #include "session/optional_text.h"
 
 namespace zal {
 
+/// What the messaging test tool is told at least, whatever a client asks for.
+inline constexpr std::int32_t kFewestRepetitions = 10;
+inline constexpr std::int32_t kShortestInterval = 5;
+
 class ActionServer;
-class AgentLog;
-class SystemShell;
-class UserAlerts;
-struct Configuration;
+struct Platform;
 
 /// Starts and stops test automation: one command line each, one alert each. Stops are
-/// unconditional; a start while one runs starts a second. Main thread only.
+/// unconditional; a start while one runs starts a second. What a client gives as text stays text in the
+/// command lines. Main thread only; the platform is borrowed.
 class Automation {
  public:
-  Automation(const Configuration& configuration, AgentLog& log, SystemShell& shell, UserAlerts& alerts)
-      : _configuration(configuration), _log(log), _shell(shell), _alerts(alerts) {}
+  explicit Automation(Platform& platform) : _platform(platform) {}
 
   void startVideoCalls(OptionalText sender, ActionServer& server);
   void stopVideoCalls(OptionalText sender, ActionServer& server);
@@ -27,12 +30,10 @@ class Automation {
   void stopMessaging(OptionalText sender, ActionServer& server);
 
  private:
+  void _log(std::string_view what, std::string_view text);
   void _alert(const std::string& title, const std::string& message);
 
-  const Configuration& _configuration;
-  AgentLog& _log;
-  SystemShell& _shell;
-  UserAlerts& _alerts;
+  Platform& _platform;
 };
 
 }  // namespace zal
