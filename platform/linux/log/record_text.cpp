@@ -75,6 +75,16 @@ void appendMarkedText(std::string& target, std::string_view text, std::string_vi
   }
 }
 
+void appendOneLine(std::string& target, std::string_view text) {
+  for (;;) {
+    const std::size_t lineEnd = text.find('\n');
+    appendMarkedText(target, text.substr(0, lineEnd));
+    if (lineEnd == std::string_view::npos) return;
+    appendEscaped(target, '\n');
+    text.remove_prefix(lineEnd + 1);
+  }
+}
+
 void appendRecord(std::string& target, const LogRecord& record, std::string_view timeText,
                   std::string_view processText) {
   target.append(timeText).append(" <");

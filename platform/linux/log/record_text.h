@@ -18,6 +18,9 @@ inline constexpr std::string_view kContinuationMark = "    | ";
 /// "\x1b". Does not end the last line. `linePrefix` goes before each mark.
 void appendMarkedText(std::string& target, std::string_view text, std::string_view linePrefix = {});
 
+/// Appends the text as part of one line: line breaks are escaped like all other control characters.
+void appendOneLine(std::string& target, std::string_view text);
+
 /// Appends one record with its line end. `timeText` is the local time as it shall stand there,
 /// `processText` what a record with process information has before its line.
 void appendRecord(std::string& target, const LogRecord& record, std::string_view timeText,

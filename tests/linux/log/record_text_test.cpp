@@ -75,6 +75,12 @@ TEST(RecordTextTest, APrefixGoesBeforeEachMark) {
   EXPECT_EQ(marked("a\nb\n", "<4>"), "a\n<4>    | b\n<4>    | ");
 }
 
+TEST(RecordTextTest, AsPartOfALineEvenLineBreaksAreEscaped) {
+  std::string line;
+  appendOneLine(line, "a\nb\n\x1b\tc");
+  EXPECT_EQ(line, "a\\x0ab\\x0a\\x1b\tc");
+}
+
 TEST(RecordTextTest, RecordsAreFoundByTheirStart) {
   const std::string text = "1 a\n    | more\n2 b\n";
   EXPECT_EQ(nextRecordStart(text, 0), 15U);
