@@ -1,0 +1,22 @@
+#include "collectors/file_collector.h"
+#include "collectors/log_collectors.h"
+#include "platform/configuration.h"
+#include "platform/open_directories.h"
+
+namespace zal {
+
+void LogCollectors::LinkThermalLog(const std::string& destination) {
+  _services.files.LinkFileIntoDirectory(
+      _services.configuration.roots.TemporaryRoot + "/vistel_thermal_log.txt", destination, "");
+}
+
+void LogCollectors::CopyDiagnosticAndSyncLogs(const std::string& destination) {
+  const DirectoryRoots& roots = _services.configuration.roots;
+  for (const std::string& source :
+       {roots.MobileLogRoot + "/Cirrel", roots.DiagnosticReportRoot + "/DiagnosticLogs"}) {
+    createDirectoriesWithMode0777(destination);
+    _services.files.CopyDirectoryContents(source, destination);
+  }
+}
+
+}  // namespace zal
