@@ -6,6 +6,7 @@
 #include <system_error>
 
 #include "collectors/file_collector.h"
+#include "collectors/plain_name.h"
 #include "platform/agent_log.h"
 #include "platform/directory_roots.h"
 #include "platform/open_directories.h"
@@ -21,11 +22,6 @@ constexpr std::string_view kOlder[] = {
     "-Event.log.1.zip", "-Event.log.2.zip", "-Event.log.3.zip", "-Event.log.4.zip", "-Event.log.5.zip",
     "-Event.log.6.zip", "-Event.log.7.zip", "-Event.log.8.zip", "-Event.log.9.zip", ".log.4.zip",
     ".log.5.zip",       ".log.6.zip",       ".log.7.zip",       ".log.8.zip",       ".log.9.zip"};
-
-bool isPlainName(const std::string& name) {
-  return name != "." && name != ".." && name.find('/') == std::string::npos &&
-         name.find('\0') == std::string::npos;
-}
 
 void linkFiles(FileCollector& collector, const DirectoryRoots& roots, const std::string& name,
                const std::string& destination, std::span<const std::string_view> endings) {

@@ -29,9 +29,9 @@ struct ClosingWork {
   std::optional<std::string> reason;
   CollectionFlags flags = 0;
   WallTime startTime{};
-  std::shared_ptr<DumpProgress> progress;
-  std::size_t firstStep = 1;         ///< of these stages in the progress plan
-  std::function<void()> completion;  ///< may be empty
+  std::shared_ptr<DumpProgress> progress;  ///< never empty
+  std::size_t firstStep = 1;               ///< of these stages in the progress plan
+  std::function<void()> completion;        ///< may be empty
 };
 
 /// The end of every collection: logs that other daemons write in answer to it, the waits for them,
@@ -45,15 +45,13 @@ class ClosingStages {
   };
   explicit ClosingStages(const Services& services) : _services(services) {}
 
-  /// The first stage, on the calling thread; the second follows by timer on the standard queue.
+  /// The first stage, on the calling thread; the second follows by timer on the standard queue. The
+  /// completion runs once, on the main thread, archive or not; never while a baseband dump goes on.
   void run(ClosingWork work);
   /// The names of their steps in the progress plan, for these flags.
   [[nodiscard]] static std::vector<std::string> stepNames(CollectionFlags flags);
 
  private:
-  void _secondStage(std::shared_ptr<ClosingWork> work);
-  void _finish(std::shared_ptr<ClosingWork> work);
-
   Services _services;
 };
 

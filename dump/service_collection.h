@@ -1,20 +1,17 @@
 #pragma once
 
-#include <atomic>
 #include <functional>
 #include <string>
+#include <vector>
 
 #include "dump/closing_stages.h"
+#include "dump/wifi_dump.h"
 #include "session/session_services.h"
 
 namespace zal {
 
 class Collectors;
-class _LirraLogCompressor;
 struct Platform;
-
-/// The Wi-Fi diagnostics dump gets this long, and its caller waits for it.
-inline constexpr std::chrono::seconds kWifiDiagnosticsLimit{15};
 
 /// Gathers into one directory the logs that belong to one service, step by step as the flags say,
 /// and hands over to the closing stages. Main thread only; the services are borrowed.
@@ -24,17 +21,25 @@ class ServiceCollection {
     Platform& platform;
     Collectors& collectors;
     ClosingStages& closing;
+    SignalWait wait = waitInSteadyTime;
   };
   explicit ServiceCollection(const Services& services) : _services(services) {}
 
   /// Returns when the closing stages are queued, or their first one is done when the request is not
   /// for the background. The completion runs once, on the main thread, when the archive is made.
+  /// Whether the destination may be written to is the caller's affair.
   void CollectServiceLogs(const CollectionRequest& request, std::function<void()> completion = {});
 
+  /// The names of all steps of such a request in the progress plan, the closing ones included.
+  [[nodiscard]] static std::vector<std::string> stepNames(const CollectionRequest& request);
+
  private:
+  void _dumpCoexistence();
+
   Services _services;
+  // The manager is looked up at the first need and then remembered, present or not.
   bool _lookedUpCoexistence = false;
-  std::function<void()> _dumpCoexistence;
+  std::function<void()> _coexistenceEntryPoint;
 };
 
 }  // namespace zal

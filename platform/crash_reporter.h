@@ -16,8 +16,8 @@ class CrashReporter {
   virtual bool simulateCrash(pid_t process, std::uint32_t exceptionCode, std::string_view message) = 0;
   /// A report of an exception that this process survived.
   virtual bool simulateCrashForException(std::string_view description) = 0;
-  /// The stacks of every thread of the machine, with the reason in the report.
-  virtual bool stackshot(std::string_view reason) = 0;
+  /// The stacks of every thread of the machine, with the reason and the code in the report.
+  virtual bool stackshot(std::string_view reason, std::uint32_t code) = 0;
 };
 
 }  // namespace zal

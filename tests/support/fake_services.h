@@ -112,6 +112,7 @@ class RecordingCrashReporter : public CrashReporter {
   bool available = true;
   std::vector<Crash> crashes;
   std::vector<std::string> exceptions, stackshots;
+  std::vector<std::uint32_t> stackshotCodes;
   bool simulateCrash(pid_t process, std::uint32_t code, std::string_view message) override {
     crashes.push_back({process, code, std::string(message)});
     return available;
@@ -120,8 +121,9 @@ class RecordingCrashReporter : public CrashReporter {
     exceptions.emplace_back(description);
     return available;
   }
-  bool stackshot(std::string_view reason) override {
+  bool stackshot(std::string_view reason, std::uint32_t code) override {
     stackshots.emplace_back(reason);
+    stackshotCodes.push_back(code);
     return available;
   }
 };

@@ -13,7 +13,7 @@ bool AbsentCrashReporter::simulateCrashForException(std::string_view /*descripti
   return _refuse(_saidException, "crash reports of exceptions");
 }
 
-bool AbsentCrashReporter::stackshot(std::string_view /*reason*/) {
+bool AbsentCrashReporter::stackshot(std::string_view /*reason*/, std::uint32_t /*code*/) {
   return _refuse(_saidStackshot, "stackshots");
 }
 

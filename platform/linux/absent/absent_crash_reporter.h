@@ -14,7 +14,7 @@ class AbsentCrashReporter : public CrashReporter {
   explicit AbsentCrashReporter(AgentLog& log) : _log(log) {}
   bool simulateCrash(pid_t process, std::uint32_t exceptionCode, std::string_view message) override;
   bool simulateCrashForException(std::string_view description) override;
-  bool stackshot(std::string_view reason) override;
+  bool stackshot(std::string_view reason, std::uint32_t code) override;
 
  private:
   bool _refuse(std::atomic_flag& said, std::string_view what);

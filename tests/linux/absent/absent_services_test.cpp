@@ -28,7 +28,7 @@ TEST(AbsentCrashReporterTest, RefusesEverythingAndSaysSoOnceForEachKind) {
   for (int round = 0; round < 3; ++round) {
     EXPECT_FALSE(reporter.simulateCrash(1, 0xFED9E2FFU, "message"));
     EXPECT_FALSE(reporter.simulateCrashForException("description"));
-    EXPECT_FALSE(reporter.stackshot("reason"));
+    EXPECT_FALSE(reporter.stackshot("reason", 1));
   }
   EXPECT_EQ(log.lines, (std::vector<std::string>{
                            "notice: This host has no crash service: crash reports of processes are not made",

@@ -1,0 +1,23 @@
+#include "dump/archive_gaps.h"
+
+#include <filesystem>
+
+#include "platform/agent_log.h"
+#include "platform/dump_progress.h"
+#include "platform/process_table.h"
+#include "platform/standard_path.h"
+
+namespace zal {
+
+void tellRunningCommands(const std::string& directory, const ProcessTable& processes, AgentLog& log,
+                         DumpProgress& progress) {
+  const std::string below = resolveAndStandardize(directory, "");
+  for (const FileWriter& writer : processes.writersBelow(below)) {
+    const std::string file = std::filesystem::path(writer.file).lexically_relative(below).string();
+    log.notice("Still running when archived: " + writer.command + " (process " +
+               std::to_string(writer.processId) + "), writing " + writer.file);
+    progress.missing(file, "still running when archived: " + writer.command);
+  }
+}
+
+}  // namespace zal

@@ -1,0 +1,16 @@
+#pragma once
+
+#include <string>
+
+namespace zal {
+
+class AgentLog;
+class DumpProgress;
+class ProcessTable;
+
+/// Says in the log and in the record which commands still write below the directory, one line each:
+/// what they write from now on will not be archived. Any thread.
+void tellRunningCommands(const std::string& directory, const ProcessTable& processes, AgentLog& log,
+                         DumpProgress& progress);
+
+}  // namespace zal

@@ -1,0 +1,196 @@
+#include "dump/closing_stages.h"
+
+#include <filesystem>
+#include <string_view>
+#include <system_error>
+#include <utility>
+
+#include "collectors/collectors.h"
+#include "dump/archive_gaps.h"
+#include "dump/latest_link.h"
+#include "dump/log_compressor.h"
+#include "platform/platform.h"
+#include "platform/standard_path.h"
+
+namespace zal {
+namespace {
+
+using Services = ClosingStages::Services;
+
+/// One step: it runs when one of its flags is set, or always when it has none.
+struct Step {
+  CollectionFlags anyOf;
+  std::string_view name;
+  void (*run)(const Services& services, const ClosingWork& work);
+
+  [[nodiscard]] bool isWanted(CollectionFlags flags) const { return anyOf == 0 || (flags & anyOf) != 0; }
+};
+
+void collectPushLogs(const Services& services, const ClosingWork& work) {
+  services.collectors.logs.DumpPushServiceState(work.pushLogs);
+  services.collectors.logs.CollectPushCaptureFiles(work.packetCaptures);
+}
+
+void collectNetworkStackLogs(const Services& services, const ClosingWork& work) {
+  services.collectors.logs.CollectNetworkStackLogs(work.networkStack);
+}
+
+void linkThermalLog(const Services& services, const ClosingWork& work) {
+  const std::string& root = services.platform.configuration.roots.TemporaryRoot;
+  services.collectors.files.LinkFileIntoDirectory(root + "/vistel_thermal_log.txt", work.power, "");
+}
+
+void takeStackshot(const Services& services, const ClosingWork& work) {
+  if (!services.platform.crashReporter.stackshot("ZalLogging Log Dump", kStackshotCode)) {
+    work.progress->missing("Stackshot", "the host's crash service made none");
+  }
+}
+
+void takeBasebandSnapshot(const Services& services, const ClosingWork& work) {
+  services.collectors.cellular.DumpBasebandState(work.reason, work.service);
+}
+
+void collectSystemLogs(const Services& services, const ClosingWork& work) {
+  services.collectors.logs.CollectSystemLogs(work.systemLogs, work.startTime);
+}
+
+void collectCrashLogs(const Services& services, const ClosingWork& work) {
+  services.collectors.logs.CollectCrashLogs(work.systemLogs);
+}
+
+void stopCaptures(const Services& services, const ClosingWork& /*work*/) {
+  services.collectors.network.StopCaptures();
+}
+
+void collectBasebandLogs(const Services& services, const ClosingWork& work) {
+  services.collectors.logs.CollectBasebandLogs(work.basebandLogs, work.startTime);
+}
+
+void collectSnapshotLogs(const Services& services, const ClosingWork& work) {
+  services.collectors.logs.CollectSnapshotLogs(work.snapshots, work.startTime);
+}
+
+void linkFullPacketCapture(const Services& services, const ClosingWork& work) {
+  services.collectors.logs.LinkFullPacketCapture(work.packetCaptures);
+}
+
+void tellGaps(const Services& services, const ClosingWork& work) {
+  tellRunningCommands(work.destination, services.platform.processes, services.platform.agentLog,
+                      *work.progress);
+}
+
+constexpr CollectionFlags kAlways = 0;
+constexpr CollectionFlags kAnyNetwork = kCollectPushLogs | kCollectNetwork;
+
+constexpr Step kFirstStage[] = {
+    {kCollectPushLogs, "Push logs", collectPushLogs},
+    {kAnyNetwork, "Network stack logs", collectNetworkStackLogs},
+    {kAlways, "Thermal log", linkThermalLog},
+    {kCollectStackshot, "Stackshot", takeStackshot},
+    {kCollectBaseband, "Baseband snapshot", takeBasebandSnapshot},
+    {kCollectSystemLogs, "System logs", collectSystemLogs},
+    {kAlways, "Crash logs", collectCrashLogs},
+    // The step goes on until the second stage begins.
+    {kAlways, "Waiting for slow writers", stopCaptures},
+};
+
+constexpr Step kSecondStage[] = {
+    {kCollectBaseband, "Baseband logs", collectBasebandLogs},
+    {kAlways, "Snapshots", collectSnapshotLogs},
+    {kAnyNetwork, "Packet captures", linkFullPacketCapture},
+    // The step goes on until the archive is made.
+    {kAlways, "Archive", tellGaps},
+};
+
+/// One collection's way through the stages. Each job that waits for the next one holds it.
+class ClosingRun : public std::enable_shared_from_this<ClosingRun> {
+ public:
+  ClosingRun(const Services& services, ClosingWork work)
+      : _services(services), _work(std::move(work)), _nextStep(_work.firstStep) {}
+
+  void firstStage() {
+    _runSteps(kFirstStage);
+    _standardQueue().asyncAfter(kSecondStageDelay, [self = shared_from_this()] { self->_secondStage(); });
+  }
+
+ private:
+  WorkQueue& _standardQueue() { return _services.platform.queues.global(QueuePriority::standard); }
+
+  template <std::size_t count>
+  void _runSteps(const Step (&steps)[count]) {
+    for (const Step& step : steps) {
+      if (!step.isWanted(_work.flags)) continue;
+      _work.progress->step(_nextStep++);
+      step.run(_services, _work);
+    }
+  }
+
+  // A modem may take minutes, and a hundred dumps may wait for it: each wait is a timer.
+  void _secondStage() {
+    if ((_work.flags & kCollectBaseband) != 0 && !_isBasebandComplete()) {
+      _standardQueue().asyncAfter(kBasebandPollInterval,
+                                  [self = shared_from_this()] { self->_secondStage(); });
+      return;
+    }
+    _runSteps(kSecondStage);
+    _archive();
+  }
+
+  bool _isBasebandComplete() {
+    const std::string marker = _services.platform.configuration.roots.TemporaryRoot + "/Telvane.dumping";
+    std::error_code error;
+    if (std::filesystem::exists(marker, error)) {
+      _services.platform.agentLog.notice("Baseband not complete dumping, file " + marker + " still exists");
+      return false;
+    }
+    _services.platform.agentLog.notice("Baseband complete dumping, file " + marker + " doesn't exist");
+    return true;
+  }
+
+  void _archive() {
+    AgentLog& log = _services.platform.agentLog;
+    log.notice("Starting compression for item at path: " + _work.destination);
+    CompressDirectory(_services.compressor, log, _work.destination, std::nullopt,
+                      [self = shared_from_this()](const std::optional<std::string>& archive) {
+                        self->_finish(archive.value());
+                      });
+  }
+
+  void _finish(const std::string& archive) {
+    Platform& platform = _services.platform;
+    linkLatestArchive(
+        resolveAndStandardize(platform.configuration.roots.UserLogRoot, platform.files.homeDirectory()),
+        _work.service, archive, platform.agentLog);
+    std::error_code error;
+    if (std::filesystem::exists(archive, error)) {
+      _work.progress->done(archive);
+    } else {
+      _work.progress->failed("no archive was made; the log says why");
+    }
+    if (_work.completion) _work.completion();
+  }
+
+  Services _services;
+  ClosingWork _work;
+  std::size_t _nextStep;
+};
+
+}  // namespace
+
+void ClosingStages::run(ClosingWork work) {
+  std::make_shared<ClosingRun>(_services, std::move(work))->firstStage();
+}
+
+std::vector<std::string> ClosingStages::stepNames(CollectionFlags flags) {
+  std::vector<std::string> names;
+  const auto add = [&](const auto& steps) {
+    for (const Step& step : steps) {
+      if (step.isWanted(flags)) names.emplace_back(step.name);
+    }
+  };
+  add(kFirstStage);
+  add(kSecondStage);
+  return names;
+}
+
+}  // namespace zal

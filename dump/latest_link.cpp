@@ -1,0 +1,25 @@
+#include "dump/latest_link.h"
+
+#include <filesystem>
+#include <system_error>
+
+#include "collectors/plain_name.h"
+#include "platform/agent_log.h"
+#include "session/collected_files.h"
+
+namespace zal {
+
+void linkLatestArchive(const std::string& logRoot, const std::string& service, const std::string& archive,
+                       AgentLog& log) {
+  if (!isPlainName(service)) {
+    log.warning("Refused the link to the latest archive of \"" + printable(service) +
+                "\": its name leads out of the log directory");
+    return;
+  }
+  const std::string link = logRoot + "/" + service + "/Latest-" + service;
+  std::error_code ignored;
+  std::filesystem::remove_all(link, ignored);
+  std::filesystem::create_symlink(archive, link, ignored);
+}
+
+}  // namespace zal

@@ -1,0 +1,46 @@
+#include "dump/wifi_dump.h"
+
+#include <memory>
+
+#include "platform/open_directories.h"
+#include "platform/platform.h"
+#include "platform/standard_path.h"
+
+namespace zal {
+namespace {
+
+constexpr std::string_view kWhat = "Wi-Fi diagnostics";
+
+/// Held by the completion too, which may come when nobody waits any more.
+struct Outcome {
+  std::binary_semaphore signal{0};
+  int result = 0;
+};
+
+}  // namespace
+
+bool waitInSteadyTime(std::binary_semaphore& signal, std::chrono::seconds limit) {
+  return signal.try_acquire_for(limit);
+}
+
+void takeWifiDump(Platform& platform, const std::string& service, const std::optional<std::string>& reason,
+                  const SignalWait& wait, DumpProgress& progress) {
+  const std::string directory = resolveAndStandardize(platform.configuration.roots.SystemReportRoot + "/WiFi",
+                                                      platform.files.homeDirectory());
+  createDirectoriesWithMode0777(directory);
+  const auto outcome = std::make_shared<Outcome>();
+  platform.wifiDiagnostics.takeDump(directory, reason.value_or("WiFi log dump for service: " + service),
+                                    [outcome, &log = platform.agentLog](int result) {
+                                      log.warning("Wifi dump log result: " + std::to_string(result));
+                                      outcome->result = result;
+                                      outcome->signal.release();
+                                    });
+  if (!wait(outcome->signal, kWifiDiagnosticsLimit)) {
+    platform.agentLog.warning("Timed out while waiting for wifi logs dump to complete");
+    progress.missing(kWhat, "not complete in time");
+  } else if (outcome->result != 0) {
+    progress.missing(kWhat, "the service answered " + std::to_string(outcome->result));
+  }
+}
+
+}  // namespace zal

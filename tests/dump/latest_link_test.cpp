@@ -1,0 +1,67 @@
+#include "dump/latest_link.h"
+
+#include <gtest/gtest.h>
+
+#include "tests/support/fake_services.h"
+#include "tests/support/temporary_directory.h"
+
+namespace zal {
+namespace {
+
+namespace fs = std::filesystem;
+
+class LatestLinkTest : public ::testing::Test {
+ protected:
+  void link(const std::string& service, const std::string& archive = "/dumps/Log.zip") {
+    linkLatestArchive(home / "Logs", service, archive, log);
+  }
+
+  testing::TemporaryDirectory home;
+  testing::RecordingAgentLog log;
+};
+
+TEST_F(LatestLinkTest, LinksTheArchiveBesideTheServicesLogs) {
+  fs::create_directories(home / "Logs/Vistel");
+  link("Vistel");
+  EXPECT_EQ(fs::read_symlink(home / "Logs/Vistel/Latest-Vistel"), "/dumps/Log.zip");
+  EXPECT_TRUE(log.lines.empty());
+}
+
+TEST_F(LatestLinkTest, ReplacesWhateverStandsThereWithoutTouchingWhatALinkLeadsTo) {
+  testing::writeFile(home / "Logs/A/Latest-A", "a file");
+  testing::writeFile(home / "Logs/B/Latest-B/inside.log", "a directory");
+  testing::writeFile(home / "kept/archive.zip", "kept");
+  fs::create_directories(home / "Logs/C");
+  fs::create_directory_symlink(home / "kept", home / "Logs/C/Latest-C");
+  for (const char* service : {"A", "B", "C"}) {
+    link(service);
+    const std::string place = home / ("Logs/" + std::string(service) + "/Latest-" + service);
+    EXPECT_EQ(fs::read_symlink(place), "/dumps/Log.zip") << service;
+  }
+  EXPECT_EQ(testing::listTree(home / "kept"), "archive.zip\n");
+}
+
+TEST_F(LatestLinkTest, ServiceWithoutLogsHasNoPlaceForALinkAndNothingIsSaid) {
+  link("Vistel");
+  EXPECT_FALSE(fs::exists(home / "Logs"));
+  EXPECT_TRUE(log.lines.empty());
+}
+
+TEST_F(LatestLinkTest, NameThatLeadsOutOfTheLogRootIsRefusedWithOneWarning) {
+  fs::create_directories(home / "out");
+  fs::create_directories(home / "Logs/a/b");
+  const std::vector<std::string> names{"../out", "..", ".", "/etc", "a/b", std::string("a\0b", 3)};
+  for (const std::string& name : names) {
+    log.lines.clear();
+    link(name);
+    EXPECT_EQ(log.lines.size(), 1U) << name;
+  }
+  log.lines.clear();
+  link("../out\n");
+  EXPECT_EQ(log.lines, std::vector<std::string>{"warning: Refused the link to the latest archive of "
+                                                "\"../out?\": its name leads out of the log directory"});
+  EXPECT_EQ(testing::listTree(home.path()), "Logs/\nLogs/a/\nLogs/a/b/\nout/\n");
+}
+
+}  // namespace
+}  // namespace zal
