@@ -14,6 +14,7 @@ class FileCollector;
 class PreferenceStore;
 class SystemShell;
 class WorkQueues;
+enum class CommandGroup;
 class _ZalLoggingAgentPingRunner;
 struct Configuration;
 
@@ -22,8 +23,8 @@ inline constexpr std::uint64_t kBeginFlagPingCaptures = 1;
 inline constexpr std::uint64_t kBeginFlagSystemLogCaptures = 2;
 
 /// Gathers what there is to know about the device's networking: captures while a session runs, and
-/// a dump of everything on request. Nothing here reports failure. Its services are borrowed and
-/// outlive every job it queues.
+/// a dump of everything on request. Nothing here reports failure; the log names a directory that
+/// could not be made. Its services are borrowed; they and this object outlive every job it queues.
 class NetworkDiagnostics {
  public:
   struct Services {
@@ -51,15 +52,21 @@ class NetworkDiagnostics {
   /// Stops the captures, then queues the collection at background priority. Main thread only;
   /// returns without waiting for the dump.
   void ForceNetworkDump(const std::string& directory, bool includePing);
-  /// The dump itself. Any thread, but made for the background queue: it takes its time. Commands
-  /// and pings that it starts outlive it.
+  /// The dump itself: fills CT, WiFi, Other, Statistics and Console below the directory, which are
+  /// made as needed, and moves the captures there. Any thread, but made for the background queue: it
+  /// takes its time. Commands and pings that it starts outlive it.
   void CollectNetworkLogs(const std::string& directory, bool includePing);
+  /// The part of it that takes the Wi-Fi driver's files, into a directory that exists. Any thread.
   void CollectWiFiFiles(const std::string& directory);
 
+  /// Any thread; false where there is no such service.
   [[nodiscard]] bool VideoCallsOverCellularAvailable();
 
  private:
   [[nodiscard]] bool _isPingTestPreferred();
+  void _runCommands(CommandGroup group, const std::string& directory);
+  void _moveCaptures(const std::string& statistics, const std::string& console, bool includePing);
+  void _startDumpPings(const std::string& statistics, bool includePing);
 
   Services _services;
 };
