@@ -4,6 +4,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <cstdio>
 #include <filesystem>
@@ -11,49 +12,45 @@
 
 #include "platform/linux/config/path_text.h"
 #include "platform/linux/files/system_error.h"
+#include "platform/linux/files/whole_file.h"
 
 namespace zal {
 namespace {
 
-constexpr std::size_t kLargestFile = 1U << 20U;
-
-std::error_code readOpenFile(int descriptor, std::string& content) {
+std::error_code readOpenFile(int descriptor, std::string& content, std::size_t mostBytes) {
   struct stat status {};
   if (::fstat(descriptor, &status) != 0) return lastSystemError();
   if (S_ISDIR(status.st_mode)) return std::make_error_code(std::errc::is_a_directory);
   if (!S_ISREG(status.st_mode)) return std::make_error_code(std::errc::invalid_argument);
-  content.resize(kLargestFile + 1);
+  // One byte more than there should be: a file may grow, and generated ones claim to be empty.
+  content.resize(std::min(static_cast<std::size_t>(status.st_size), mostBytes) + 1);
   std::size_t length = 0;
-  while (length < content.size()) {
+  while (length <= mostBytes) {
+    if (length == content.size()) content.resize(std::min(length * 2, mostBytes + 1));
     const ssize_t count = ::read(descriptor, content.data() + length, content.size() - length);
     if (count < 0 && errno == EINTR) continue;
     if (count < 0) return lastSystemError();
     if (count == 0) break;
     length += static_cast<std::size_t>(count);
   }
-  if (length > kLargestFile) return std::make_error_code(std::errc::file_too_large);
+  if (length > mostBytes) return std::make_error_code(std::errc::file_too_large);
   content.resize(length);
   return {};
 }
 
 std::error_code writeAndSync(int descriptor, std::string_view content) {
-  while (!content.empty()) {
-    const ssize_t count = ::write(descriptor, content.data(), content.size());
-    if (count < 0 && errno == EINTR) continue;
-    if (count < 0) return lastSystemError();
-    content.remove_prefix(static_cast<std::size_t>(count));
-  }
+  if (const std::error_code error = writeWhole(descriptor, content)) return error;
   if (::fsync(descriptor) != 0) return lastSystemError();
   return {};
 }
 
 }  // namespace
 
-std::error_code readTextFile(const std::string& path, std::string& content) {
+std::error_code readTextFile(const std::string& path, std::string& content, std::size_t mostBytes) {
   content.clear();
   const int descriptor = ::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY);
   if (descriptor < 0) return lastSystemError();
-  const std::error_code error = readOpenFile(descriptor, content);
+  const std::error_code error = readOpenFile(descriptor, content, mostBytes);
   ::close(descriptor);
   if (error) content.clear();
   return error;

@@ -2,8 +2,10 @@
 
 #include <csignal>
 
+#include "platform/linux/alerts/alert_file.h"
 #include "platform/linux/config/host_paths.h"
 #include "platform/linux/notifications/notification_file.h"
+#include "platform/linux/progress/progress_file.h"
 
 namespace zal {
 namespace {
@@ -42,9 +44,13 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
       _shell(_agentLog),
       _systemVersion(_loaded.configuration.systemVersionFile),
       _pings(_mainLoop.context(), _loaded.configuration.interfaces, _agentLog),
+      _userAlerts(_mainLoop.context(), _mainLoop, _clock, _agentLog,
+                  alertDirectory(_loaded.configuration.roots.RuntimeRoot)),
       _fileCopier(_agentLog),
+      _dumpProgress(_clock, _agentLog, progressDirectory(_loaded.configuration.roots.RuntimeRoot)),
       _processExit([this] {
         _ipc.stopListening();
+        _userAlerts.cutOffWaiting();
         _logFacility.flush();
       }),
       _hostSignals(_mainLoop, [this] { _ipc.terminationImminent(); }),

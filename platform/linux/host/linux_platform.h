@@ -5,14 +5,13 @@
 
 #include "platform/linux/absent/absent_crash_reporter.h"
 #include "platform/linux/absent/absent_device_support.h"
-#include "platform/linux/absent/absent_dump_progress.h"
 #include "platform/linux/absent/absent_file_copier.h"
 #include "platform/linux/absent/absent_network_status.h"
 #include "platform/linux/absent/absent_property_list_writer.h"
 #include "platform/linux/absent/absent_radio_coexistence.h"
 #include "platform/linux/absent/absent_telephony.h"
-#include "platform/linux/absent/absent_user_alerts.h"
 #include "platform/linux/absent/absent_wifi_diagnostics.h"
+#include "platform/linux/alerts/runtime_alert_store.h"
 #include "platform/linux/config/configuration_loader.h"
 #include "platform/linux/config/toml_preference_store.h"
 #include "platform/linux/files/posix_file_placement.h"
@@ -30,6 +29,7 @@
 #include "platform/linux/process/immediate_process_exit.h"
 #include "platform/linux/process/posix_shell.h"
 #include "platform/linux/process/procfs_process_table.h"
+#include "platform/linux/progress/runtime_dump_progress.h"
 #include "platform/platform.h"
 
 namespace zal {
@@ -67,13 +67,13 @@ class LinuxPlatform {
   AbsentNetworkStatus _networkStatus;
   AbsentTelephony _telephony;
   LinuxPingFacility _pings;
-  AbsentUserAlerts _userAlerts;
+  RuntimeAlertStore _userAlerts;
   AbsentFileCopier _fileCopier;
   AbsentDeviceSupport _deviceSupport;
   AbsentWifiDiagnostics _wifiDiagnostics;
   AbsentRadioCoexistence _radioCoexistence;
   AbsentPropertyListWriter _propertyLists;
-  AbsentDumpProgress _dumpProgress;
+  RuntimeDumpProgress _dumpProgress;
   ImmediateProcessExit _processExit;
   LoopHostSignals _hostSignals;
   Platform _services;

@@ -1,10 +1,15 @@
 #include "platform/linux/host/linux_platform.h"
 
+#include <sys/wait.h>
+#include <unistd.h>
+
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
 #include <csignal>
 
+#include "platform/linux/alerts/alert_file.h"
+#include "platform/linux/progress/progress_file.h"
 #include "tests/support/temporary_directory.h"
 
 namespace zal {
@@ -56,6 +61,38 @@ TEST_F(LinuxPlatformTest, WarningsOfTheConfigurationReachTheAgentsOwnLogSet) {
   platform.services().logFacility.flush();
   EXPECT_THAT(readFile(home / "logs/ZalLogging/ZalLogging.log"),
               ::testing::HasSubstr("lirra.toml:3: unknown key roots.NoSuchRoot"));
+}
+
+TEST_F(LinuxPlatformTest, AlertsAndProgressAreRecordsInTheRuntimeDirectory) {
+  configure("[roots]\nRuntimeRoot = '" + (home / "runtime") + "'\n");
+  LinuxPlatform platform(environment());
+  EXPECT_FALSE(std::filesystem::exists(home / "runtime/alerts"));
+  EXPECT_FALSE(std::filesystem::exists(home / "runtime/dumps"));
+  Platform& services = platform.services();
+  UserAlert alert;
+  alert.title = "Title";
+  services.userAlerts.post(alert, nullptr);
+  services.mainLoop.post([&] { services.mainLoop.stop(); });
+  services.mainLoop.run();
+  const auto progress = services.dumpProgress.begin({"Vistel", "/d", {"one"}});
+  EXPECT_EQ(listAlerts(home / "runtime/alerts").at(0).alert.title, "Title");
+  EXPECT_EQ(listDumpProgress(home / "runtime/dumps").at(0).record.service, "Vistel");
+}
+
+TEST_F(LinuxPlatformTest, TheEndOfTheProcessIsInTheRecordsOfWaitingAlerts) {
+  const pid_t agent = ::fork();
+  if (agent == 0) {
+    LinuxPlatform platform(environment());
+    Platform& services = platform.services();
+    services.userAlerts.post(UserAlert(), nullptr);
+    services.mainLoop.post([&] { services.processExit.exit(0); });
+    services.mainLoop.run();
+    ::_exit(1);
+  }
+  int status = 1;
+  ::waitpid(agent, &status, 0);
+  EXPECT_EQ(status, 0);
+  EXPECT_THAT(readFile(home / "run/lirra/alerts/1.toml"), ::testing::HasSubstr("state = \"cut off\"\n"));
 }
 
 TEST_F(LinuxPlatformTest, ABrokenPipeEndsNothing) {

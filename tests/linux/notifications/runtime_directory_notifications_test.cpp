@@ -7,6 +7,7 @@
 
 #include "platform/linux/loop/linux_run_loop.h"
 #include "platform/linux/notifications/notification_file.h"
+#include "tests/linux/loop/run_until.h"
 #include "tests/support/fake_services.h"
 #include "tests/support/temporary_directory.h"
 
@@ -33,19 +34,7 @@ class RuntimeDirectoryNotificationsTest : public ::testing::Test {
     loop.run();
     loop.cancel(limit);
   }
-  /// Lets the loop run until the condition holds.
-  void runUntil(const std::function<bool()>& condition) {
-    const TimerId check = loop.callEvery(1ms, [this, &condition] {
-      if (condition()) loop.stop();
-    });
-    const TimerId limit = loop.callAfter(10s, [this] {
-      ADD_FAILURE() << "the condition never held";
-      loop.stop();
-    });
-    loop.run();
-    loop.cancel(check);
-    loop.cancel(limit);
-  }
+  void runUntil(const std::function<bool()>& condition) { testing::runUntil(loop, condition); }
 
   testing::TemporaryDirectory root;
   const std::string directory = notificationDirectory(root / "run");
