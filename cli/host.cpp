@@ -10,6 +10,7 @@
 #include <thread>
 
 #include "platform/agent_log.h"
+#include "platform/linux/archive/zip_contents.h"
 #include "platform/linux/config/configuration_loader.h"
 #include "platform/linux/config/host_environment.h"
 #include "platform/linux/config/host_paths.h"
@@ -36,6 +37,29 @@ class ToolLog final : public AgentLog {
   std::ostream& _err;
 };
 
+class ZipReader final : public ArchiveReader {
+ public:
+  [[nodiscard]] std::optional<std::vector<SessionFile>> files(const std::string& archive) override {
+    const auto entries = listZip(archive);
+    if (!entries) return std::nullopt;
+    std::vector<SessionFile> result;
+    for (const ZipEntry& entry : *entries) {
+      result.push_back({entry.name.substr(topOf(entry.name).size()), entry.bytes});
+    }
+    return result;
+  }
+  [[nodiscard]] std::optional<std::string> text(const std::string& archive,
+                                                const std::string& path) override {
+    const auto entries = listZip(archive);
+    if (!entries || entries->empty()) return std::nullopt;
+    return readZipEntry(archive, topOf(entries->front().name) + path);
+  }
+
+ private:
+  /// The one directory that everything in an archive lies in, with its slash.
+  static std::string topOf(const std::string& name) { return name.substr(0, name.find('/') + 1); }
+};
+
 class ThisMachine final : public ToolHost {
  public:
   explicit ThisMachine(std::ostream& err)
@@ -60,6 +84,7 @@ class ThisMachine final : public ToolHost {
     if (!error) return std::nullopt;
     return directory + ": " + error.message();
   }
+  [[nodiscard]] ArchiveReader& archives() override { return _archives; }
   [[nodiscard]] bool outputIsTerminal() const override { return ::isatty(STDOUT_FILENO) != 0; }
   [[nodiscard]] bool wantsColour() const override {
     return outputIsTerminal() && _environment.variable("NO_COLOR").empty() &&
@@ -93,6 +118,7 @@ class ThisMachine final : public ToolHost {
   ToolLog _log;
   TomlPreferenceStore _preferences;
   std::optional<ToolSettings> _settings;
+  ZipReader _archives;
 };
 
 }  // namespace

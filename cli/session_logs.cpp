@@ -50,18 +50,19 @@ std::optional<MetricBlock> takeBlock(std::string_view& text) {
 
 }  // namespace
 
-std::optional<std::string> sessionLogPath(const SessionDirectory& session, SessionLog log) {
+std::optional<std::string> sessionLogName(const SessionDirectory& session, SessionLog log) {
   constexpr std::array<std::string_view, 3> kBeginnings = {"Log (", "Verbose Log (", "Quality Log ("};
   const std::string_view beginning = kBeginnings[static_cast<std::size_t>(log)];
   for (const SessionFile& file : session.files) {
-    if (file.path.starts_with(beginning) && file.path.ends_with(").log"))
-      return session.path + "/" + file.path;
+    if (file.path.starts_with(beginning) && file.path.ends_with(").log")) return file.path;
   }
   return std::nullopt;
 }
 
-std::optional<std::string> readFileText(const std::string& path) {
-  std::ifstream file(path, std::ios::binary);
+std::optional<std::string> readSessionFile(const SessionDirectory& session, const std::string& name,
+                                           ArchiveReader& archives) {
+  if (session.isArchive) return archives.text(session.path, name);
+  std::ifstream file(session.path + "/" + name, std::ios::binary);
   if (!file) return std::nullopt;
   std::string text{std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>()};
   if (file.bad()) return std::nullopt;

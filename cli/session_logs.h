@@ -11,10 +11,11 @@ namespace zal {
 
 enum class SessionLog { simple, verbose, quality };
 
-/// The path of one of the session's three logs; nothing when it was not written.
-[[nodiscard]] std::optional<std::string> sessionLogPath(const SessionDirectory& session, SessionLog log);
-/// Nothing when the file cannot be read.
-[[nodiscard]] std::optional<std::string> readFileText(const std::string& path);
+/// One of the session's three logs by its path below the session; nothing when it was not written.
+[[nodiscard]] std::optional<std::string> sessionLogName(const SessionDirectory& session, SessionLog log);
+/// A file of the session, whole; nothing when it cannot be read.
+[[nodiscard]] std::optional<std::string> readSessionFile(const SessionDirectory& session,
+                                                         const std::string& name, ArchiveReader& archives);
 
 /// A metric over its whole session, as the quality log says it.
 struct MetricBlock {

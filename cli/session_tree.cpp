@@ -4,11 +4,14 @@
 #include <cctype>
 #include <filesystem>
 #include <tuple>
+#include <utility>
 
 namespace zal {
 namespace {
 
 namespace fs = std::filesystem;
+
+constexpr std::string_view kArchiveEnding = ".zip";
 
 /// '0' in the pattern stands for any digit.
 bool matches(std::string_view text, std::string_view pattern) {
@@ -33,13 +36,29 @@ std::vector<SessionFile> filesBelow(const std::string& directory) {
 }
 
 template <class Visit>
-void forEachDirectory(const std::string& parent, Visit&& visit) {
+void forEachEntry(const std::string& parent, Visit&& visit) {
   std::error_code error;
   fs::directory_iterator entry(parent, fs::directory_options::skip_permission_denied, error);
   for (; !error && entry != fs::directory_iterator(); entry.increment(error)) {
     std::error_code ignored;
-    if (fs::is_directory(entry->symlink_status(ignored))) visit(entry->path());
+    visit(entry->path(), entry->symlink_status(ignored));
   }
+}
+
+bool isArchiveName(const std::string& name) { return name.ends_with(kArchiveEnding); }
+
+std::string withoutArchiveEnding(std::string name) {
+  if (isArchiveName(name)) name.resize(name.size() - kArchiveEnding.size());
+  return name;
+}
+
+std::optional<std::vector<SessionFile>> filesOf(const std::string& path, bool isArchive,
+                                                ArchiveReader& archives) {
+  if (!isArchive) return filesBelow(path);
+  auto files = archives.files(path);
+  if (files)
+    std::sort(files->begin(), files->end(), [](const auto& a, const auto& b) { return a.path < b.path; });
+  return files;
 }
 
 }  // namespace
@@ -67,25 +86,35 @@ std::optional<SessionDirectory> parseSessionName(std::string_view name) {
   return std::nullopt;
 }
 
-std::optional<SessionDirectory> readSession(const std::string& path) {
+std::optional<SessionDirectory> readSession(const std::string& path, ArchiveReader& archives) {
   std::string plain = path;
   while (plain.size() > 1 && plain.back() == '/') plain.pop_back();
   std::error_code error;
-  if (!fs::is_directory(plain, error)) return std::nullopt;
+  const bool isDirectory = fs::is_directory(plain, error);
+  if (!isDirectory && !isArchiveName(plain)) return std::nullopt;
+  auto files = filesOf(plain, !isDirectory, archives);
+  if (!files) return std::nullopt;
   const fs::path asPath(plain);
-  SessionDirectory session = parseSessionName(asPath.filename().string()).value_or(SessionDirectory{});
+  const std::string name = asPath.filename().string();
+  SessionDirectory session =
+      parseSessionName(isDirectory ? name : withoutArchiveEnding(name)).value_or(SessionDirectory{});
   session.type = asPath.parent_path().filename().string();
   session.path = plain;
-  session.files = filesBelow(plain);
+  session.isArchive = !isDirectory;
+  session.files = std::move(*files);
   return session;
 }
 
-std::vector<SessionDirectory> findSessions(const std::string& root) {
+std::vector<SessionDirectory> findSessions(const std::string& root, ArchiveReader& archives) {
   std::vector<SessionDirectory> sessions;
-  forEachDirectory(root, [&](const fs::path& type) {
-    forEachDirectory(type.string(), [&](const fs::path& directory) {
-      if (!parseSessionName(directory.filename().string())) return;
-      if (auto session = readSession(directory.string())) sessions.push_back(std::move(*session));
+  forEachEntry(root, [&](const fs::path& type, fs::file_status typeStatus) {
+    if (!fs::is_directory(typeStatus)) return;
+    forEachEntry(type.string(), [&](const fs::path& path, fs::file_status status) {
+      const std::string name = path.filename().string();
+      const bool isArchive = fs::is_regular_file(status) && isArchiveName(name);
+      if (!isArchive && !fs::is_directory(status)) return;
+      if (!parseSessionName(isArchive ? withoutArchiveEnding(name) : name)) return;
+      if (auto session = readSession(path.string(), archives)) sessions.push_back(std::move(*session));
     });
   });
   std::sort(sessions.begin(), sessions.end(), [](const auto& a, const auto& b) {

@@ -48,13 +48,14 @@ std::string jsonOf(const SessionDirectory& session) {
       .add("zone", session.zone)
       .add("role", session.role)
       .add("directory", session.path)
+      .add("archived", session.isArchive)
       .add("bytes", session.bytes())
       .addJson("files", jsonArray(files))
       .text();
 }
 
 ExitCode list(ToolContext& tool) {
-  const std::vector<SessionDirectory> sessions = findSessions(root(tool));
+  const std::vector<SessionDirectory> sessions = findSessions(root(tool), tool.host.archives());
   if (tool.options.json) {
     std::vector<std::string> elements;
     elements.reserve(sessions.size());
@@ -84,16 +85,17 @@ ExitCode list(ToolContext& tool) {
 
 /// The session that a type or a directory names; of a type, and of none, the latest.
 std::optional<SessionDirectory> findSession(ToolContext& tool, const std::string& name) {
-  if (name.find('/') != std::string::npos) return readSession(tool.host.absolutePath(name));
-  for (SessionDirectory& session : findSessions(root(tool))) {
+  if (name.find('/') != std::string::npos)
+    return readSession(tool.host.absolutePath(name), tool.host.archives());
+  for (SessionDirectory& session : findSessions(root(tool), tool.host.archives())) {
     if (name.empty() || session.type == name) return std::move(session);
   }
   return std::nullopt;
 }
 
-std::string readLog(const SessionDirectory& session, SessionLog log) {
-  const auto path = sessionLogPath(session, log);
-  return path ? readFileText(*path).value_or("") : "";
+std::string readLog(ToolContext& tool, const SessionDirectory& session, SessionLog log) {
+  const auto name = sessionLogName(session, log);
+  return name ? readSessionFile(session, *name, tool.host.archives()).value_or("") : "";
 }
 
 /// A log comes from clients: on a terminal none of it may steer the terminal.
@@ -102,14 +104,15 @@ std::string shown(ToolContext& tool, const std::string& text) {
 }
 
 ExitCode showOneLog(ToolContext& tool, const SessionDirectory& session, SessionLog log) {
-  const auto path = sessionLogPath(session, log);
-  if (!path)
+  const auto name = sessionLogName(session, log);
+  if (!name)
     return tool.fail(ExitCode::notFound, "the session has no such log: " + session.path,
                      "See \"lirractl sessions show\".");
-  const auto text = readFileText(*path);
-  if (!text) return tool.fail(ExitCode::fileTrouble, "cannot read " + *path, "");
+  const auto text = readSessionFile(session, *name, tool.host.archives());
+  const std::string path = session.path + "/" + *name;
+  if (!text) return tool.fail(ExitCode::fileTrouble, "cannot read " + path, "");
   if (tool.options.json) {
-    tool.out << JsonObject().add("path", *path).add("text", *text).text() << "\n";
+    tool.out << JsonObject().add("path", path).add("text", *text).text() << "\n";
   } else {
     tool.out << shown(tool, *text);
   }
@@ -118,7 +121,7 @@ ExitCode showOneLog(ToolContext& tool, const SessionDirectory& session, SessionL
 
 ExitCode showJson(ToolContext& tool, const SessionDirectory& session) {
   std::vector<std::string> statistics;
-  for (const MetricBlock& block : statisticsBlocks(readLog(session, SessionLog::quality))) {
+  for (const MetricBlock& block : statisticsBlocks(readLog(tool, session, SessionLog::quality))) {
     statistics.push_back(JsonObject()
                              .add("metric", block.name)
                              .add("average", block.average)
@@ -130,7 +133,7 @@ ExitCode showJson(ToolContext& tool, const SessionDirectory& session) {
   }
   tool.out << JsonObject()
                   .addJson("session", jsonOf(session))
-                  .add("log", readLog(session, SessionLog::simple))
+                  .add("log", readLog(tool, session, SessionLog::simple))
                   .addJson("statistics", jsonArray(statistics))
                   .text()
            << "\n";
@@ -148,8 +151,8 @@ ExitCode showSummary(ToolContext& tool, const SessionDirectory& session) {
   }
   tool.out << "\n";
   heading("Log");
-  tool.out << shown(tool, readLog(session, SessionLog::simple));
-  const auto blocks = statisticsBlocks(readLog(session, SessionLog::quality));
+  tool.out << shown(tool, readLog(tool, session, SessionLog::simple));
+  const auto blocks = statisticsBlocks(readLog(tool, session, SessionLog::quality));
   if (blocks.empty()) return ExitCode::done;
   tool.out << "\n";
   heading("Statistics");
@@ -185,7 +188,8 @@ void addSessionTreeCommands(CLI::App& app, ToolContext& tool) {
   const auto wanted = std::make_shared<Shown>();
   CLI::App* const shower =
       sessions->add_subcommand("show", "The latest session's files, simple log and statistics");
-  shower->add_option("SESSION", wanted->session, "A session type, or a session's directory (with a \"/\")");
+  shower->add_option("SESSION", wanted->session,
+                     "A session type, or a session's directory or archive (with a \"/\")");
   CLI::Option* const simple = shower->add_flag("--log", wanted->simple, "The simple log alone, as it is");
   CLI::Option* const verbose = shower->add_flag("--verbose", wanted->verbose, "The verbose log alone");
   CLI::Option* const quality = shower->add_flag("--quality", wanted->quality, "The quality log alone");

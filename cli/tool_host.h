@@ -6,6 +6,7 @@
 #include <string_view>
 #include <vector>
 
+#include "cli/archive_reader.h"
 #include "platform/directory_roots.h"
 
 namespace zal {
@@ -30,6 +31,8 @@ class ToolHost {
   [[nodiscard]] virtual std::optional<std::string> setPreference(std::string_view key, bool value) = 0;
   /// To every process of the machine. Returned: why it was not posted, or nothing.
   [[nodiscard]] virtual std::optional<std::string> postNotification(std::string_view name) = 0;
+
+  [[nodiscard]] virtual ArchiveReader& archives() = 0;
 
   [[nodiscard]] virtual bool outputIsTerminal() const = 0;
   /// On a terminal, and nobody said NO_COLOR.

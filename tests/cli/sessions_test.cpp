@@ -41,13 +41,37 @@ TEST_F(SessionsTest, ListIsLatestFirst) {
             "ROOT/Reports/Vistel/2024-05-02 at 14-03-07 (CEST) (Initiator)\n");
 }
 
+TEST_F(SessionsTest, ASessionThatBecameAnArchiveIsListedAndShownLikeAnyOther) {
+  const std::string archive = directory / "Reports/Vistel/2024-05-03 at 09-00-00 (CEST) (Receiver).zip";
+  writeFile(archive, "the machine knows what is in it");
+  writeFile(directory / "Reports/Vistel/2024-05-03 at 09-00-00 (CEST).zip", "a dump's, no session's");
+  machine.scriptedArchives.archives[archive] = {{"Verbose Log (09-00-00).log", "verbose\n"},
+                                                {"Log (09-00-00).log", "simple\n"}};
+  EXPECT_EQ(run({"sessions", "list"}), 0);
+  EXPECT_EQ(plain(out),
+            "STARTED                     TYPE    ROLE       FILES        SIZE  DIRECTORY\n"
+            "2024-05-03 09:00:00 CEST    Vistel  Receiver       2        15 B  "
+            "ROOT/Reports/Vistel/2024-05-03 at 09-00-00 (CEST) (Receiver).zip\n");
+  EXPECT_EQ(run({"sessions", "show", "Vistel", "--verbose"}), 0);
+  EXPECT_EQ(out, "verbose\n");
+  EXPECT_EQ(run({"sessions", "show", archive, "--log"}), 0);
+  EXPECT_EQ(out, "simple\n");
+  EXPECT_EQ(run({"sessions", "show", archive, "--quality"}), 3);
+}
+
+TEST_F(SessionsTest, AnArchiveThatCannotBeReadIsLeftOut) {
+  writeFile(directory / "Reports/Vistel/2024-05-03 at 09-00-00 (CEST) (Receiver).zip", "torn");
+  EXPECT_EQ(run({"sessions", "list"}), 0);
+  EXPECT_EQ(plain(out), "No sessions in ROOT/Reports\n");
+}
+
 TEST_F(SessionsTest, ListForProgramsHasEveryFile) {
   writeSession("Vistel/2024-05-02 at 14-03-07 (CEST) (Initiator)", "14-03-07", "first\n");
   EXPECT_EQ(run({"sessions", "list", "--json"}), 0);
   EXPECT_EQ(
       plain(out),
       R"~([{"type": "Vistel", "started": "2024-05-02 14:03:07", "zone": "CEST", "role": "Initiator", )~"
-      R"~("directory": "ROOT/Reports/Vistel/2024-05-02 at 14-03-07 (CEST) (Initiator)", "bytes": 22, "files": [)~"
+      R"~("directory": "ROOT/Reports/Vistel/2024-05-02 at 14-03-07 (CEST) (Initiator)", "archived": false, "bytes": 22, "files": [)~"
       R"~({"path": "Log (14-03-07).log", "bytes": 6}, {"path": "Quality Log (14-03-07).log", "bytes": 2}, )~"
       R"~({"path": "Verbose Log (14-03-07).log", "bytes": 14}]}])~"
       "\n");

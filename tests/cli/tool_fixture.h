@@ -15,6 +15,25 @@
 
 namespace zal::testing {
 
+/// Archives that a test lays out: archive path to file name to text.
+class ScriptedArchives final : public ArchiveReader {
+ public:
+  std::map<std::string, std::map<std::string, std::string>> archives;
+  [[nodiscard]] std::optional<std::vector<SessionFile>> files(const std::string& archive) override {
+    const auto found = archives.find(archive);
+    if (found == archives.end()) return std::nullopt;
+    std::vector<SessionFile> result;
+    for (const auto& [name, text] : found->second) result.push_back({name, text.size()});
+    return result;
+  }
+  [[nodiscard]] std::optional<std::string> text(const std::string& archive,
+                                                const std::string& path) override {
+    const auto found = archives.find(archive);
+    if (found == archives.end() || !found->second.contains(path)) return std::nullopt;
+    return found->second.at(path);
+  }
+};
+
 /// A machine whose answers a test sets.
 class ScriptedMachine final : public ToolHost {
  public:
@@ -31,6 +50,7 @@ class ScriptedMachine final : public ToolHost {
     posted.emplace_back(name);
     return postTrouble.empty() ? std::nullopt : std::optional(postTrouble);
   }
+  [[nodiscard]] ArchiveReader& archives() override { return scriptedArchives; }
   [[nodiscard]] bool outputIsTerminal() const override { return terminal; }
   [[nodiscard]] bool wantsColour() const override { return terminal; }
   [[nodiscard]] bool isSuperuser() const override { return false; }
@@ -46,6 +66,7 @@ class ScriptedMachine final : public ToolHost {
   }
 
   ToolSettings toolSettings;
+  ScriptedArchives scriptedArchives;
   std::map<std::string, bool, std::less<>> switches;
   std::vector<std::string> posted;
   std::string storeTrouble;
