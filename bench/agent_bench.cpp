@@ -146,8 +146,10 @@ bool addLists(Rows& rows, std::map<std::string, double> figures) {
                         figures["multimap_worst"], 0.25, duration));
   rows.push_back(atMost("timed entries, worst order : own ascending", figures["worst"], figures["ascending"],
                         3, duration));
-  rows.push_back(atMost("ending a session of verbose lines : plain write", figures["session_end"],
-                        figures["plain_write"], 2, duration));
+  for (const std::string order : {"ascending", "random"}) {
+    rows.push_back(atMost("ending a session of verbose lines, " + order + " : plain write",
+                          figures["session_end_" + order], figures["plain_write_" + order], 2, duration));
+  }
   return true;
 }
 

@@ -10,6 +10,7 @@
 #include <system_error>
 #include <utility>
 
+#include "session/fetch_soon.h"
 #include "session/text_encoding.h"
 
 namespace zal {
@@ -22,6 +23,9 @@ constexpr std::size_t kBufferSize = 256U * 1024U;
 constexpr std::size_t kLargePiece = 64U * 1024U;
 // A stretch is cut here, so that it is still in the processor's cache when it is written.
 constexpr std::ptrdiff_t kLargestStretch = 256 * 1024;
+// Lines ahead that are asked for, and how far into them: most are not longer than two cache lines.
+constexpr std::size_t kFetchAhead = 8;
+constexpr std::size_t kCacheLine = 64;
 
 class BufferedFile {
  public:
@@ -86,7 +90,11 @@ void writeStrings(const LogLines& strings, const std::string& path, AgentLog& lo
   const bool plain = !strings.texts || strings.texts->isAscii();
   const char* begin = nullptr;
   const char* end = nullptr;
-  for (const std::string_view line : strings.lines) {
+  for (std::size_t number = 0; number < strings.lines.size(); ++number) {
+    const std::string_view line = strings.lines[number];
+    const char* const later = strings.lines[std::min(number + kFetchAhead, strings.lines.size() - 1)].data();
+    fetchSoon(later);
+    fetchSoon(later, kCacheLine);
     const std::size_t units = plain ? line.size() : std::min(utf16Length(line), line.size());
     if (line.data() != end || end - begin >= kLargestStretch) {
       file.append({begin, static_cast<std::size_t>(end - begin)});

@@ -22,7 +22,6 @@ namespace zal::bench {
 namespace {
 
 constexpr std::size_t kWriteSize = 1U << 20U;
-constexpr double kFirstTime = 1'714'651'387.251;
 
 [[noreturn]] void fail(const char* what) {
   perror(what);
@@ -59,7 +58,8 @@ std::string takeFiles(const std::filesystem::path& base, std::uint64_t atLeastLi
 
 }  // namespace
 
-SessionEndSeconds measureSessionEnd(const std::filesystem::path& folder, std::uint64_t lines) {
+SessionEndSeconds measureSessionEnd(const std::filesystem::path& folder, const std::vector<double>& times) {
+  const std::uint64_t lines = times.size();
   testing::FakePlatform fakes;
   CommandRunner commandRunner{fakes.shell};
   FileCollector fileCollector{fakes.files, fakes.agentLog, fakes.configuration.roots};
@@ -88,10 +88,10 @@ SessionEndSeconds measureSessionEnd(const std::filesystem::path& folder, std::ui
   session->beginSessionWithSender("callservice");
   for (std::uint64_t number = 0; number < lines; ++number) {
     session->logDescription("Transport", "route changed, packet number " + std::to_string(number),
-                            "callservice", kFirstTime + static_cast<double>(number) * 0.001);
+                            "callservice", times[number]);
   }
   // The last line of a session is its end, also on this clock.
-  fakes.host.setWall(wallTimeFromSeconds(kFirstTime + static_cast<double>(lines)));
+  fakes.host.setWall(wallTimeFromSeconds(*std::max_element(times.begin(), times.end()) + 1));
   SessionEndSeconds seconds;
   const Stopwatch watch;
   session->endSessionWithSender("callservice");

@@ -1,7 +1,7 @@
 #pragma once
 
-#include <cstdint>
 #include <filesystem>
+#include <vector>
 
 namespace zal::bench {
 
@@ -10,7 +10,9 @@ struct SessionEndSeconds {
   double plainWrite = 0;  ///< of writing the bytes of those files from memory to one other file
 };
 
-/// The session is a real one on a clock of its own; its files go below the folder.
-[[nodiscard]] SessionEndSeconds measureSessionEnd(const std::filesystem::path& folder, std::uint64_t lines);
+/// A session with one verbose line a time, in the order given (seconds since 1970). It is a real one on a
+/// clock of its own; its files go below the folder.
+[[nodiscard]] SessionEndSeconds measureSessionEnd(const std::filesystem::path& folder,
+                                                  const std::vector<double>& times);
 
 }  // namespace zal::bench
