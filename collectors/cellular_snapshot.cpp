@@ -114,15 +114,16 @@ void CellularSnapshot::WriteCellularState(const std::string& directory) {
   (void)_propertyLists.write(CopyCellularState(), directory + "/" + std::string(kFileName));
 }
 
-void CellularSnapshot::DumpBasebandState(const std::optional<std::string>& reason, const std::string& label) {
+bool CellularSnapshot::DumpBasebandState(const std::optional<std::string>& reason, const std::string& label) {
   const std::string text = reason ? *reason : "Baseband dump for " + label + " logging";
   const auto connection = _telephony.connect();
   if (!connection) {
     _log.warning("Baseband snapshot failed, could not connect to Telvane");
-    return;
+    return false;
   }
   connection->dumpBasebandState(text);
   _log.notice("Baseband snapshot successful");
+  return true;
 }
 
 }  // namespace zal

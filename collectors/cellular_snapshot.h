@@ -27,8 +27,9 @@ class CellularSnapshot {
   [[nodiscard]] ValueMap CopyCellularState();
   /// Writes that as CTState.plist into the directory, which must exist.
   void WriteCellularState(const std::string& directory);
-  /// Asks for a dump of the baseband's state. Without a reason the text names the label.
-  void DumpBasebandState(const std::optional<std::string>& reason, const std::string& label);
+  /// Asks for a dump of the baseband's state. Without a reason the text names the label. Returned:
+  /// whether the service could be asked; the log says so too.
+  bool DumpBasebandState(const std::optional<std::string>& reason, const std::string& label);
 
  private:
   Telephony& _telephony;

@@ -2,6 +2,7 @@
 
 #include <filesystem>
 
+#include "collectors/missing_output.h"
 #include "platform/agent_log.h"
 #include "platform/dump_progress.h"
 #include "platform/process_table.h"
@@ -17,6 +18,12 @@ void tellRunningCommands(const std::string& directory, const ProcessTable& proce
     log.notice("Still running when archived: " + writer.command + " (process " +
                std::to_string(writer.processId) + "), writing " + writer.file);
     progress.missing(file, "still running when archived: " + writer.command);
+  }
+}
+
+void tellMissingPrograms(const std::string& directory, DumpProgress& progress) {
+  for (const MissingOutput& output : missingOutputs(directory)) {
+    progress.missing(output.file, output.missing.program + ": " + output.missing.reason);
   }
 }
 

@@ -12,5 +12,8 @@ class ProcessTable;
 /// what they write from now on will not be archived. Any thread.
 void tellRunningCommands(const std::string& directory, const ProcessTable& processes, AgentLog& log,
                          DumpProgress& progress);
+/// Says in the record which outputs below the directory hold nothing for the want of a program, one
+/// line each. Any thread; reads from a disk.
+void tellMissingPrograms(const std::string& directory, DumpProgress& progress);
 
 }  // namespace zal

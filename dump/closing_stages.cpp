@@ -47,7 +47,9 @@ void takeStackshot(const Services& services, const ClosingWork& work) {
 }
 
 void takeBasebandSnapshot(const Services& services, const ClosingWork& work) {
-  services.collectors.cellular.DumpBasebandState(work.reason, work.service);
+  if (!services.collectors.cellular.DumpBasebandState(work.reason, work.service)) {
+    work.progress->missing("Baseband snapshot", "the telephony service cannot be reached");
+  }
 }
 
 void collectSystemLogs(const Services& services, const ClosingWork& work) {
@@ -77,6 +79,7 @@ void linkFullPacketCapture(const Services& services, const ClosingWork& work) {
 void tellGaps(const Services& services, const ClosingWork& work) {
   tellRunningCommands(work.destination, services.platform.processes, services.platform.agentLog,
                       *work.progress);
+  tellMissingPrograms(work.destination, *work.progress);
 }
 
 constexpr CollectionFlags kAlways = 0;
