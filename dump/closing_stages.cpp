@@ -113,7 +113,9 @@ class ClosingRun : public std::enable_shared_from_this<ClosingRun> {
 
   void firstStage() {
     _runSteps(kFirstStage);
-    _standardQueue().asyncAfter(kSecondStageDelay, [self = shared_from_this()] { self->_secondStage(); });
+    _standardQueue().asyncAfter(
+        _services.platform.configuration.closingStageDelay.value_or(kSecondStageDelay),
+        [self = shared_from_this()] { self->_secondStage(); });
   }
 
  private:

@@ -88,6 +88,8 @@ struct Configuration {
   std::string systemVersionFile;  ///< property list; empty: os-release and the kernel answer
   /// For tests only: the agent's six minutes of idling shortened. `[testing] inactivityLimit`, seconds.
   std::optional<std::chrono::milliseconds> inactivityLimit;
+  /// For tests only: the wait between a collection's closing stages. `[testing] closingStageDelay`, seconds.
+  std::optional<std::chrono::milliseconds> closingStageDelay;
 };
 
 }  // namespace zal

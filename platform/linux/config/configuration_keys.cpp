@@ -67,14 +67,14 @@ std::string takeCategories(const toml::node& value, const std::string& /*home*/,
   return {};
 }
 
-std::string takeInactivityLimit(const toml::node& value, const std::string& /*home*/,
-                                Configuration& configuration) {
+template <auto Field>
+std::string takeDuration(const toml::node& value, const std::string& /*home*/, Configuration& configuration) {
   constexpr double kMost = 31'536'000;  // a year
   const auto seconds = value.value<double>();
   if (!value.is_number() || !seconds || !(*seconds >= 0.001 && *seconds <= kMost)) {
     return "wants a number of seconds from 0.001 to 31536000";
   }
-  configuration.inactivityLimit = std::chrono::milliseconds{std::llround(*seconds * 1000.0)};
+  configuration.*Field = std::chrono::milliseconds{std::llround(*seconds * 1000.0)};
   return {};
 }
 
@@ -108,7 +108,8 @@ constexpr ConfigurationKey kKeys[] = {
     {"log", "rotationSize", takeCount<&Configuration::log, &LogSettings::rotationSize, 1024, kLargestBlock>},
     {"log", "maximumOpenFiles", takeCount<&Configuration::log, &LogSettings::maximumOpenFiles, 1, 65536>},
     {"device", "SystemVersionFile", takePath<&Configuration::systemVersionFile>},
-    {"testing", "inactivityLimit", takeInactivityLimit},
+    {"testing", "inactivityLimit", takeDuration<&Configuration::inactivityLimit>},
+    {"testing", "closingStageDelay", takeDuration<&Configuration::closingStageDelay>},
 };
 
 }  // namespace

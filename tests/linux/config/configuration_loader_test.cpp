@@ -98,6 +98,7 @@ maximumOpenFiles = 2
 SystemVersionFile = "/r/version.plist"
 [testing]
 inactivityLimit = 1.5
+closingStageDelay = 0.25
 )");
   EXPECT_THAT(loaded.warnings, IsEmpty());
   const auto& c = loaded.configuration;
@@ -127,6 +128,7 @@ inactivityLimit = 1.5
   EXPECT_EQ(c.log.maximumOpenFiles, 2U);
   EXPECT_EQ(c.systemVersionFile, "/r/version.plist");
   EXPECT_EQ(c.inactivityLimit, std::chrono::milliseconds{1500});
+  EXPECT_EQ(c.closingStageDelay, std::chrono::milliseconds{250});
 }
 
 TEST_F(ConfigurationLoaderTest, UnknownKeysAndWrongTypesAreNamedByLineAndTheOthersStand) {
