@@ -6,6 +6,7 @@
 #include <vector>
 
 #include "platform/linux/files/system_error.h"
+#include "platform/linux/files/whole_file.h"
 
 namespace zal {
 
@@ -13,17 +14,6 @@ namespace {
 
 constexpr std::size_t kKernelPortion = std::size_t{1} << 30U;
 constexpr std::size_t kMemoryPortion = std::size_t{128} << 10U;
-
-std::error_code writeWhole(int target, const char* bytes, std::size_t count) {
-  while (count > 0) {
-    const ssize_t written = ::write(target, bytes, count);
-    if (written < 0 && errno == EINTR) continue;
-    if (written < 0) return lastSystemError();
-    bytes += written;
-    count -= static_cast<std::size_t>(written);
-  }
-  return {};
-}
 
 }  // namespace
 
@@ -38,7 +28,7 @@ std::error_code copyFileContent(int source, int target) {
     if (got < 0 && errno == EINTR) continue;
     if (got < 0) return lastSystemError();
     if (got == 0) return {};
-    if (const auto error = writeWhole(target, buffer.data(), static_cast<std::size_t>(got))) return error;
+    if (const auto error = writeWhole(target, {buffer.data(), static_cast<std::size_t>(got)})) return error;
   }
 }
 

@@ -7,7 +7,6 @@
 #include "platform/linux/absent/absent_device_support.h"
 #include "platform/linux/absent/absent_file_copier.h"
 #include "platform/linux/absent/absent_network_status.h"
-#include "platform/linux/absent/absent_property_list_writer.h"
 #include "platform/linux/absent/absent_radio_coexistence.h"
 #include "platform/linux/absent/absent_telephony.h"
 #include "platform/linux/absent/absent_wifi_diagnostics.h"
@@ -30,6 +29,7 @@
 #include "platform/linux/process/posix_shell.h"
 #include "platform/linux/process/procfs_process_table.h"
 #include "platform/linux/progress/runtime_dump_progress.h"
+#include "platform/linux/property_list/pugixml_property_list_writer.h"
 #include "platform/platform.h"
 
 namespace zal {
@@ -72,7 +72,7 @@ class LinuxPlatform {
   AbsentDeviceSupport _deviceSupport;
   AbsentWifiDiagnostics _wifiDiagnostics;
   AbsentRadioCoexistence _radioCoexistence;
-  AbsentPropertyListWriter _propertyLists;
+  PugixmlPropertyListWriter _propertyLists;
   RuntimeDumpProgress _dumpProgress;
   ImmediateProcessExit _processExit;
   LoopHostSignals _hostSignals;

@@ -6,7 +6,7 @@
 
 #include "platform/linux/config/text_file.h"
 #include "platform/linux/host_identity/os_release.h"
-#include "platform/linux/host_identity/property_list.h"
+#include "platform/linux/property_list/property_list_strings.h"
 
 namespace zal {
 

@@ -1,7 +1,6 @@
 #include "platform/linux/ping/linux_ping_test.h"
 
 #include <fcntl.h>
-#include <unistd.h>
 
 #include <algorithm>
 #include <cerrno>
@@ -10,6 +9,7 @@
 
 #include <asio/post.hpp>
 
+#include "platform/linux/files/whole_file.h"
 #include "platform/linux/ipc/descriptor.h"
 #include "platform/linux/ping/ping_attempt.h"
 
@@ -20,16 +20,6 @@ std::chrono::nanoseconds durationOf(double seconds) {
   if (!(seconds > 0)) return std::chrono::nanoseconds{0};
   return std::chrono::duration_cast<std::chrono::nanoseconds>(
       std::chrono::duration<double>(std::min(seconds, LinuxPingTest::kLongestSeconds)));
-}
-
-bool writeWhole(int file, std::string_view text) {
-  while (!text.empty()) {
-    const ssize_t written = ::write(file, text.data(), text.size());
-    if (written < 0 && errno == EINTR) continue;
-    if (written < 0) return false;
-    text.remove_prefix(static_cast<std::size_t>(written));
-  }
-  return true;
 }
 
 }  // namespace
@@ -65,7 +55,7 @@ bool LinuxPingTest::writeResultsToFile(const std::string& path, std::string& err
   constexpr mode_t kMode = 0644;
   const Descriptor file(
       ::open(path.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC, kMode));
-  if (file.isOpen() && writeWhole(file.get(), _report->text())) return true;
+  if (file.isOpen() && !writeWhole(file.get(), _report->text())) return true;
   error = std::generic_category().message(errno);
   return false;
 }

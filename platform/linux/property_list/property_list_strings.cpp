@@ -1,4 +1,4 @@
-#include "platform/linux/host_identity/property_list.h"
+#include "platform/linux/property_list/property_list_strings.h"
 
 #include <pugixml.hpp>
 
