@@ -12,8 +12,9 @@ class AgentLog;
 class FilePlacement;
 
 /// Brings files into a dump or session directory. Single files are hard-linked, so that they cost no
-/// space and still grow with their writer; whole directories are copied. Nothing is ever
-/// overwritten. Source paths may begin with "~". Any thread; keeps no state; may wait for a disk.
+/// space and still grow with their writer (copied where they lie on another file system); whole
+/// directories are copied. Nothing is ever overwritten. Source paths may begin with "~". Any thread;
+/// keeps no state; may wait for a disk.
 class FileCollector {
  public:
   /// The services and the roots are borrowed.
@@ -21,8 +22,8 @@ class FileCollector {
       : _files(files), _log(log), _roots(roots) {}
 
   /// Links the file, symbolic links followed, under its own name plus the suffix; missing parents
-  /// are made with mode 0777. Returned: whether it was linked. A missing source makes nothing; a
-  /// taken name, another file system or a refusal are not logged.
+  /// are made with mode 0777. Returned: whether it was placed. A missing source makes nothing; a
+  /// taken name or a refusal are not logged.
   bool LinkFileIntoDirectory(const std::string& source, const std::string& directory,
                              const std::string& suffix);
   /// Links every entry whose name begins with the prefix, hidden ones included, not what is below

@@ -19,6 +19,8 @@ class FilePlacement {
   /// nothing when no free name was found.
   [[nodiscard]] virtual std::optional<std::string> uniqueSavePath(const std::string& path) = 0;
   /// Hard link; an existing target is an error, never overwritten. Symbolic links are not followed.
+  /// Where the target lies on another file system, and only there, a file gets a copy with its mode
+  /// and times instead, which no longer grows with its writer; anything else is an error.
   virtual std::error_code link(const std::string& source, const std::string& target) = 0;
   /// Rename; across file systems a synced copy and then the removal, so that at every moment at
   /// least one whole file exists. An existing target is an error.

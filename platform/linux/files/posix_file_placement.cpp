@@ -22,6 +22,12 @@ std::string parentOf(const std::string& path) {
   return parent.empty() ? "." : parent;
 }
 
+/// Not through a link.
+bool isFile(const std::string& path) {
+  std::error_code error;
+  return std::filesystem::is_regular_file(std::filesystem::symlink_status(path, error));
+}
+
 void removeTree(const std::string& path) {
   std::error_code ignored;  // the error that led here is the one to report
   std::filesystem::remove_all(path, ignored);
@@ -75,7 +81,9 @@ std::optional<std::string> PosixFilePlacement::uniqueSavePath(const std::string&
 
 std::error_code PosixFilePlacement::link(const std::string& source, const std::string& target) {
   if (::linkat(AT_FDCWD, source.c_str(), AT_FDCWD, target.c_str(), 0) == 0) return {};
-  return lastSystemError();
+  const std::error_code error = lastSystemError();
+  if (error != std::errc::cross_device_link || !isFile(source)) return error;
+  return copyTree(source, target, {}).error;
 }
 
 std::error_code PosixFilePlacement::move(const std::string& source, const std::string& target) {

@@ -26,6 +26,15 @@ class PosixFilePlacementTest : public ::testing::Test {
     const auto path = files.uniqueSavePath(directory / name);
     return path ? path->substr(directory.path().size() + 1) : "(none)";
   }
+  void putLargeFile(const std::string& name) {
+    writeFile(directory / name, std::string(300'000, 'x'));
+    ::chmod((directory / name).c_str(), 0604);
+    setTime(directory / name, 1500000000, 7);
+  }
+  static void expectLargeFile(const std::string& path) {
+    EXPECT_EQ(readFile(path), std::string(300'000, 'x'));
+    EXPECT_EQ(modeAndTime(path), "604 1500000000000000007");
+  }
   TemporaryDirectory directory;
   PosixFilePlacement files{directory / "home", directory / "temporary"};
 };
@@ -57,12 +66,62 @@ TEST_F(PosixFilePlacementTest, ALinkToASymbolicLinkNamesTheSymbolicLink) {
   EXPECT_EQ(fs::hard_link_count(directory / "secret"), 1U);
 }
 
-TEST_F(PosixFilePlacementTest, ALinkOfNothingOrAcrossFileSystemsIsAnError) {
+TEST_F(PosixFilePlacementTest, ALinkOfNothingIsAnError) {
   EXPECT_EQ(files.link(directory / "a", directory / "b"), std::errc::no_such_file_or_directory);
-  const OtherFileSystem other;
-  if (other.path.empty()) GTEST_SKIP() << other.missing;
+}
+
+TEST_F(PosixFilePlacementTest, ALinkThatTheKernelRefusesForAnotherReasonIsNoCopy) {
+  fs::create_directory(directory / "dir");
+  EXPECT_EQ(files.link(directory / "dir", directory / "dir2"), std::errc::operation_not_permitted);
   writeFile(directory / "a", "content");
-  EXPECT_EQ(files.link(directory / "a", other / "a"), std::errc::cross_device_link);
+  EXPECT_EQ(files.link(directory / "a", directory / "missing/b"), std::errc::no_such_file_or_directory);
+  EXPECT_EQ(listTree(directory.path()), "a\ndir/\n");
+}
+
+class LinkAcrossFileSystemsTest : public PosixFilePlacementTest {
+ protected:
+  void SetUp() override {
+    if (other.path.empty()) GTEST_SKIP() << other.missing;
+  }
+  OtherFileSystem other;
+};
+
+TEST_F(LinkAcrossFileSystemsTest, AFileGetsACopyWithItsModeAndTimes) {
+  putLargeFile("a");
+  const auto error = files.link(directory / "a", other / "b");
+  EXPECT_FALSE(error) << error.message();
+  expectLargeFile(other / "b");
+  expectLargeFile(directory / "a");
+  EXPECT_EQ(listTree(other.path), "b\n");
+}
+
+TEST_F(LinkAcrossFileSystemsTest, NothingIsOverwrittenOrFollowed) {
+  writeFile(directory / "a", "new");
+  writeFile(other / "taken", "old");
+  fs::create_symlink("elsewhere", other / "dangling");
+  EXPECT_EQ(files.link(directory / "a", other / "taken"), std::errc::file_exists);
+  EXPECT_EQ(files.link(directory / "a", other / "dangling"), std::errc::file_exists);
+  EXPECT_EQ(readFile(other / "taken"), "old");
+  EXPECT_EQ(listTree(other.path), "dangling\ntaken\n");
+}
+
+TEST_F(LinkAcrossFileSystemsTest, WhatIsNoFileIsNotCopied) {
+  writeFile(directory / "dir/below", "content");
+  fs::create_symlink("dir/below", directory / "link");
+  makeNamedPipe(directory / "pipe");
+  EXPECT_TRUE(files.link(directory / "dir", other / "dir"));
+  EXPECT_EQ(files.link(directory / "link", other / "link"), std::errc::cross_device_link);
+  EXPECT_EQ(files.link(directory / "pipe", other / "pipe"), std::errc::cross_device_link);
+  EXPECT_EQ(files.link(directory / "missing", other / "missing"), std::errc::no_such_file_or_directory);
+  EXPECT_EQ(listTree(other.path), "");
+}
+
+TEST_F(LinkAcrossFileSystemsTest, ACopyThatDoesNotFitLeavesNoRemains) {
+  const TinyFileSystem tiny(directory / "tiny");
+  if (!tiny.missing.empty()) GTEST_SKIP() << tiny.missing;
+  writeFile(directory / "a", std::string(200'000, 'x'));
+  EXPECT_EQ(files.link(directory / "a", directory / "tiny/a"), std::errc::no_space_on_device);
+  EXPECT_EQ(listTree(directory.path()), "a\ntiny/\n");
 }
 
 // Moves
@@ -121,14 +180,10 @@ class MoveAcrossFileSystemsTest : public PosixFilePlacementTest {
 };
 
 TEST_F(MoveAcrossFileSystemsTest, AFileArrivesWholeWithModeAndTime) {
-  const std::string content(300'000, 'x');
-  writeFile(directory / "a", content);
-  ::chmod((directory / "a").c_str(), 0604);
-  setTime(directory / "a", 1500000000, 7);
+  putLargeFile("a");
   const auto error = files.move(directory / "a", other / "b");
   EXPECT_FALSE(error) << error.message();
-  EXPECT_EQ(readFile(other / "b"), content);
-  EXPECT_EQ(modeAndTime(other / "b"), "604 1500000000000000007");
+  expectLargeFile(other / "b");
   EXPECT_EQ(listTree(directory.path()), "");
   EXPECT_EQ(listTree(other.path), "b\n");
 }
