@@ -37,6 +37,30 @@ TEST(ManualRunLoopTest, ARepeatingTimerMayCancelItself) {
   EXPECT_EQ(beats, 2);
 }
 
+TEST(ManualRunLoopTest, AMomentPutTogetherAgainIsTheSame) {
+  ManualRunLoop loop;
+  for (const auto offset : {0h, 2h, -11h}) {
+    loop.zoneOffset = offset;
+    const WallTime moment{1714651387251ms};
+    EXPECT_EQ(loop.momentOf(loop.localTime(moment)), moment);
+  }
+}
+
+TEST(ManualRunLoopTest, TheLocalTimeIsTwoHoursAheadUnlessATestSetsAnother) {
+  ManualRunLoop loop;
+  EXPECT_EQ(loop.momentOf({2024, 5, 2, 14, 3, 7, 251}), WallTime{1714651387251ms});
+  loop.zoneOffset = -5h;
+  EXPECT_EQ(loop.momentOf({2024, 5, 2, 7, 3, 7, 251}), WallTime{1714651387251ms});
+}
+
+TEST(ManualRunLoopTest, ThereIsNoMomentForAnImpossibleDateOrTime) {
+  const ManualRunLoop loop;
+  for (const LocalTime& time : {LocalTime{2023, 2, 29, 12, 0, 0, 0}, LocalTime{2024, 13, 1, 12, 0, 0, 0},
+                                LocalTime{2024, 1, 1, 24, 0, 0, 0}, LocalTime{2024, 1, 1, 12, 60, 0, 0}}) {
+    EXPECT_EQ(loop.momentOf(time), std::nullopt);
+  }
+}
+
 TEST(ManualWorkQueuesTest, TheTestChoosesWhichQueueRunsNext) {
   ManualRunLoop loop;
   ManualWorkQueues queues(loop);

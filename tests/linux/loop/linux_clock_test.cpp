@@ -4,6 +4,7 @@
 #include <time.h>
 
 #include <clocale>
+#include <cstdint>
 #include <cstdlib>
 #include <string>
 #include <thread>
@@ -82,6 +83,48 @@ TEST_F(LinuxClockTest, EveryThreadGetsTheSameAnswer) {
   std::string here = text(clock.localTime(WallTime{0us})), there;
   std::jthread([&] { there = text(clock.localTime(WallTime{0us})); }).join();
   EXPECT_EQ(here, there);
+}
+
+TEST_F(LinuxClockTest, AMomentPutTogetherAgainIsTheSame) {
+  const LinuxClock clock = inZone("CET-1CEST,M3.5.0,M10.5.0/3");
+  // Winter, summer, the seconds around both changes of 2024, before 1970, and four digits of years.
+  for (const std::int64_t second :
+       {1704067200LL, 1714651387LL, 1711846799LL, 1711846800LL, 1729987199LL, 1729994400LL, -1LL, 0LL,
+        -86400LL * 365 * 100, 253402214400LL, -62135510400LL}) {
+    const WallTime moment{std::chrono::seconds{second} + 251ms};
+    EXPECT_EQ(clock.momentOf(clock.localTime(moment)), moment) << second;
+  }
+}
+
+TEST_F(LinuxClockTest, TheZoneOfADateDecidesNotThatOfToday) {
+  const LinuxClock clock = inZone("CET-1CEST,M3.5.0,M10.5.0/3");
+  EXPECT_EQ(clock.momentOf({2024, 1, 15, 12, 0, 0, 0}), WallTime{1705316400s});  // 11:00 UTC
+  EXPECT_EQ(clock.momentOf({2024, 7, 15, 12, 0, 0, 0}), WallTime{1721037600s});  // 10:00 UTC
+}
+
+TEST_F(LinuxClockTest, ASkippedOrRepeatedTimeIsOneOfTheMomentsAroundIt) {
+  const LinuxClock clock = inZone("CET-1CEST,M3.5.0,M10.5.0/3");
+  const auto skipped = clock.momentOf({2024, 3, 31, 2, 30, 0, 0});
+  EXPECT_TRUE(skipped == WallTime{1711845000s} || skipped == WallTime{1711848600s});  // 01:30, 03:30
+  const auto repeated = clock.momentOf({2024, 10, 27, 2, 30, 0, 0});
+  EXPECT_TRUE(repeated == WallTime{1729989000s} || repeated == WallTime{1729992600s});
+}
+
+TEST_F(LinuxClockTest, ThereIsNoMomentForAnImpossibleDateOrTime) {
+  const LinuxClock clock = inZone("CET-1CEST,M3.5.0,M10.5.0/3");
+  for (const LocalTime& time : {LocalTime{2023, 2, 29, 12, 0, 0, 0}, LocalTime{2024, 4, 31, 12, 0, 0, 0},
+                                LocalTime{2024, 13, 1, 12, 0, 0, 0}, LocalTime{2024, 0, 1, 12, 0, 0, 0},
+                                LocalTime{2024, 1, 0, 12, 0, 0, 0}, LocalTime{2024, 1, 1, 24, 0, 0, 0},
+                                LocalTime{2024, 1, 1, 12, 60, 0, 0}, LocalTime{2024, 1, 1, 12, 0, 61, 0},
+                                LocalTime{2024, 1, 1, -1, 0, 0, 0}}) {
+    EXPECT_EQ(clock.momentOf(time), std::nullopt) << text(time);
+  }
+  EXPECT_TRUE(clock.momentOf({2024, 2, 29, 23, 59, 60, 0}));  // a leap second may be written down
+}
+
+TEST_F(LinuxClockTest, TheLastSecondBefore1970IsAMomentLikeAnyOther) {
+  const LinuxClock clock = inZone("UTC0");
+  EXPECT_EQ(clock.momentOf({1969, 12, 31, 23, 59, 59, 0}), WallTime{-1s});
 }
 
 TEST_F(LinuxClockTest, NamesTheZoneAsItIsNow) {
