@@ -1,5 +1,8 @@
 #include "platform/linux/config/configuration_keys.h"
 
+#include <arpa/inet.h>
+
+#include <algorithm>
 #include <cmath>
 #include <limits>
 #include <utility>
@@ -23,6 +26,42 @@ std::string takePathInto(const toml::node& value, const std::string& home, std::
   return {};
 }
 
+bool consistsOf(std::string_view text, std::string_view punctuation) {
+  return std::all_of(text.begin(), text.end(), [&](char c) {
+    return (c >= '0' && c <= '9') || (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z') ||
+           punctuation.find(c) != std::string_view::npos;
+  });
+}
+
+// What is wrong with a text, else "". They end up in command lines, so nothing there may be more than a name.
+
+std::string faultOfHost(const std::string& text) {
+  constexpr std::size_t kLongestHostName = 253;
+  if (consistsOf(text, ".:_-") && !text.starts_with('-') && text.size() <= kLongestHostName) return {};
+  return "wants a host name or an address";
+}
+
+std::string faultOfIpv4Address(const std::string& text) {
+  in_addr address{};
+  if (text.empty() || ::inet_pton(AF_INET, text.c_str(), &address) == 1) return {};
+  return "wants an IPv4 address";
+}
+
+/// The kernel knows a program by the first 15 bytes of its name only, and it is by name that this one
+/// is ended.
+std::string faultOfProgramName(const std::string& text) {
+  constexpr std::size_t kLongestProcessName = 15;
+  const bool isPlain = consistsOf(text, "._+-") && !text.starts_with('-') && !text.starts_with('.');
+  if (!text.empty() && isPlain && text.size() <= kLongestProcessName) return {};
+  return "wants a program's name of 1 to 15 letters, digits and . _ + -";
+}
+
+std::string faultOfFileName(const std::string& text) {
+  const bool isPlain = text != "." && text != ".." && text.find('/') == std::string::npos &&
+                       text.find('\0') == std::string::npos;
+  return isPlain ? std::string() : "wants a plain file name";
+}
+
 template <auto Root>
 std::string takeRoot(const toml::node& value, const std::string& home, Configuration& configuration) {
   return takePathInto(value, home, configuration.roots.*Root);
@@ -38,6 +77,53 @@ std::string takeText(const toml::node& value, const std::string& /*home*/, Confi
   const auto text = value.value_exact<std::string>();
   if (!text) return "wants a text in quotes";
   configuration.*Section.*Field = *text;
+  return {};
+}
+
+/// A text that the check finds no fault with.
+template <auto Section, auto Field, std::string (*FaultOf)(const std::string&)>
+std::string takeChecked(const toml::node& value, const std::string& /*home*/, Configuration& configuration) {
+  const auto text = value.value_exact<std::string>();
+  if (!text) return "wants a text in quotes";
+  std::string fault = FaultOf(*text);
+  if (fault.empty()) configuration.*Section.*Field = *text;
+  return fault;
+}
+
+template <auto Section, auto Field>
+std::string takePathOf(const toml::node& value, const std::string& home, Configuration& configuration) {
+  return takePathInto(value, home, configuration.*Section.*Field);
+}
+
+/// One of two words.
+template <class Target>
+std::string takeWord(const toml::node& value, const std::pair<std::string_view, Target>& first,
+                     const std::pair<std::string_view, Target>& second, Target& target) {
+  const auto text = value.value_exact<std::string>();
+  for (const auto& [word, meaning] : {first, second}) {
+    if (text != word) continue;
+    target = meaning;
+    return {};
+  }
+  return "wants \"" + std::string(first.first) + "\" or \"" + std::string(second.first) + "\"";
+}
+
+std::string takeProfile(const toml::node& value, const std::string& /*home*/, Configuration& configuration) {
+  return takeWord<CommandProfile>(value, {"linux", CommandProfile::linux},
+                                  {"literal", CommandProfile::literal}, configuration.commands.profile);
+}
+
+std::string takeCompression(const toml::node& value, const std::string& /*home*/,
+                            Configuration& configuration) {
+  return takeWord<ArchiveCompression>(value, {"small", ArchiveCompression::small},
+                                      {"fast", ArchiveCompression::fast}, configuration.archiveCompression);
+}
+
+std::string takeInternalInstall(const toml::node& value, const std::string& /*home*/,
+                                Configuration& configuration) {
+  const auto flag = value.value_exact<bool>();
+  if (!flag) return "wants true or false";
+  configuration.internalInstall = *flag;
   return {};
 }
 
@@ -90,6 +176,8 @@ constexpr ConfigurationKey kKeys[] = {
     {"roots", "SystemLogRoot", takeRoot<&DirectoryRoots::SystemLogRoot>},
     {"roots", "SystemReportRoot", takeRoot<&DirectoryRoots::SystemReportRoot>},
     {"roots", "NetworkConfigRoot", takeRoot<&DirectoryRoots::NetworkConfigRoot>},
+    {"roots", "MediaLogCacheDir", takeRoot<&DirectoryRoots::MediaLogCacheDir>},
+    {"roots", "LocationCacheDir", takeRoot<&DirectoryRoots::LocationCacheDir>},
     {"roots", "TemporaryRoot", takeRoot<&DirectoryRoots::TemporaryRoot>},
     {"roots", "UartLogFile", takeRoot<&DirectoryRoots::UartLogFile>},
     {"roots", "VarLogRoot", takeRoot<&DirectoryRoots::VarLogRoot>},
@@ -97,6 +185,17 @@ constexpr ConfigurationKey kKeys[] = {
     {"endpoints", "reportHost", takeText<&Configuration::endpoints, &Endpoints::reportServer>},
     {"endpoints", "cellPingServer", takeText<&Configuration::endpoints, &Endpoints::cellPingServer>},
     {"endpoints", "wifiPingServer", takeText<&Configuration::endpoints, &Endpoints::wifiPingServer>},
+    {"endpoints", "makerWebHost",
+     takeChecked<&Configuration::endpoints, &Endpoints::makerWebHost, faultOfHost>},
+    {"endpoints", "searchWebHost",
+     takeChecked<&Configuration::endpoints, &Endpoints::searchWebHost, faultOfHost>},
+    {"endpoints", "farsite", takeChecked<&Configuration::endpoints, &Endpoints::farsite, faultOfIpv4Address>},
+    {"endpoints", "pushCourierHost1",
+     takeChecked<&Configuration::endpoints, &Endpoints::pushCourierHost1, faultOfHost>},
+    {"endpoints", "pushCourierHost2",
+     takeChecked<&Configuration::endpoints, &Endpoints::pushCourierHost2, faultOfHost>},
+    {"endpoints", "pushCourierHost6",
+     takeChecked<&Configuration::endpoints, &Endpoints::pushCourierHost6, faultOfHost>},
     {"interfaces", "wifi", takeText<&Configuration::interfaces, &Interfaces::wifi>},
     {"interfaces", "cellular", takeText<&Configuration::interfaces, &Interfaces::cellular>},
     {"ipc", "group", takeText<&Configuration::ipc, &IpcSettings::group>},
@@ -107,7 +206,23 @@ constexpr ConfigurationKey kKeys[] = {
     {"log", "categories", takeCategories},
     {"log", "rotationSize", takeCount<&Configuration::log, &LogSettings::rotationSize, 1024, kLargestBlock>},
     {"log", "maximumOpenFiles", takeCount<&Configuration::log, &LogSettings::maximumOpenFiles, 1, 65536>},
+    {"commands", "profile", takeProfile},
+    {"commands", "systemLogReader",
+     takeChecked<&Configuration::commands, &CommandSettings::systemLogReader, faultOfProgramName>},
+    {"commands", "toolDirectory", takePathOf<&Configuration::commands, &CommandSettings::toolDirectory>},
+    {"collection", "cloudSyncLog",
+     takeChecked<&Configuration::collection, &CollectionSettings::cloudSyncLog, faultOfFileName>},
+    {"collection", "pairedDeviceLog1",
+     takePathOf<&Configuration::collection, &CollectionSettings::pairedDeviceLog1>},
+    {"collection", "pairedDeviceLog2",
+     takePathOf<&Configuration::collection, &CollectionSettings::pairedDeviceLog2>},
+    {"collection", "pairedDeviceDirectory",
+     takePathOf<&Configuration::collection, &CollectionSettings::pairedDeviceDirectory>},
+    {"collection", "pushLogDirectory",
+     takePathOf<&Configuration::collection, &CollectionSettings::pushLogDirectory>},
+    {"archive", "compression", takeCompression},
     {"device", "SystemVersionFile", takePath<&Configuration::systemVersionFile>},
+    {"device", "internalInstall", takeInternalInstall},
     {"testing", "inactivityLimit", takeDuration<&Configuration::inactivityLimit>},
     {"testing", "closingStageDelay", takeDuration<&Configuration::closingStageDelay>},
 };
@@ -115,5 +230,16 @@ constexpr ConfigurationKey kKeys[] = {
 }  // namespace
 
 std::span<const ConfigurationKey> configurationKeys() { return kKeys; }
+
+bool isOpenSection(std::string_view section) { return section == "commands"; }
+
+std::string takeOpenKey(std::string_view key, const toml::node& value, Configuration& configuration) {
+  const auto text = value.value_exact<std::string>();
+  if (value.is_table()) return "wants its dots inside quotes: \"" + std::string(key) + "...\"";
+  if (!text) return "wants a text in quotes";
+  if (text->find('\0') != std::string::npos) return "has a NUL character in its text";
+  configuration.commands.rows[std::string(key)] = *text;
+  return {};
+}
 
 }  // namespace zal

@@ -24,4 +24,11 @@ struct ConfigurationKey {
 /// All keys there are, by section.
 [[nodiscard]] std::span<const ConfigurationKey> configurationKeys();
 
+/// Whether the section takes keys that are not among these: rows of `[commands]`, whose ids are their
+/// table's own.
+[[nodiscard]] bool isOpenSection(std::string_view section);
+/// Takes such a key's value. Returned: what is wrong with it, else "".
+[[nodiscard]] std::string takeOpenKey(std::string_view key, const toml::node& value,
+                                      Configuration& configuration);
+
 }  // namespace zal

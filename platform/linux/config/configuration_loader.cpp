@@ -52,11 +52,13 @@ class Reader {
         return candidate.section == section && candidate.name == keyName;
       });
       const std::string label = std::string(section) + "." + std::string(keyName);
-      if (key == keys.end()) {
+      const bool isOpen = key == keys.end() && isOpenSection(section);
+      if (key == keys.end() && !isOpen) {
         _warn(name.source().begin.line, "unknown key " + label);
         continue;
       }
-      const std::string complaint = key->take(node, _home, _result.configuration);
+      const std::string complaint = isOpen ? takeOpenKey(keyName, node, _result.configuration)
+                                           : key->take(node, _home, _result.configuration);
       if (!complaint.empty()) _warn(name.source().begin.line, label + " " + complaint);
     }
   }
@@ -86,6 +88,7 @@ void addCategories(std::string_view list, std::vector<std::string>& categories) 
 LoadedConfiguration ConfigurationLoader::load() const {
   LoadedConfiguration result;
   result.configuration.roots = defaultDirectoryRoots(_environment);
+  result.configuration.commands.toolDirectory = _environment.executableDirectory;
   _readFile(result);
   fillDependentRoots(result.configuration.roots);
   addCategories(_environment.variable("LIRRA_LOG_CATEGORIES"), result.configuration.log.categories);

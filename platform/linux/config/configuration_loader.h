@@ -22,7 +22,7 @@ class ConfigurationLoader {
  public:
   explicit ConfigurationLoader(HostEnvironment environment) : _environment(std::move(environment)) {}
   [[nodiscard]] LoadedConfiguration load() const;
-  /// Every key that load() understands, as "section.key".
+  /// Every key that load() understands, as "section.key"; `[commands]` takes others too.
   [[nodiscard]] static std::vector<std::string> knownKeys();
 
  private:

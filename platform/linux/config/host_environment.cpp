@@ -4,6 +4,8 @@
 #include <unistd.h>
 
 #include <array>
+#include <filesystem>
+#include <system_error>
 
 #include "platform/linux/config/path_text.h"
 
@@ -34,6 +36,9 @@ HostEnvironment HostEnvironment::ofThisProcess() {
   if (environment.homeDirectory.empty()) {
     environment.homeDirectory = homeFromUserDatabase(environment.userId);
   }
+  std::error_code unknown;  // no process file system
+  const auto program = std::filesystem::read_symlink("/proc/self/exe", unknown);
+  if (!unknown) environment.executableDirectory = parentDirectory(program.string());
   return environment;
 }
 

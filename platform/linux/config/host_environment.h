@@ -14,8 +14,10 @@ struct HostEnvironment {
   std::map<std::string, std::string, std::less<>> variables;
   uid_t userId = 0;  ///< effective; 0 makes a system agent
   std::string homeDirectory;
+  std::string executableDirectory = {};  ///< of the running program; empty: nobody knows
 
-  /// Reads environment, user and home directory (`HOME`, else the user database, else "/").
+  /// Reads environment, user and home directory (`HOME`, else the user database, else "/"), and where
+  /// the program lies.
   [[nodiscard]] static HostEnvironment ofThisProcess();
 
   [[nodiscard]] bool isSystem() const { return userId == 0; }

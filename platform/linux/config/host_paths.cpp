@@ -82,6 +82,10 @@ DirectoryRoots defaultDirectoryRoots(const HostEnvironment& environment) {
   roots.RootReportRoot = system ? "/var/crash" : below(state, "Root/DiagnosticReports");
   roots.SystemLogRoot = system ? "/var/log" : below(state, "System/Logs");
   roots.NetworkConfigRoot = system ? "/etc/network" : below(state, "NetworkConfiguration");
+  const std::string caches =
+      system ? "/var/cache/lirra" : userDirectory(environment, "XDG_CACHE_HOME", ".cache");
+  roots.MediaLogCacheDir = below(caches, "Media");
+  roots.LocationCacheDir = below(caches, "Location");
   roots.RuntimeRoot = runtimeRoot(environment);
   return roots;
 }

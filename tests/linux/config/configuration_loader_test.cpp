@@ -75,6 +75,8 @@ RootReportRoot = "/r/root"
 SystemLogRoot = "/r/system"
 SystemReportRoot = "/r/systemreports"
 NetworkConfigRoot = "/r/network"
+MediaLogCacheDir = "/r/media"
+LocationCacheDir = "/r/location"
 TemporaryRoot = "/r/tmp"
 UartLogFile = "/r/uart.log"
 VarLogRoot = "/r/varlog"
@@ -83,6 +85,12 @@ RuntimeRoot = "/r/run"
 reportHost = "report.example"
 cellPingServer = "192.0.2.1"
 wifiPingServer = "192.0.2.2"
+makerWebHost = "www.maker.example"
+searchWebHost = "search_1.example"
+farsite = "192.0.2.3"
+pushCourierHost1 = "1-courier.push.example"
+pushCourierHost2 = "192.0.2.4"
+pushCourierHost6 = "2001:db8::6"
 [interfaces]
 wifi = "wlp3s0"
 cellular = "wwp0"
@@ -94,8 +102,23 @@ maximumReplyBacklog = 4096
 categories = ["IPC", "Ping"]
 rotationSize = 1024
 maximumOpenFiles = 2
+[commands]
+profile = "literal"
+systemLogReader = "log-reader_1.0+"
+toolDirectory = "~/tools/"
+"network.console.lsof" = "lsof -n"
+plain = ""
+[collection]
+cloudSyncLog = "Cloud Sync.log"
+pairedDeviceLog1 = "/r/paired1"
+pairedDeviceLog2 = "/r/paired2"
+pairedDeviceDirectory = "~/paired"
+pushLogDirectory = "/r/push/"
+[archive]
+compression = "small"
 [device]
 SystemVersionFile = "/r/version.plist"
+internalInstall = true
 [testing]
 inactivityLimit = 1.5
 closingStageDelay = 0.25
@@ -111,6 +134,8 @@ closingStageDelay = 0.25
   EXPECT_EQ(c.roots.SystemLogRoot, "/r/system");
   EXPECT_EQ(c.roots.SystemReportRoot, "/r/systemreports");
   EXPECT_EQ(c.roots.NetworkConfigRoot, "/r/network");
+  EXPECT_EQ(c.roots.MediaLogCacheDir, "/r/media");
+  EXPECT_EQ(c.roots.LocationCacheDir, "/r/location");
   EXPECT_EQ(c.roots.TemporaryRoot, "/r/tmp");
   EXPECT_EQ(c.roots.UartLogFile, "/r/uart.log");
   EXPECT_EQ(c.roots.VarLogRoot, "/r/varlog");
@@ -118,6 +143,12 @@ closingStageDelay = 0.25
   EXPECT_EQ(c.endpoints.reportServer, "report.example");
   EXPECT_EQ(c.endpoints.cellPingServer, "192.0.2.1");
   EXPECT_EQ(c.endpoints.wifiPingServer, "192.0.2.2");
+  EXPECT_EQ(c.endpoints.makerWebHost, "www.maker.example");
+  EXPECT_EQ(c.endpoints.searchWebHost, "search_1.example");
+  EXPECT_EQ(c.endpoints.farsite, "192.0.2.3");
+  EXPECT_EQ(c.endpoints.pushCourierHost1, "1-courier.push.example");
+  EXPECT_EQ(c.endpoints.pushCourierHost2, "192.0.2.4");
+  EXPECT_EQ(c.endpoints.pushCourierHost6, "2001:db8::6");
   EXPECT_EQ(c.interfaces.wifi, "wlp3s0");
   EXPECT_EQ(c.interfaces.cellular, "wwp0");
   EXPECT_EQ(c.ipc.group, "calls");
@@ -126,9 +157,103 @@ closingStageDelay = 0.25
   EXPECT_THAT(c.log.categories, ElementsAre("IPC", "Ping"));
   EXPECT_EQ(c.log.rotationSize, 1024U);
   EXPECT_EQ(c.log.maximumOpenFiles, 2U);
+  EXPECT_EQ(c.commands.profile, CommandProfile::literal);
+  EXPECT_EQ(c.commands.systemLogReader, "log-reader_1.0+");
+  EXPECT_EQ(c.commands.toolDirectory, "/home/ann/tools");
+  EXPECT_EQ(c.commands.rows,
+            (std::map<std::string, std::string>{{"network.console.lsof", "lsof -n"}, {"plain", ""}}));
+  EXPECT_EQ(c.collection.cloudSyncLog, "Cloud Sync.log");
+  EXPECT_EQ(c.collection.pairedDeviceLog1, "/r/paired1");
+  EXPECT_EQ(c.collection.pairedDeviceLog2, "/r/paired2");
+  EXPECT_EQ(c.collection.pairedDeviceDirectory, "/home/ann/paired");
+  EXPECT_EQ(c.collection.pushLogDirectory, "/r/push");
+  EXPECT_EQ(c.archiveCompression, ArchiveCompression::small);
+  EXPECT_TRUE(c.internalInstall);
   EXPECT_EQ(c.systemVersionFile, "/r/version.plist");
   EXPECT_EQ(c.inactivityLimit, std::chrono::milliseconds{1500});
   EXPECT_EQ(c.closingStageDelay, std::chrono::milliseconds{250});
+}
+
+TEST_F(ConfigurationLoaderTest, WithoutAWordTheAgentTalksToNobodyAndRunsWhatLinuxHas) {
+  environment.executableDirectory = "/usr/libexec/lirra";
+  const auto c = load("").configuration;
+  for (const std::string& host :
+       {c.endpoints.makerWebHost, c.endpoints.searchWebHost, c.endpoints.farsite,
+        c.endpoints.pushCourierHost1, c.endpoints.pushCourierHost2, c.endpoints.pushCourierHost6}) {
+    EXPECT_EQ(host, "");
+  }
+  EXPECT_EQ(c.commands.profile, CommandProfile::linux);
+  EXPECT_EQ(c.commands.systemLogReader, "tessel");
+  EXPECT_EQ(c.commands.toolDirectory, "/usr/libexec/lirra");
+  EXPECT_THAT(c.commands.rows, IsEmpty());
+  EXPECT_EQ(c.collection.cloudSyncLog, "");
+  EXPECT_EQ(c.archiveCompression, Configuration().archiveCompression);
+  EXPECT_FALSE(c.internalInstall);
+}
+
+TEST_F(ConfigurationLoaderTest, TextsThatCommandLinesTakeMayBeNothingButNames) {
+  const auto loaded = load(R"toml([endpoints]
+makerWebHost = "www.example; touch X"
+searchWebHost = "-n"
+farsite = "::1"
+pushCourierHost1 = "$(id)"
+pushCourierHost2 = 4
+[commands]
+systemLogReader = "a-name-of-16-byt"
+)toml");
+  EXPECT_THAT(loaded.warnings,
+              ElementsAre(file + ":2: endpoints.makerWebHost wants a host name or an address",
+                          file + ":3: endpoints.searchWebHost wants a host name or an address",
+                          file + ":4: endpoints.farsite wants an IPv4 address",
+                          file + ":5: endpoints.pushCourierHost1 wants a host name or an address",
+                          file + ":6: endpoints.pushCourierHost2 wants a text in quotes",
+                          file + ":8: commands.systemLogReader wants a program's name of 1 to 15 letters, "
+                                 "digits and . _ + -"));
+  EXPECT_EQ(loaded.configuration.commands.systemLogReader, "tessel");
+  EXPECT_EQ(loaded.configuration.endpoints.makerWebHost, "");
+}
+
+TEST_F(ConfigurationLoaderTest, TheLogReadersNameIsWhatTheKernelShows) {
+  const auto reader = [this](const std::string& name) {
+    return load("[commands]\nsystemLogReader = '" + name + "'\n").configuration.commands.systemLogReader;
+  };
+  EXPECT_EQ(reader("fifteen-bytes-1"), "fifteen-bytes-1");
+  for (const char* const name : {"", "sixteen-bytes-12", "/usr/bin/reader", "a b", "-9", ".x", "a'b"}) {
+    EXPECT_EQ(reader(name), "tessel") << name;
+  }
+}
+
+TEST_F(ConfigurationLoaderTest, AHostMayBeTakenBackToNone) {
+  const auto loaded = load("[endpoints]\nfarsite = \"\"\nmakerWebHost = \"\"\n");
+  EXPECT_THAT(loaded.warnings, IsEmpty());
+}
+
+TEST_F(ConfigurationLoaderTest, WrongWordsOfTheDumpsSectionsAreNamed) {
+  const auto loaded = load(R"([commands]
+profile = "bsd"
+toolDirectory = "tools"
+network.console = "x"
+"network.power" = 3
+[collection]
+cloudSyncLog = "../x"
+pairedDeviceLog1 = "x"
+surprise = "x"
+[archive]
+compression = "tiny"
+[device]
+internalInstall = "yes"
+)");
+  EXPECT_THAT(loaded.warnings,
+              ElementsAre(file + ":2: commands.profile wants \"linux\" or \"literal\"",
+                          file + ":3: commands.toolDirectory must be an absolute path, not \"tools\"",
+                          file + ":4: commands.network wants its dots inside quotes: \"network...\"",
+                          file + ":5: commands.network.power wants a text in quotes",
+                          file + ":7: collection.cloudSyncLog wants a plain file name",
+                          file + ":8: collection.pairedDeviceLog1 must be an absolute path, not \"x\"",
+                          file + ":9: unknown key collection.surprise",
+                          file + ":11: archive.compression wants \"small\" or \"fast\"",
+                          file + ":13: device.internalInstall wants true or false"));
+  EXPECT_THAT(loaded.configuration.commands.rows, IsEmpty());
 }
 
 TEST_F(ConfigurationLoaderTest, UnknownKeysAndWrongTypesAreNamedByLineAndTheOthersStand) {

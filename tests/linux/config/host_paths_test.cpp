@@ -80,8 +80,8 @@ std::string table(DirectoryRoots roots) {
   return roots.UserLogRoot + '\n' + roots.MobileLogRoot + '\n' + roots.DiagnosticReportRoot + '\n' +
          roots.WirelessLogRoot + '\n' + roots.WirelessReportRoot + '\n' + roots.RootReportRoot + '\n' +
          roots.SystemLogRoot + '\n' + roots.SystemReportRoot + '\n' + roots.NetworkConfigRoot + '\n' +
-         roots.TemporaryRoot + '\n' + roots.UartLogFile + '\n' + roots.VarLogRoot + '\n' + roots.RuntimeRoot +
-         '\n';
+         roots.MediaLogCacheDir + '\n' + roots.LocationCacheDir + '\n' + roots.TemporaryRoot + '\n' +
+         roots.UartLogFile + '\n' + roots.VarLogRoot + '\n' + roots.RuntimeRoot + '\n';
 }
 
 TEST(HostPathsTest, AUsersRootsLieBelowTheStateDirectory) {
@@ -94,6 +94,8 @@ TEST(HostPathsTest, AUsersRootsLieBelowTheStateDirectory) {
 /home/ann/.local/state/lirra/System/Logs
 /home/ann/.local/state/lirra/System/Logs/DiagnosticReports
 /home/ann/.local/state/lirra/NetworkConfiguration
+/home/ann/.cache/lirra/Media
+/home/ann/.cache/lirra/Location
 /tmp
 /dev/uart.log
 /var/log
@@ -101,12 +103,14 @@ TEST(HostPathsTest, AUsersRootsLieBelowTheStateDirectory) {
 )");
 }
 
-TEST(HostPathsTest, TheStateAndRuntimeVariablesMoveAUsersRoots) {
+TEST(HostPathsTest, TheStateCacheAndRuntimeVariablesMoveAUsersRoots) {
   auto environment = user();
   environment.variables["XDG_STATE_HOME"] = "/state";
   environment.variables["XDG_RUNTIME_DIR"] = "/run/user/1000";
+  environment.variables["XDG_CACHE_HOME"] = "/cache";
   const auto roots = defaultDirectoryRoots(environment);
   EXPECT_EQ(roots.UserLogRoot, "/state/lirra/Logs");
+  EXPECT_EQ(roots.MediaLogCacheDir, "/cache/lirra/Media");
   EXPECT_EQ(roots.RuntimeRoot, "/run/user/1000/lirra");
 }
 
@@ -120,6 +124,8 @@ TEST(HostPathsTest, ASystemAgentUsesTheSystemsDirectories) {
 /var/log
 /var/log/DiagnosticReports
 /etc/network
+/var/cache/lirra/Media
+/var/cache/lirra/Location
 /tmp
 /dev/uart.log
 /var/log
@@ -134,6 +140,7 @@ TEST(HostEnvironmentTest, ReadsThisProcess) {
   EXPECT_EQ(environment.variable("ZAL_ENVIRONMENT_TEST_NOT_SET"), "");
   EXPECT_EQ(environment.userId, ::geteuid());
   EXPECT_TRUE(environment.homeDirectory.starts_with('/'));
+  EXPECT_TRUE(std::filesystem::exists(environment.executableDirectory + "/linux_config_tests"));
   ::unsetenv("ZAL_ENVIRONMENT_TEST");
 }
 
