@@ -7,6 +7,9 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <cmath>
+#include <set>
+#include <sstream>
 #include <thread>
 
 #include "platform/linux/alerts/alert_file.h"
@@ -14,6 +17,7 @@
 #include "platform/linux/loop/linux_run_loop.h"
 #include "tests/linux/loop/run_until.h"
 #include "tests/support/fake_services.h"
+#include "tests/support/file_size_limit.h"
 #include "tests/support/temporary_directory.h"
 
 namespace zal {
@@ -419,17 +423,35 @@ TEST_F(RuntimeAlertStoreTest, WhereTheDirectoryCannotBeMadeThereIsOneWarningAndN
   EXPECT_EQ(states(), "1 waiting\n");
 }
 
-TEST_F(RuntimeAlertStoreTest, WhereARecordCannotBeWrittenTheWarningSaysWhichAlertNobodySees) {
+TEST_F(RuntimeAlertStoreTest, WhereARecordCannotBeWrittenOneWarningSaysWhichAlertNobodySees) {
+  {
+    const testing::FileSizeLimit full(0);
+    post(question("first"));
+    post(question("second"));
+    settle();
+  }
+  EXPECT_THAT(log.lines,
+              ElementsAre("warning: " + directory +
+                          "/1.toml: cannot be written: File too large; nobody sees the alert \"first\""));
+  EXPECT_EQ(testing::listTree(directory), "");
+  post(question("third"));
+  settle();
+  EXPECT_THAT(listAlerts(directory), SizeIs(1));
+  EXPECT_EQ(listAlerts(directory)[0].alert.title, "third");
+}
+
+TEST_F(RuntimeAlertStoreTest, AnAnswerIsTakenWhereTheRecordCannotTellOfIt) {
   post(question());
   settle();
   log.lines.clear();
-  // A directory takes no name that is too long: the file system's own refusal, for the superuser too.
-  const std::string deep = root / std::string(4000, 'x');
-  RuntimeAlertStore nowhere(loop.context(), loop, clock, log, deep + "/alerts");
-  nowhere.post(question(), nullptr);
-  settle();
-  EXPECT_THAT(log.lines, SizeIs(1));
-  EXPECT_THAT(log.lines[0], ::testing::EndsWith("cannot be made: File name too long"));
+  EXPECT_EQ(answer("1", "default", "heard"), std::nullopt);
+  {
+    const testing::FileSizeLimit full(0);
+    runUntil([&] { return !given.empty(); });
+  }
+  EXPECT_THAT(given, ElementsAre(Given{0, "heard"}));
+  EXPECT_THAT(log.lines, ElementsAre("warning: " + directory + "/1.toml: cannot be written: File too large"));
+  EXPECT_EQ(testing::listTree(directory), "1.toml\n");
 }
 
 TEST_F(RuntimeAlertStoreTest, AnyThreadMayPost) {

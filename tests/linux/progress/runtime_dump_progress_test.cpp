@@ -13,6 +13,7 @@
 #include "platform/linux/loop/linux_clock.h"
 #include "platform/linux/progress/progress_file.h"
 #include "tests/support/fake_services.h"
+#include "tests/support/file_size_limit.h"
 #include "tests/support/manual_run_loop.h"
 #include "tests/support/temporary_directory.h"
 
@@ -170,6 +171,21 @@ TEST_F(RuntimeDumpProgressTest, WhereNothingCanBeWrittenOneWarningIsSaidAndNothi
   ASSERT_THAT(log.lines, SizeIs(1));
   EXPECT_THAT(log.lines[0], ::testing::StartsWith("warning: " + directory + "/1714651387251-000001-"));
   EXPECT_THAT(log.lines[0], ::testing::EndsWith(".progress: cannot be written: Not a directory"));
+}
+
+TEST_F(RuntimeDumpProgressTest, ALineThatAFullDiskCutsShortIsTakenBack) {
+  const auto progress = begin();
+  const std::string before = onlyText();
+  {
+    const testing::FileSizeLimit full(before.size() + 8);
+    progress->step(1);
+    progress->missing("what", "why");
+  }
+  EXPECT_EQ(onlyText(), before);
+  progress->done("/a.zip");
+  EXPECT_EQ(onlyText(), before + "OK 1714651387251 /a.zip\n");
+  ASSERT_THAT(log.lines, SizeIs(1));
+  EXPECT_THAT(log.lines[0], ::testing::EndsWith(".progress: cannot be written: File too large"));
 }
 
 TEST_F(RuntimeDumpProgressTest, ManyThreadsWriteWholeLines) {
