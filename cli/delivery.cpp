@@ -14,7 +14,11 @@ constexpr auto kLookAgain = 20ms;
 /// One request may be as large as the agent takes.
 constexpr std::size_t kQueueLimit = 32U << 20U;
 
-std::string seconds(double value) { return numberText(value) + " s"; }
+constexpr auto kConfirmation = 2s;
+
+std::string seconds(std::chrono::milliseconds value) {
+  return numberText(static_cast<double>(value.count()) / 1000) + " s";
+}
 
 }  // namespace
 
@@ -28,8 +32,7 @@ lirra::Client openClient(ToolContext& tool) {
 }
 
 lirra::Result confirm(ToolContext& tool, lirra::Client& client) {
-  const auto limit = std::chrono::milliseconds(static_cast<int>(tool.options.timeoutSeconds * 1000));
-  const auto deadline = tool.host.now() + limit;
+  const auto deadline = tool.host.now() + tool.options.timeout(kConfirmation);
   for (;;) {
     const auto left = std::chrono::ceil<std::chrono::milliseconds>(deadline - tool.host.now());
     const lirra::Result result = client.flush(static_cast<int>(left.count()));
@@ -60,7 +63,7 @@ ExitCode failToDeliver(ToolContext& tool, lirra::Result result, const lirra::Cli
       }
       return fail("the agent is not running: " + client.trouble(), startHint(tool));
     case LIRRA_TIMEOUT:
-      return fail("the agent did not confirm within " + seconds(tool.options.timeoutSeconds),
+      return fail("the agent did not confirm within " + seconds(tool.options.timeout(kConfirmation)),
                   "It may be busy: try a longer --timeout, and see what \"lirractl status\" says.");
     case LIRRA_LOST:
       return fail(

@@ -1,7 +1,9 @@
 #include "cli/host.h"
 
+#include <sys/ioctl.h>
 #include <unistd.h>
 
+#include <cstdio>
 #include <cstdlib>
 #include <filesystem>
 #include <optional>
@@ -10,17 +12,21 @@
 #include <thread>
 
 #include "platform/agent_log.h"
+#include "platform/linux/alerts/alert_file.h"
 #include "platform/linux/archive/zip_contents.h"
 #include "platform/linux/config/configuration_loader.h"
 #include "platform/linux/config/host_environment.h"
 #include "platform/linux/config/host_paths.h"
 #include "platform/linux/config/toml_preference_store.h"
+#include "platform/linux/loop/linux_clock.h"
 #include "platform/linux/notifications/notification_file.h"
+#include "platform/linux/progress/progress_file.h"
 
 namespace zal {
 namespace {
 
 constexpr std::string_view kDomain = "com.vendel.logging";
+constexpr std::size_t kUsualColumns = 80;
 
 /// What the preference store has to say is for the person at the terminal.
 class ToolLog final : public AgentLog {
@@ -60,6 +66,62 @@ class ZipReader final : public ArchiveReader {
   static std::string topOf(const std::string& name) { return name.substr(0, name.find('/') + 1); }
 };
 
+std::string timeText(const Clock& clock, WallTime moment) {
+  const LocalTime local = clock.localTime(moment);
+  char text[64];
+  std::snprintf(text, sizeof text, "%04d-%02d-%02d %02d:%02d:%02d", local.year, local.month, local.day,
+                local.hour, local.minute, local.second);
+  return text;
+}
+
+PostedAlert postedAlert(const AlertRecord& record, const Clock& clock) {
+  PostedAlert alert;
+  alert.id = record.id;
+  alert.title = record.alert.title;
+  alert.message = record.alert.message;
+  alert.buttons.push_back({"default", record.alert.defaultButton});
+  if (record.alert.alternateButton) alert.buttons.push_back({"alternate", *record.alert.alternateButton});
+  if (record.alert.otherButton) alert.buttons.push_back({"other", *record.alert.otherButton});
+  alert.takesText = record.alert.textField.has_value();
+  alert.posted = timeText(clock, record.posted);
+  alert.state = alertStateText(record.state);
+  if (record.answer) alert.answer = alertButtonName(record.answer->code);
+  return alert;
+}
+
+DumpView::State dumpState(DumpProgressRecord::State state) {
+  switch (state) {
+    case DumpProgressRecord::State::running:
+      return DumpView::State::running;
+    case DumpProgressRecord::State::done:
+      return DumpView::State::done;
+    case DumpProgressRecord::State::failed:
+      return DumpView::State::failed;
+    case DumpProgressRecord::State::cutOff:
+      return DumpView::State::cutOff;
+  }
+  return DumpView::State::cutOff;
+}
+
+DumpView dumpView(ListedDumpProgress listed) {
+  DumpProgressRecord& record = listed.record;
+  DumpView view;
+  view.name = std::move(listed.name);
+  view.service = std::move(record.service);
+  view.directory = std::move(record.directory);
+  for (DumpProgressRecord::Step& step : record.steps) {
+    DumpView::Step& shown = view.steps.emplace_back();
+    shown.name = std::move(step.name);
+    if (step.began) shown.began = std::chrono::floor<std::chrono::milliseconds>(*step.began - record.began);
+  }
+  view.currentStep = record.currentStep;
+  for (DumpProgressRecord::Missing& one : record.missing)
+    view.missing.push_back({std::move(one.what), std::move(one.why)});
+  view.state = dumpState(record.state);
+  view.reason = std::move(record.reason);
+  return view;
+}
+
 class ThisMachine final : public ToolHost {
  public:
   explicit ThisMachine(std::ostream& err)
@@ -85,12 +147,38 @@ class ThisMachine final : public ToolHost {
     return directory + ": " + error.message();
   }
   [[nodiscard]] ArchiveReader& archives() override { return _archives; }
+  [[nodiscard]] std::vector<PostedAlert> alerts() override {
+    std::vector<PostedAlert> result;
+    for (const AlertRecord& record : listAlerts(alertDirectory(settings().roots.RuntimeRoot)))
+      result.push_back(postedAlert(record, _clock));
+    return result;
+  }
+  [[nodiscard]] std::optional<std::string> answerAlert(const std::string& id, const std::string& button,
+                                                       const std::optional<std::string>& text) override {
+    return zal::answerAlert(alertDirectory(settings().roots.RuntimeRoot), id, button, text);
+  }
+  [[nodiscard]] std::vector<DumpView> dumps() override {
+    std::vector<DumpView> result;
+    for (ListedDumpProgress& listed : listDumpProgress(progressDirectory(settings().roots.RuntimeRoot)))
+      result.push_back(dumpView(std::move(listed)));
+    return result;
+  }
+  [[nodiscard]] bool isInteractive() const override {
+    return outputIsTerminal() && ::isatty(STDIN_FILENO) != 0;
+  }
+  [[nodiscard]] std::size_t redrawWidth() const override {
+    winsize size{};
+    if (!outputIsTerminal() || _environment.variable("TERM") == "dumb") return 0;
+    const bool known = ::ioctl(STDOUT_FILENO, TIOCGWINSZ, &size) == 0 && size.ws_col != 0;
+    return known ? size.ws_col : kUsualColumns;
+  }
   [[nodiscard]] bool outputIsTerminal() const override { return ::isatty(STDOUT_FILENO) != 0; }
   [[nodiscard]] bool wantsColour() const override {
     return outputIsTerminal() && _environment.variable("NO_COLOR").empty() &&
            _environment.variable("TERM") != "dumb";
   }
   [[nodiscard]] bool isSuperuser() const override { return _environment.isSystem(); }
+  [[nodiscard]] std::int64_t processId() const override { return ::getpid(); }
   [[nodiscard]] std::string absolutePath(const std::string& path) const override {
     std::error_code error;
     const auto absolute = std::filesystem::absolute(path, error);
@@ -114,6 +202,7 @@ class ThisMachine final : public ToolHost {
   }
 
   HostEnvironment _environment;
+  LinuxClock _clock;
   std::string _preferenceDirectory;
   ToolLog _log;
   TomlPreferenceStore _preferences;

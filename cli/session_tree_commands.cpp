@@ -1,12 +1,12 @@
 // sessions: what the agent has written out.
 
-#include <cstdio>
 #include <memory>
 
 #include "cli/json_text.h"
 #include "cli/printable_text.h"
 #include "cli/session_logs.h"
 #include "cli/session_tree.h"
+#include "cli/table_text.h"
 #include "cli/tool_context.h"
 
 namespace zal {
@@ -18,22 +18,6 @@ struct Shown {
   bool verbose = false;
   bool quality = false;
 };
-
-std::string sizeText(std::uint64_t bytes) {
-  constexpr const char* kUnits[] = {"B", "KiB", "MiB", "GiB", "TiB"};
-  auto value = static_cast<double>(bytes);
-  std::size_t unit = 0;
-  for (; value >= 1024 && unit < 4; ++unit) value /= 1024;
-  char text[32];
-  std::snprintf(text, sizeof text, unit == 0 ? "%.0f %s" : "%.1f %s", value, kUnits[unit]);
-  return text;
-}
-
-std::string padded(std::string text, std::size_t width, bool right = false) {
-  // Columns count bytes: exact for what the agent itself names, good enough for the rest.
-  if (text.size() < width) text.insert(right ? 0 : text.size(), width - text.size(), ' ');
-  return text;
-}
 
 std::string root(ToolContext& tool) { return tool.host.settings().roots.DiagnosticReportRoot; }
 

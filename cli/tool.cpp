@@ -16,6 +16,7 @@ constexpr const char* kFooter = R"(Examples:
   lirractl metric Vistel rtt-ms 41.5
   lirractl end Vistel                     carried out three seconds later
   lirractl sessions show Vistel
+  lirractl dump Vistel --description "no sound"
 
 A request command ends when the agent has confirmed that it handled the request. TYPE is the kind of
 session: Vistel, Registration, Nexa, Messages or any other name. Text that begins with a dash goes
@@ -25,8 +26,9 @@ Exit codes:
   0  done
   1  the agent is not reachable, turned the request away, or did not confirm it
   2  wrong usage
-  3  not found: a session, a preference, a file
-  4  a file could not be read or written)";
+  3  not found: a session, a preference, an alert, a file
+  4  a file could not be read or written
+  5  the agent took the request, but no archive came of it: the dump failed or was cut off)";
 
 void addGlobalOptions(CLI::App& app, ToolOptions& options) {
   app.add_option("--socket", options.socketPath, "The agent's socket, instead of the usual place")
@@ -34,10 +36,10 @@ void addGlobalOptions(CLI::App& app, ToolOptions& options) {
   app.add_option("--sender", options.sender, "The name that requests carry")
       ->type_name("NAME")
       ->capture_default_str();
-  app.add_option("--timeout", options.timeoutSeconds, "Seconds to wait for the agent's confirmation")
+  app.add_option("--timeout", options.timeoutSeconds,
+                 "Seconds to wait for the agent: 2 for a confirmation, 600 for a dump when not given")
       ->type_name("SECONDS")
-      ->check(CLI::Range(0.0, 86'400.0))
-      ->capture_default_str();
+      ->check(CLI::Range(0.0, 86'400.0));
   app.add_flag("--wait", options.waitForAgent, "Wait for an agent to appear, within the timeout");
   app.add_flag("--json", options.json, "Print for programs: one JSON value on the standard output");
 }
@@ -71,6 +73,8 @@ int runTool(const std::vector<std::string>& arguments, ToolHost& host, std::istr
   addGlobalOptions(app, tool.options);
   addSessionCommands(app, tool);
   addRecordCommands(app, tool);
+  addDumpCommands(app, tool);
+  addAlertCommands(app, tool);
   addPreferenceCommands(app, tool);
   addSessionTreeCommands(app, tool);
   addStatusCommand(app, tool);

@@ -1,7 +1,9 @@
 #pragma once
 
+#include <chrono>
 #include <functional>
 #include <istream>
+#include <optional>
 #include <ostream>
 #include <string>
 #include <string_view>
@@ -19,15 +21,20 @@ enum class ExitCode : int {
   usage = 2,
   notFound = 3,
   fileTrouble = 4,
+  dumpFailed = 5,  ///< the agent took the request, but no archive came of it
 };
 
 /// Options that every command understands.
 struct ToolOptions {
   std::string socketPath;
   std::string sender = "lirractl";
-  double timeoutSeconds = 2.0;
+  std::optional<double> timeoutSeconds;  ///< nothing: as the command has it
   bool waitForAgent = false;
   bool json = false;
+
+  [[nodiscard]] std::chrono::milliseconds timeout(std::chrono::milliseconds usual) const {
+    return timeoutSeconds ? std::chrono::milliseconds(static_cast<int>(*timeoutSeconds * 1000)) : usual;
+  }
 };
 
 /// One run of the tool.
@@ -54,6 +61,8 @@ struct ToolContext {
 // Each group adds its commands; what they do runs after all arguments were understood.
 void addSessionCommands(CLI::App& app, ToolContext& tool);
 void addRecordCommands(CLI::App& app, ToolContext& tool);
+void addDumpCommands(CLI::App& app, ToolContext& tool);
+void addAlertCommands(CLI::App& app, ToolContext& tool);
 void addPreferenceCommands(CLI::App& app, ToolContext& tool);
 void addSessionTreeCommands(CLI::App& app, ToolContext& tool);
 void addStatusCommand(CLI::App& app, ToolContext& tool);

@@ -6,6 +6,7 @@
 #include <string_view>
 #include <vector>
 
+#include "cli/agent_records.h"
 #include "cli/archive_reader.h"
 #include "platform/directory_roots.h"
 
@@ -34,10 +35,24 @@ class ToolHost {
 
   [[nodiscard]] virtual ArchiveReader& archives() = 0;
 
+  /// All alerts of the agent, the oldest first.
+  [[nodiscard]] virtual std::vector<PostedAlert> alerts() = 0;
+  /// Returned: why it was not answered, or nothing. `button` is a name of PostedAlert's or "cancel".
+  [[nodiscard]] virtual std::optional<std::string> answerAlert(const std::string& id,
+                                                               const std::string& button,
+                                                               const std::optional<std::string>& text) = 0;
+  /// All collections of the agent that are recorded, the oldest first.
+  [[nodiscard]] virtual std::vector<DumpView> dumps() = 0;
+
+  /// A person types, and sees what is printed.
+  [[nodiscard]] virtual bool isInteractive() const = 0;
+  /// Columns of the terminal that is printed to; 0 when there is none whose last line can be redrawn.
+  [[nodiscard]] virtual std::size_t redrawWidth() const = 0;
   [[nodiscard]] virtual bool outputIsTerminal() const = 0;
   /// On a terminal, and nobody said NO_COLOR.
   [[nodiscard]] virtual bool wantsColour() const = 0;
   [[nodiscard]] virtual bool isSuperuser() const = 0;
+  [[nodiscard]] virtual std::int64_t processId() const = 0;
   [[nodiscard]] virtual std::string absolutePath(const std::string& path) const = 0;
   [[nodiscard]] virtual std::chrono::steady_clock::time_point now() const = 0;
   virtual void pause(std::chrono::milliseconds duration) = 0;

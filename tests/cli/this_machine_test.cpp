@@ -6,6 +6,8 @@
 #include "cli/host.h"
 #include "cli/tool.h"
 #include "platform/client_channel.h"
+#include "platform/linux/alerts/alert_record.h"
+#include "platform/linux/progress/progress_record.h"
 #include "tests/support/temporary_directory.h"
 
 namespace zal::testing {
@@ -77,6 +79,54 @@ TEST_F(ThisMachineTest, SettingsComeFromTheConfiguration) {
   EXPECT_EQ(machine->settings().roots.RuntimeRoot, directory / "run");
   EXPECT_EQ(machine->settings().warnings.size(), 1U);
   EXPECT_EQ(machine->settings().preferenceFile, directory / "com.vendel.logging.toml");
+}
+
+TEST_F(ThisMachineTest, AlertsAreThoseOfTheRuntimeDirectory) {
+  set("TZ", "UTC0");
+  AlertRecord record;
+  record.alert.title = "Vistel Logging";
+  record.alert.message = "Please describe the problem briefly";
+  record.alert.defaultButton = "OK";
+  record.alert.alternateButton = "Cancel";
+  record.alert.textField.emplace();
+  record.posted = WallTime(std::chrono::milliseconds(1714651387251));
+  record.agent = ProcessIdentity::ofThisProcess();
+  writeFile(directory / "run/alerts/3.toml", alertRecordText(record));
+  EXPECT_EQ(run({"alerts"}), 0) << err;
+  EXPECT_EQ(out,
+            "3  Vistel Logging  (waiting, 2024-05-02 12:03:07)\n"
+            "    Please describe the problem briefly\n"
+            "    default: OK   alternate: Cancel   cancel   (takes --text)\n");
+  EXPECT_EQ(run({"alerts", "answer", "3", "--text", "no sound"}), 0) << err;
+  EXPECT_EQ(readFile(directory / "run/alerts/3.answer"), "button = \"default\"\ntext = \"no sound\"\n");
+  EXPECT_EQ(run({"alerts", "answer", "3"}), 4);
+  EXPECT_EQ(err, "lirractl: not answered: Alert 3 has been answered a moment ago.\n");
+}
+
+TEST_F(ThisMachineTest, DumpsAreThoseOfTheRuntimeDirectory) {
+  const WallTime began{std::chrono::milliseconds(1714651387251)};
+  const auto later = [&](int milliseconds) { return began + std::chrono::milliseconds(milliseconds); };
+  writeFile(directory / "run/dumps/1-1.progress",
+            progressBeginText("Vistel", "/r/Vistel/Vistel-Log (now)", {"Network state", "Archive"}, began,
+                              ProcessIdentity::ofThisProcess()) +
+                progressStepText(1, later(250)) + progressMissingText("stackshot", "no service") +
+                progressFailedText("no archive", later(900)));
+  std::ostringstream ignored;
+  const std::vector<DumpView> dumps = thisMachine(ignored)->dumps();
+  ASSERT_EQ(dumps.size(), 1U);
+  EXPECT_EQ(dumps[0].name, "1-1.progress");
+  EXPECT_EQ(dumps[0].service, "Vistel");
+  EXPECT_EQ(dumps[0].directory, "/r/Vistel/Vistel-Log (now)");
+  ASSERT_EQ(dumps[0].steps.size(), 2U);
+  EXPECT_EQ(dumps[0].steps[0].name, "Network state");
+  EXPECT_EQ(dumps[0].steps[0].began, std::chrono::milliseconds(250));
+  EXPECT_EQ(dumps[0].steps[1].began, std::nullopt);
+  EXPECT_EQ(dumps[0].currentStep, 1U);
+  ASSERT_EQ(dumps[0].missing.size(), 1U);
+  EXPECT_EQ(dumps[0].missing[0].what, "stackshot");
+  EXPECT_EQ(dumps[0].missing[0].why, "no service");
+  EXPECT_EQ(dumps[0].state, DumpView::State::failed);
+  EXPECT_EQ(dumps[0].reason, "no archive");
 }
 
 TEST_F(ThisMachineTest, ClientLibraryAndConfigurationAgreeWhereTheAgentListens) {

@@ -51,9 +51,19 @@ class ScriptedMachine final : public ToolHost {
     return postTrouble.empty() ? std::nullopt : std::optional(postTrouble);
   }
   [[nodiscard]] ArchiveReader& archives() override { return scriptedArchives; }
+  [[nodiscard]] std::vector<PostedAlert> alerts() override { return postedAlerts; }
+  [[nodiscard]] std::optional<std::string> answerAlert(const std::string& id, const std::string& button,
+                                                       const std::optional<std::string>& text) override {
+    answers.push_back(id + " " + button + (text ? " \"" + *text + "\"" : ""));
+    return answerTrouble.empty() ? std::nullopt : std::optional(answerTrouble);
+  }
+  [[nodiscard]] std::vector<DumpView> dumps() override { return recordedDumps; }
+  [[nodiscard]] bool isInteractive() const override { return terminal; }
+  [[nodiscard]] std::size_t redrawWidth() const override { return terminal ? 60 : 0; }
   [[nodiscard]] bool outputIsTerminal() const override { return terminal; }
   [[nodiscard]] bool wantsColour() const override { return terminal; }
   [[nodiscard]] bool isSuperuser() const override { return false; }
+  [[nodiscard]] std::int64_t processId() const override { return 4711; }
   [[nodiscard]] std::string absolutePath(const std::string& path) const override {
     return path.starts_with('/') ? path : workingDirectory + "/" + path;
   }
@@ -71,6 +81,10 @@ class ScriptedMachine final : public ToolHost {
   std::vector<std::string> posted;
   std::string storeTrouble;
   std::string postTrouble;
+  std::vector<PostedAlert> postedAlerts;
+  std::vector<std::string> answers;
+  std::string answerTrouble;
+  std::vector<DumpView> recordedDumps;
   std::string workingDirectory;
   bool terminal = false;
   std::chrono::steady_clock::time_point moment;

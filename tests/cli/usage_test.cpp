@@ -35,13 +35,13 @@ TEST_F(UsageTest, HelpTeachesWithExamplesAndExitCodes) {
   EXPECT_EQ(run({"--help"}), 0);
   EXPECT_EQ(err, "");
   EXPECT_NE(out.find("lirractl begin Vistel --initiator"), std::string::npos);
-  EXPECT_NE(out.find("  3  not found: a session, a preference, a file"), std::string::npos);
+  EXPECT_NE(out.find("  3  not found: a session, a preference, an alert, a file"), std::string::npos);
 }
 
 TEST_F(UsageTest, EveryCommandHasAHelpWithAnExample) {
-  for (const char* command :
-       {"begin", "end", "checkpoint", "describe", "info", "quality", "metric", "file", "pulse", "initiator",
-        "receiver", "failure", "log", "event", "prefs", "sessions", "status"}) {
+  for (const char* command : {"begin", "end",      "checkpoint", "describe", "info",    "quality", "metric",
+                              "file",  "pulse",    "initiator",  "receiver", "failure", "log",     "event",
+                              "prefs", "sessions", "status",     "dump",     "action",  "alerts"}) {
     EXPECT_EQ(run({command, "--help"}), 0) << command;
     EXPECT_NE(out.find("Example"), std::string::npos) << command;
     EXPECT_NE(out.find(std::string("lirractl ") + command), std::string::npos) << command;

@@ -60,6 +60,17 @@ void ScriptedAgent::closeConnections() {
     ::close(peer.descriptor);
   }
   _peers.clear();
+  _unanswered.clear();
+}
+
+void ScriptedAgent::reply(const ValueMap& reply) {
+  const std::lock_guard lock(_mutex);
+  for (const Unanswered& request : _unanswered) {
+    std::string answer;
+    appendFrame(answer, {0, kProtocolVersion, FrameKind::reply, request.cookie}, encodeDictionary(reply));
+    (void)::send(request.descriptor, answer.data(), answer.size(), MSG_NOSIGNAL);
+  }
+  _unanswered.clear();
 }
 
 bool ScriptedAgent::waitForRequests(std::size_t count) {
@@ -96,7 +107,9 @@ void ScriptedAgent::_run() {
     _accept();
     for (Peer& peer : _peers) {
       if (peer.behaviour.reads) _serve(peer);
-      if (peer.gone) ::close(peer.descriptor);
+      if (!peer.gone) continue;
+      std::erase_if(_unanswered, [&](const Unanswered& one) { return one.descriptor == peer.descriptor; });
+      ::close(peer.descriptor);
     }
     _peers.remove_if([](const Peer& peer) { return peer.gone; });
     _changed.notify_all();
@@ -136,7 +149,11 @@ void ScriptedAgent::_answer(const Peer& peer, const Frame& frame) {
   } else {
     const auto message = WireMessage::fromFrame(frame);
     _requests.push_back(message ? message->description() : "not a message");
-    if (frame.header.kind != FrameKind::messageExpectingReply || !peer.behaviour.reply) return;
+    if (frame.header.kind != FrameKind::messageExpectingReply) return;
+    if (!peer.behaviour.reply) {
+      _unanswered.push_back({peer.descriptor, frame.header.cookie});
+      return;
+    }
     appendFrame(answer, {0, kProtocolVersion, FrameKind::reply, frame.header.cookie},
                 encodeDictionary(*peer.behaviour.reply));
   }

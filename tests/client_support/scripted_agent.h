@@ -39,6 +39,8 @@ class ScriptedAgent {
   void behave(std::deque<Behaviour> behaviours);
   void startReading();  ///< on the connections there are, too
   void closeConnections();
+  /// To all requests that expect a reply and have none.
+  void reply(const ValueMap& reply);
 
   /// All requests so far, once there are at least that many; false after ten seconds without.
   [[nodiscard]] bool waitForRequests(std::size_t count);
@@ -47,6 +49,10 @@ class ScriptedAgent {
   [[nodiscard]] std::size_t connections() const;
 
  private:
+  struct Unanswered {
+    int descriptor;
+    std::uint64_t cookie;
+  };
   struct Peer {
     int descriptor;
     Behaviour behaviour;
@@ -67,6 +73,7 @@ class ScriptedAgent {
   std::deque<Behaviour> _behaviours{Behaviour{}};
   std::list<Peer> _peers;
   std::vector<std::string> _requests;
+  std::vector<Unanswered> _unanswered;
   std::size_t _connections = 0;
   std::atomic<bool> _stop{false};
   std::thread _thread;
