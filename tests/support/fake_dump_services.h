@@ -119,12 +119,16 @@ class FakeWifiDiagnostics : public WifiDiagnostics {
 class FakeRadioCoexistence : public RadioCoexistence {
  public:
   bool present = false;
+  std::function<void()> whenDumped;
   int lookUps = 0;
   int dumps = 0;
   [[nodiscard]] std::function<void()> logDumpEntryPoint() override {
     ++lookUps;
     if (!present) return {};
-    return [this] { ++dumps; };
+    return [this] {
+      ++dumps;
+      if (whenDumped) whenDumped();
+    };
   }
 };
 
