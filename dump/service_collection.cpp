@@ -9,6 +9,7 @@
 #include "platform/open_directories.h"
 #include "platform/platform.h"
 #include "platform/standard_path.h"
+#include "session/collected_files.h"
 
 namespace zal {
 namespace {
@@ -196,7 +197,7 @@ void ServiceCollection::CollectServiceLogs(const CollectionRequest& request,
                                            std::function<void()> completion) {
   Platform& platform = _services.platform;
   const WallTime startTime = platform.clock.wallNow();
-  platform.agentLog.notice("Copying logs for service " + request.service + " into path " +
+  platform.agentLog.notice("Copying logs for service " + printable(request.service) + " into path " +
                            request.destination);
   const auto progress = platform.dumpProgress.begin(
       {.service = request.service, .directory = request.destination, .steps = stepNames(request)});
