@@ -1,9 +1,11 @@
 #include "agent/agent_entry.h"
 
 #include <exception>
+#include <memory>
 #include <string>
 #include <utility>
 
+#include "agent/agent_workshop.h"
 #include "agent/zal_logging_agent_server.h"
 
 namespace zal {
@@ -31,8 +33,8 @@ void runMainLoop(Platform& platform) {
 
 }  // namespace
 
-int runAgent(Platform& platform, AgentHooks hooks) {
-  ZalLoggingAgentServer::lendPlatform(platform, std::move(hooks));
+int runAgent(Platform& platform, SessionServices& sessionServices, AgentHooks hooks) {
+  ZalLoggingAgentServer::lendPlatform(platform, sessionServices, std::move(hooks));
   ZalLoggingAgentServer* const server = ZalLoggingAgentServer::sharedInstance();
   if (server == nullptr) {
     platform.agentLog.warning("Could not create ZalLoggingAgentServer server");
@@ -45,6 +47,11 @@ int runAgent(Platform& platform, AgentHooks hooks) {
   return 0;
 }
 
-int runAgent(Platform& platform) { return runAgent(platform, {}); }
+int runAgent(Platform& platform) {
+  // Nothing but the hooks keeps it, and the server, which is never destroyed, keeps the hooks: jobs in
+  // the background may use it until the process is gone.
+  const auto workshop = std::make_shared<AgentWorkshop>(platform);
+  return runAgent(platform, workshop->sessions.services(), AgentWorkshop::hooksInto(workshop));
+}
 
 }  // namespace zal

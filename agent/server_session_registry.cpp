@@ -28,8 +28,7 @@ ZalLoggingAgentServer::Session ZalLoggingAgentServer::_sessionForSessionType(Opt
   const std::string directory =
       homeRelativePath(_platform.configuration.roots.DiagnosticReportRoot, _platform.files.homeDirectory()) +
       "/" + key;
-  auto session =
-      std::make_shared<ZalLoggingAgentVistelSession>(key, directory, _sessionEnvironment.services());
+  auto session = std::make_shared<ZalLoggingAgentVistelSession>(key, directory, _sessionServices);
   session->setLogCheckpointsToConsole(_switches.isConsoleOutput());
   session->setLogDescriptionsToConsole(_switches.isVerboseConsoleOutput());
   _sessions.emplace(key, session);
@@ -106,7 +105,7 @@ void ZalLoggingAgentServer::_notePoorNetworkConditions() {
 
 void ZalLoggingAgentServer::forceNetworkDump() {
   const std::string directory = ZalLoggingAgentVistelSession::logPathForDate(
-      _sessionEnvironment.services(), _platform.clock.wallNow(),
+      _sessionServices, _platform.clock.wallNow(),
       _platform.configuration.roots.DiagnosticReportRoot + "/Vistel", false);
   // One that cannot be made is the dump's own affair: it says what it could not write.
   createDirectoriesWithMode0777(directory);

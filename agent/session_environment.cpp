@@ -2,14 +2,14 @@
 
 #include <utility>
 
+#include "collectors/collectors.h"
+#include "platform/platform.h"
+
 namespace zal {
 
-SessionEnvironment::SessionEnvironment(Platform& platform,
+SessionEnvironment::SessionEnvironment(Platform& platform, Collectors& collectors,
                                        std::function<void(const CollectionRequest&)> CollectServiceLogs)
-    : _commandRunner(platform.shell),
-      _fileCollector(platform.files, platform.agentLog, platform.configuration.roots),
-      _pingRunner(platform.queues, platform.pings, platform.agentLog),
-      _services{.clock = platform.clock,
+    : _services{.clock = platform.clock,
                 .mainLoop = platform.mainLoop,
                 .localNotifications = platform.localNotifications,
                 .agentLog = platform.agentLog,
@@ -18,17 +18,13 @@ SessionEnvironment::SessionEnvironment(Platform& platform,
                 .deviceRegistry = platform.deviceRegistry,
                 .systemVersion = platform.systemVersion,
                 .files = platform.files,
-                .commandRunner = _commandRunner,
-                .fileCollector = _fileCollector,
-                .pingRunner = _pingRunner,
+                .commandRunner = collectors.commands,
+                .fileCollector = collectors.files,
+                .pingRunner = collectors.pings,
                 .roots = platform.configuration.roots,
                 .endpoints = platform.configuration.endpoints,
                 .buildInformation = _buildInformation,
                 .timeZone = _timeZone,
-                .CollectServiceLogs = std::move(CollectServiceLogs)} {
-  _ZalLoggingAgentPingRunner::setSharedInstance(&_pingRunner);
-}
-
-SessionEnvironment::~SessionEnvironment() { _ZalLoggingAgentPingRunner::setSharedInstance(nullptr); }
+                .CollectServiceLogs = std::move(CollectServiceLogs)} {}
 
 }  // namespace zal

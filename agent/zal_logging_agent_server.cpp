@@ -17,6 +17,7 @@ constexpr std::array<std::string_view, 4> SessionTypeList = {"Registration", "Ne
 /// destruction can reach a host service that is gone already.
 struct SharedState {
   Platform* platform = nullptr;
+  SessionServices* sessionServices = nullptr;
   AgentHooks* hooks = nullptr;
   bool observesPreferences = false;
   ZalLoggingAgentServer* server = nullptr;
@@ -25,9 +26,11 @@ SharedState shared;
 
 }  // namespace
 
-void ZalLoggingAgentServer::lendPlatform(Platform& platform, AgentHooks hooks) {
+void ZalLoggingAgentServer::lendPlatform(Platform& platform, SessionServices& sessionServices,
+                                         AgentHooks hooks) {
   delete shared.hooks;
   shared.platform = &platform;
+  shared.sessionServices = &sessionServices;
   shared.hooks = new AgentHooks(std::move(hooks));
 }
 
@@ -42,7 +45,7 @@ ZalLoggingAgentServer* ZalLoggingAgentServer::sharedInstance() {
   // The null test alone guards the creation: all callers are on the main thread.
   if (shared.server == nullptr) {
     try {
-      shared.server = new ZalLoggingAgentServer(*shared.platform, *shared.hooks);
+      shared.server = new ZalLoggingAgentServer(*shared.platform, *shared.sessionServices, *shared.hooks);
     } catch (const std::exception& error) {
       shared.platform->agentLog.warning(std::string("The server could not be set up: ") + error.what());
     }
@@ -56,10 +59,11 @@ void ZalLoggingAgentServer::resetSharedInstanceForTests() {
   shared = {};
 }
 
-ZalLoggingAgentServer::ZalLoggingAgentServer(Platform& platform, AgentHooks hooks)
+ZalLoggingAgentServer::ZalLoggingAgentServer(Platform& platform, SessionServices& sessionServices,
+                                             AgentHooks hooks)
     : _platform(platform),
       _hooks(std::move(hooks)),
-      _sessionEnvironment(platform, _hooks.CollectServiceLogs),
+      _sessionServices(sessionServices),
       _delayedEnds(std::make_shared<int>()) {
   readLoggingPreferences();
   _inactiveSessionObserver = _platform.localNotifications.observe(

@@ -10,9 +10,9 @@
 #include "agent/agent_hooks.h"
 #include "agent/agent_log_record.h"
 #include "agent/logging_switches.h"
-#include "agent/session_environment.h"
 #include "platform/main_thread_check.h"
 #include "platform/platform.h"
+#include "session/session_services.h"
 #include "session/vistel_session.h"
 #include "session/zal_pair.h"
 
@@ -30,7 +30,7 @@ inline constexpr std::int64_t kBeginFlagInitiator = 4;
 /// The one object that all requests end at: owns the listener and the registry of open sessions,
 /// records what clients log, and ends the process after six idle minutes. Requests are never
 /// refused with an error: absent texts take defaults, unknown sessions and switched-off call logging
-/// make an operation do nothing. Main thread only; the platform outlives it.
+/// make an operation do nothing. Main thread only; the platform and the sessions' services outlive it.
 class ZalLoggingAgentServer : public ActionServer {
  public:
   using Sessions = std::map<std::string, std::shared_ptr<ZalLoggingAgentVistelSession>>;
@@ -39,11 +39,11 @@ class ZalLoggingAgentServer : public ActionServer {
   /// be made (logged). It is never destroyed: the process ends under it.
   static ZalLoggingAgentServer* sharedInstance();
   /// What the shared server will be built from; before the first sharedInstance().
-  static void lendPlatform(Platform& platform, AgentHooks hooks = {});
-  /// Forgets server, platform and observer, as if the process had just started.
+  static void lendPlatform(Platform& platform, SessionServices& sessionServices, AgentHooks hooks = {});
+  /// Forgets server, platform, hooks and observer, as if the process had just started.
   static void resetSharedInstanceForTests();
 
-  ZalLoggingAgentServer(Platform& platform, AgentHooks hooks);
+  ZalLoggingAgentServer(Platform& platform, SessionServices& sessionServices, AgentHooks hooks);
   ~ZalLoggingAgentServer() override;
   ZalLoggingAgentServer(const ZalLoggingAgentServer&) = delete;
   ZalLoggingAgentServer& operator=(const ZalLoggingAgentServer&) = delete;
@@ -127,8 +127,8 @@ class ZalLoggingAgentServer : public ActionServer {
   }
 
   Platform& _platform;
-  AgentHooks _hooks;
-  SessionEnvironment _sessionEnvironment;
+  AgentHooks _hooks;  ///< before the sessions: it may keep what their services are made of
+  SessionServices& _sessionServices;
   LoggingSwitches _switches;
   MainThreadCheck _mainThread;
   std::string _line, _lineCategory;  ///< of the record being written; kept for their memory

@@ -19,7 +19,7 @@ class AgentEntryTest : public testing::AgentFixture {
  protected:
   void SetUp() override { ZalLoggingAgentServer::resetSharedInstanceForTests(); }
   void TearDown() override { ZalLoggingAgentServer::resetSharedInstanceForTests(); }
-  int run() { return runAgent(fake.platform, recordingHooks()); }
+  int run() { return runAgent(fake.platform, sessions.services(), recordingHooks()); }
   static ZalLoggingAgentServer& shared() { return *ZalLoggingAgentServer::sharedInstance(); }
 };
 
@@ -47,7 +47,7 @@ TEST_F(AgentEntryTest, ListensUnderTheServiceNameAndReturns0WhenTheLoopEnds) {
 }
 
 TEST_F(AgentEntryTest, TheSharedServerIsMadeOnce) {
-  ZalLoggingAgentServer::lendPlatform(fake.platform);
+  ZalLoggingAgentServer::lendPlatform(fake.platform, sessions.services());
   auto* const first = ZalLoggingAgentServer::sharedInstance();
   EXPECT_EQ(ZalLoggingAgentServer::sharedInstance(), first);
   EXPECT_THAT(fake.systemNotifications.observers, SizeIs(1));

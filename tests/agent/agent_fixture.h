@@ -7,7 +7,9 @@
 #include <string>
 #include <vector>
 
+#include "agent/session_environment.h"
 #include "agent/zal_logging_agent_server.h"
+#include "collectors/collectors.h"
 #include "tests/support/fake_platform.h"
 
 namespace zal::testing {
@@ -19,7 +21,9 @@ class AgentFixture : public ::testing::Test {
   void switchOff(const std::string& key) { fake.preferences.stored.erase(key); }
 
   /// Makes the server; time stands still until advance().
-  void create() { server = std::make_unique<ZalLoggingAgentServer>(fake.platform, recordingHooks()); }
+  void create() {
+    server = std::make_unique<ZalLoggingAgentServer>(fake.platform, sessions.services(), recordingHooks());
+  }
   /// With call logging on, as most tests want it.
   void createLogging() {
     switchOn("CallLogging");
@@ -35,16 +39,16 @@ class AgentFixture : public ::testing::Test {
     hooks.ForceNetworkDump = [this](const std::string& directory, bool includePing) {
       calls.push_back("ForceNetworkDump " + directory + (includePing ? " with ping" : " without ping"));
     };
-    hooks.CollectServiceLogs = [this](const CollectionRequest& request) {
-      calls.push_back("CollectServiceLogs " + request.service + " into " + request.destination + ", reason " +
-                      request.reason.value_or("none") + (request.background ? ", background" : ", at once") +
-                      ", flags " + std::to_string(request.flags));
-    };
     hooks.performAction = [this](const ActionRequest& request, ActionServer&) {
       calls.push_back("action " + std::to_string(request.action));
       if (onAction) onAction(request);
     };
     return hooks;
+  }
+  void recordCollection(const CollectionRequest& request) {
+    calls.push_back("CollectServiceLogs " + request.service + " into " + request.destination + ", reason " +
+                    request.reason.value_or("none") + (request.background ? ", background" : ", at once") +
+                    ", flags " + std::to_string(request.flags));
   }
 
   [[nodiscard]] std::shared_ptr<ZalLoggingAgentVistelSession> session(const std::string& key) const {
@@ -62,6 +66,9 @@ class AgentFixture : public ::testing::Test {
   }
 
   FakePlatform fake;
+  Collectors collectors{fake.platform};
+  SessionEnvironment sessions{fake.platform, collectors,
+                              [this](const CollectionRequest& request) { recordCollection(request); }};
   std::vector<std::string> calls;
   std::function<void(const ActionRequest&)> onAction;
   std::unique_ptr<ZalLoggingAgentServer> server;  // before the host goes
