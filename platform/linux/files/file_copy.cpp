@@ -13,7 +13,7 @@
 
 #include "platform/linux/files/file_content.h"
 #include "platform/linux/files/system_error.h"
-#include "platform/linux/ipc/descriptor.h"
+#include "platform/linux/files/descriptor.h"
 
 namespace zal {
 

@@ -5,7 +5,7 @@
 #include <optional>
 #include <string>
 
-#include "platform/linux/ipc/descriptor.h"
+#include "platform/linux/files/descriptor.h"
 
 namespace zal {
 

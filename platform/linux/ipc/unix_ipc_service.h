@@ -9,7 +9,7 @@
 #include "platform/agent_log.h"
 #include "platform/configuration.h"
 #include "platform/ipc_listener.h"
-#include "platform/linux/ipc/descriptor.h"
+#include "platform/linux/files/descriptor.h"
 #include "platform/linux/ipc/ipc_context.h"
 #include "platform/run_loop.h"
 

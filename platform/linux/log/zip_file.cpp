@@ -10,7 +10,7 @@
 #include <ctime>
 #include <memory>
 
-#include "platform/linux/ipc/descriptor.h"
+#include "platform/linux/files/descriptor.h"
 
 namespace zal {
 namespace {

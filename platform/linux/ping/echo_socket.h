@@ -11,7 +11,7 @@
 #include <asio/ip/address.hpp>
 #include <asio/ip/icmp.hpp>
 
-#include "platform/linux/ipc/descriptor.h"
+#include "platform/linux/files/descriptor.h"
 #include "platform/linux/ping/icmp_packet.h"
 #include "platform/linux/ping/interface_binding.h"
 

@@ -11,7 +11,7 @@
 
 #include <asio/ip/udp.hpp>
 
-#include "platform/linux/ipc/descriptor.h"
+#include "platform/linux/files/descriptor.h"
 
 namespace zal {
 namespace {

@@ -9,8 +9,8 @@
 
 #include <asio/post.hpp>
 
+#include "platform/linux/files/descriptor.h"
 #include "platform/linux/files/whole_file.h"
-#include "platform/linux/ipc/descriptor.h"
 #include "platform/linux/ping/ping_attempt.h"
 
 namespace zal {

@@ -10,7 +10,7 @@
 #include <system_error>
 #include <utility>
 
-#include "platform/linux/ipc/descriptor.h"
+#include "platform/linux/files/descriptor.h"
 #include "platform/linux/ping/ping_report.h"
 #include "platform/linux/ping/program_output.h"
 #include "platform/linux/process/child_setup.h"

@@ -11,8 +11,8 @@
 #include <string>
 
 #include "platform/linux/files/file_content.h"
-#include "platform/linux/ipc/descriptor.h"
-#include "tests/linux/files/real_places.h"
+#include "platform/linux/files/descriptor.h"
+#include "tests/support/real_places.h"
 #include "tests/support/temporary_directory.h"
 
 namespace zal::testing {

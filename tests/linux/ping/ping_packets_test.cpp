@@ -1,7 +1,7 @@
 #include <netinet/in.h>
 #include <sys/socket.h>
 
-#include "platform/linux/ipc/descriptor.h"
+#include "platform/linux/files/descriptor.h"
 #include "platform/linux/ping/icmp_packet.h"
 #include "tests/linux/ping/ping_fixture.h"
 
