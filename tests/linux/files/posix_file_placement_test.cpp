@@ -8,7 +8,7 @@
 #include <string>
 
 #include "platform/linux/files/rename_no_replace.h"
-#include "tests/linux/files/real_places.h"
+#include "tests/support/real_places.h"
 #include "tests/support/temporary_directory.h"
 
 namespace zal::testing {

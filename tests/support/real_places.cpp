@@ -1,4 +1,4 @@
-#include "tests/linux/files/real_places.h"
+#include "tests/support/real_places.h"
 
 #include <fcntl.h>
 #include <sys/mount.h>
