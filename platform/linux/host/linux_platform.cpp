@@ -47,7 +47,7 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
       _pings(_mainLoop.context(), _loaded.configuration.interfaces, _agentLog),
       _userAlerts(_mainLoop.context(), _mainLoop, _clock, _agentLog,
                   alertDirectory(_loaded.configuration.roots.RuntimeRoot)),
-      _fileCopier(_agentLog),
+      _fileCopier(_queues, _agentLog, _loaded.configuration.archiveCompression),
       _dumpProgress(_clock, _agentLog, progressDirectory(_loaded.configuration.roots.RuntimeRoot)),
       _processExit([this] {
         _ipc.stopListening();

@@ -5,12 +5,12 @@
 
 #include "platform/linux/absent/absent_crash_reporter.h"
 #include "platform/linux/absent/absent_device_support.h"
-#include "platform/linux/absent/absent_file_copier.h"
 #include "platform/linux/absent/absent_network_status.h"
 #include "platform/linux/absent/absent_radio_coexistence.h"
 #include "platform/linux/absent/absent_telephony.h"
 #include "platform/linux/absent/absent_wifi_diagnostics.h"
 #include "platform/linux/alerts/runtime_alert_store.h"
+#include "platform/linux/archive/zip_file_copier.h"
 #include "platform/linux/config/configuration_loader.h"
 #include "platform/linux/config/toml_preference_store.h"
 #include "platform/linux/files/posix_file_placement.h"
@@ -68,7 +68,7 @@ class LinuxPlatform {
   AbsentTelephony _telephony;
   LinuxPingFacility _pings;
   RuntimeAlertStore _userAlerts;
-  AbsentFileCopier _fileCopier;
+  ZipFileCopier _fileCopier;
   AbsentDeviceSupport _deviceSupport;
   AbsentWifiDiagnostics _wifiDiagnostics;
   AbsentRadioCoexistence _radioCoexistence;

@@ -3,9 +3,9 @@
 #include <fcntl.h>
 #include <unistd.h>
 
+#include "platform/linux/files/descriptor.h"
 #include "platform/linux/files/system_error.h"
 #include "platform/linux/files/whole_file.h"
-#include "platform/linux/ipc/descriptor.h"
 #include "platform/linux/property_list/property_list_text.h"
 
 namespace zal {

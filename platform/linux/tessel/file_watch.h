@@ -2,7 +2,7 @@
 
 #include <string>
 
-#include "platform/linux/ipc/descriptor.h"
+#include "platform/linux/files/descriptor.h"
 
 namespace zal::tessel {
 

@@ -3,7 +3,7 @@
 #include <memory>
 #include <string>
 
-#include "platform/linux/ipc/descriptor.h"
+#include "platform/linux/files/descriptor.h"
 #include "platform/linux/tessel/line_splitter.h"
 #include "platform/linux/tessel/log_source.h"
 

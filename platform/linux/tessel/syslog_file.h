@@ -5,7 +5,7 @@
 #include <string>
 #include <string_view>
 
-#include "platform/linux/ipc/descriptor.h"
+#include "platform/linux/files/descriptor.h"
 #include "platform/linux/tessel/line_splitter.h"
 
 namespace zal::tessel {

@@ -7,10 +7,10 @@
 #include <filesystem>
 #include <string>
 
-#include "tests/linux/files/real_places.h"
 #include "tests/support/fake_services.h"
 #include "tests/support/manual_run_loop.h"
 #include "tests/support/manual_work_queues.h"
+#include "tests/support/real_places.h"
 #include "tests/support/temporary_directory.h"
 
 namespace zal::testing {

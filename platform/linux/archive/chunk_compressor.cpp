@@ -1,0 +1,120 @@
+#include "platform/linux/archive/chunk_compressor.h"
+
+#include <isa-l.h>
+#include <libdeflate.h>
+
+#include <algorithm>
+#include <array>
+#include <cstring>
+#include <new>
+
+#include "platform/linux/archive/deflate_continuation.h"
+
+namespace zal {
+namespace {
+
+// Measured over a dump's kind of files: one less makes archives larger than the usual tools do.
+constexpr int kSmallLevel = 6;
+constexpr int kFastLevel = 3;
+constexpr int kTrialLevel = 1;
+constexpr std::size_t kLongestStored = 65535;
+
+std::uint8_t* bytesOf(const char* text) {
+  return reinterpret_cast<std::uint8_t*>(const_cast<char*>(text));  // the library reads only
+}
+
+/// One call, one whole stream or piece. Returned: its size, 0 when it did not fit.
+std::size_t deflateAtOnce(isal_zstream& stream, int level, std::uint8_t* workspace, std::size_t workspaceSize,
+                          const char* input, std::size_t size, bool last, char* output,
+                          std::size_t capacity) {
+  ::isal_deflate_init(&stream);
+  stream.level = static_cast<std::uint32_t>(level);
+  stream.level_buf = workspace;
+  stream.level_buf_size = static_cast<std::uint32_t>(workspaceSize);
+  stream.end_of_stream = last ? 1 : 0;
+  stream.flush = last ? NO_FLUSH : FULL_FLUSH;
+  stream.next_in = bytesOf(input);
+  stream.avail_in = static_cast<std::uint32_t>(size);
+  stream.next_out = bytesOf(output);
+  stream.avail_out = static_cast<std::uint32_t>(capacity);
+  if (::isal_deflate(&stream) != COMP_OK || stream.avail_in > 0) return 0;
+  // A full output may hide that something is still to come.
+  return stream.avail_out > 0 ? stream.total_out : 0;
+}
+
+class FastCompressor : public ChunkCompressor {
+ public:
+  std::size_t compress(const char* chunk, std::size_t size, bool last, char* output,
+                       std::size_t capacity) override {
+    return deflateAtOnce(_stream, kFastLevel, _workspace.data(), _workspace.size(), chunk, size, last, output,
+                         capacity);
+  }
+
+ private:
+  isal_zstream _stream;
+  std::array<std::uint8_t, ISAL_DEF_LVL3_DEFAULT> _workspace;
+};
+
+class SmallCompressor : public ChunkCompressor {
+ public:
+  SmallCompressor() : _compressor(::libdeflate_alloc_compressor(kSmallLevel), &::libdeflate_free_compressor) {
+    if (!_compressor) throw std::bad_alloc();
+  }
+  std::size_t compress(const char* chunk, std::size_t size, bool last, char* output,
+                       std::size_t capacity) override {
+    if (capacity <= kContinuationRoom) return 0;
+    const std::size_t written =
+        ::libdeflate_deflate_compress(_compressor.get(), chunk, size, output, capacity - kContinuationRoom);
+    // The library knows whole streams only.
+    return last || written == 0 ? written : _continuation.letAnotherFollow(output, written, size);
+  }
+
+ private:
+  const std::unique_ptr<libdeflate_compressor, void (*)(libdeflate_compressor*)> _compressor;
+  DeflateContinuation _continuation;
+};
+
+}  // namespace
+
+std::unique_ptr<ChunkCompressor> makeChunkCompressor(ArchiveCompression compression) {
+  if (compression == ArchiveCompression::small) return std::make_unique<SmallCompressor>();
+  return std::make_unique<FastCompressor>();
+}
+
+struct CompressionTrial::Workspace {
+  isal_zstream stream;
+  std::array<std::uint8_t, ISAL_DEF_LVL1_SMALL> level;
+  std::array<char, kSample> output;
+};
+
+CompressionTrial::CompressionTrial() : _workspace(std::make_unique<Workspace>()) {}
+CompressionTrial::~CompressionTrial() = default;
+
+bool CompressionTrial::shrinks(const char* sample, std::size_t size) {
+  return deflateAtOnce(_workspace->stream, kTrialLevel, _workspace->level.data(), _workspace->level.size(),
+                       sample, size, true, _workspace->output.data(), size - size / 32) > 0;
+}
+
+bool CompressionTrial::chunkShrinks(const char* chunk, std::size_t size) {
+  if (size < 8 * kSample) return true;
+  return shrinks(chunk + size / 4, kSample) || shrinks(chunk + size / 4 * 3, kSample);
+}
+
+std::size_t storeChunk(const char* chunk, std::size_t size, bool last, char* output) {
+  char* const begin = output;
+  do {
+    const std::size_t part = std::min(size, kLongestStored);
+    *output++ = last && part == size ? 1 : 0;
+    for (const std::size_t length : {part, ~part}) {
+      *output++ = static_cast<char>(length);
+      *output++ = static_cast<char>(length >> 8U);
+    }
+    std::memcpy(output, chunk, part);
+    output += part;
+    chunk += part;
+    size -= part;
+  } while (size > 0);
+  return static_cast<std::size_t>(output - begin);
+}
+
+}  // namespace zal

@@ -1,0 +1,25 @@
+#pragma once
+
+#include <cstdint>
+#include <functional>
+#include <string>
+
+#include "platform/configuration.h"
+
+namespace zal {
+
+/// How writing an archive ended.
+struct ArchiveOutcome {
+  std::string failure;  ///< empty: it is there, synced
+  bool outputIsOurs = false;
+  std::uint64_t entries = 0;
+};
+
+/// Writes the directory into a new zip archive at `output` and syncs it. `line` gets a line for
+/// everything that is left out or cut, on the calling thread. Waits for disks; compresses on threads of
+/// its own.
+[[nodiscard]] ArchiveOutcome writeZipArchive(const std::string& directory, const std::string& output,
+                                             ArchiveCompression compression,
+                                             const std::function<void(const std::string&)>& line);
+
+}  // namespace zal

@@ -1,0 +1,90 @@
+#include "platform/linux/archive/zip_file_copier.h"
+
+#include <unistd.h>
+
+#include <utility>
+
+#include "platform/linux/archive/kept_aside.h"
+#include "platform/linux/archive/zip_archive.h"
+#include "platform/linux/archive/zip_check.h"
+#include "platform/linux/files/rename_no_replace.h"
+
+namespace zal {
+namespace {
+
+struct JobDescription {
+  std::string input, output, identifier;
+  ArchiveCompression compression;
+};
+
+class ZipJob : public FileCopierJob, public std::enable_shared_from_this<ZipJob> {
+ public:
+  ZipJob(JobDescription description, WorkQueues& queues, AgentLog& log, WorkQueue& queue,
+         FileCopier::Completion completion)
+      : _description(std::move(description)),
+        _queues(queues),
+        _log(log),
+        _queue(queue),
+        _completion(std::move(completion)) {
+    std::string& input = _description.input;
+    while (input.size() > 1 && input.back() == '/') input.pop_back();
+  }
+
+  [[nodiscard]] const std::string& identifier() const override { return _description.identifier; }
+
+  void start() override {
+    _queues.global(QueuePriority::standard).async([self = shared_from_this()] { self->_write(); });
+  }
+
+ private:
+  void _write() {
+    _outcome = writeZipArchive(_description.input, _description.output, _description.compression,
+                               [this](const std::string& line) { _log.notice(line); });
+    if (!_outcome.failure.empty()) return _fail(_outcome.failure);
+    _queues.global(QueuePriority::standard).async([self = shared_from_this()] { self->_check(); });
+  }
+
+  void _check() {
+    const std::string wrong = checkZipArchive(_description.output, _outcome.entries);
+    if (!wrong.empty()) return _fail("the archive does not hold what was written: " + wrong);
+    _complete();
+  }
+
+  void _fail(const std::string& reason) {
+    if (_outcome.outputIsOurs) ::unlink(_description.output.c_str());
+    const std::string& input = _description.input;
+    std::error_code error;
+    if (!nameIsTaken(input, error) && !error) {
+      _log.notice("There is no \"" + input + "\" to archive");
+      return _complete();
+    }
+    const std::string aside = keepAside(input, error);
+    _log.warning('"' + input + "\" could not be archived (" + reason + "); " +
+                 (error ? "it stays where it is, as it cannot be moved aside: " + error.message()
+                        : "it is kept as \"" + aside + '"'));
+    _complete();
+  }
+
+  void _complete() {
+    _queue.async([self = shared_from_this()] { std::exchange(self->_completion, nullptr)(*self); });
+  }
+
+  JobDescription _description;
+  WorkQueues& _queues;
+  AgentLog& _log;
+  WorkQueue& _queue;
+  FileCopier::Completion _completion;
+  ArchiveOutcome _outcome;
+};
+
+}  // namespace
+
+std::shared_ptr<FileCopierJob> ZipFileCopier::makeJob(std::string input, std::string output,
+                                                      std::string identifier, CopierOperation /*operation*/,
+                                                      WorkQueue& queue, Completion completion) {
+  return std::make_shared<ZipJob>(
+      JobDescription{std::move(input), std::move(output), std::move(identifier), _compression}, _queues, _log,
+      queue, std::move(completion));
+}
+
+}  // namespace zal
