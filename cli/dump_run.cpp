@@ -136,7 +136,7 @@ void DumpRun::_look() {
   }
 }
 
-ExitCode DumpRun::_failWithoutReply(std::string trouble) {
+ExitCode DumpRun::_failWithoutReply(const std::string& trouble) {
   _display.close();
   return _tool.fail(ExitCode::dumpFailed, trouble,
                     _dump ? "What was gathered lies in " + _dump->directory + " or beside it."

@@ -37,7 +37,7 @@ class DumpRun {
   /// Returned: why there will be no dump.
   std::optional<std::string> _answerPrompt();
   void _look();
-  ExitCode _failWithoutReply(std::string trouble);
+  ExitCode _failWithoutReply(const std::string& trouble);
   ExitCode _finish(const lirra::Dictionary& reply);
   [[nodiscard]] std::chrono::milliseconds _elapsed() const;
 
