@@ -36,22 +36,23 @@ void DumpDisplay::update(const DumpView& dump, std::chrono::milliseconds elapsed
 
 void DumpDisplay::close() {
   if (!_running.empty()) _print(_running);
-  if (_isDrawn) _out << kEraseLine;
-  _isDrawn = false;
+  if (!_drawn.empty()) _out << kEraseLine;
+  _drawn.clear();
   _out.flush();
 }
 
 void DumpDisplay::_print(const std::string& line) {
-  if (_isDrawn) _out << kEraseLine;
-  _isDrawn = false;
+  if (!_drawn.empty()) _out << kEraseLine;
+  _drawn.clear();
   _out << line << "\n";
 }
 
 void DumpDisplay::_redraw(const std::string& line) {
   // The last column stays free: a full line makes some terminals begin the next one.
-  _out << kEraseLine << fitting(line, _columns - 1);
-  _isDrawn = true;
-  _out.flush();
+  const std::string shown = fitting(line, _columns - 1);
+  if (shown == _drawn) return;
+  _out << kEraseLine << shown << std::flush;
+  _drawn = shown;
 }
 
 }  // namespace zal

@@ -31,7 +31,7 @@ class DumpDisplay {
   std::size_t _printedSteps = 0;
   std::size_t _printedMissing = 0;
   std::string _running;  ///< the line that is being redrawn, to be printed when it is over
-  bool _isDrawn = false;
+  std::string _drawn;    ///< what stands in the terminal's last line now
 };
 
 }  // namespace zal

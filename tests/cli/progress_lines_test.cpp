@@ -95,6 +95,8 @@ TEST_F(DumpDisplayTest, OnATerminalTheLineOfTheRunningStepIsRedrawn) {
   EXPECT_EQ(shown(), "\r\x1b[K    0:00  the agent begins");
   display.update(threeSteps(1), 1s);
   EXPECT_EQ(shown(), "\r\x1b[K    0:01  step 1 of 3: Network state");
+  display.update(threeSteps(1), 1999ms);
+  EXPECT_EQ(shown(), "") << "nothing changed that one could see";
   DumpView second = threeSteps(2);
   second.missing = {{"stackshot", "no service"}};
   display.update(second, 66s);

@@ -1,5 +1,6 @@
 #include "platform/linux/secretlist/secret_service.h"
 
+#include <cerrno>
 #include <cstdint>
 #include <optional>
 #include <string_view>
@@ -112,6 +113,8 @@ std::variant<SecretService, Trouble> SecretService::connect() {
   sd_bus* raw = nullptr;
   const int result = sd_bus_open_user(&raw);
   Bus bus(raw);
+  if (result == -ENOMEDIUM)
+    return Trouble{"there is no session bus: neither DBUS_SESSION_BUS_ADDRESS nor XDG_RUNTIME_DIR is set"};
   if (result < 0) return Trouble{"there is no session bus: " + textOf(result)};
   std::string trouble;
   const Message question = newCall(raw, "org.freedesktop.DBus", "/org/freedesktop/DBus",

@@ -59,6 +59,16 @@ TEST_F(SecretlistTest, WithoutABusItSaysSoInOneLine) {
   EXPECT_EQ(err, "secretlist: there is no session bus: No such file or directory\n");
 }
 
+TEST_F(SecretlistTest, WithoutAnAddressItNamesTheVariablesThatGiveOne) {
+  const ChildProgram::Options options{.command = {"/usr/bin/env", "-u", "DBUS_SESSION_BUS_ADDRESS", "-u",
+                                                  "XDG_RUNTIME_DIR", ZAL_SECRETLIST_PATH, "keys"},
+                                      .errors = directory / "err"};
+  EXPECT_EQ(ChildProgram(options).waitForExit(), 1);
+  EXPECT_EQ(
+      readFile(directory / "err"),
+      "secretlist: there is no session bus: neither DBUS_SESSION_BUS_ADDRESS nor XDG_RUNTIME_DIR is set\n");
+}
+
 TEST_F(SecretlistTest, BusThatNeverAnswersIsGivenUp) {
   sockaddr_un name{};
   name.sun_family = AF_UNIX;
