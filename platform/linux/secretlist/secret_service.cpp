@@ -36,7 +36,7 @@ Message newCall(sd_bus* bus, const char* service, const char* path, const char* 
 
 /// The answer; null, and the reason in `trouble`, when there is none.
 Message call(sd_bus* bus, const Message& request, std::string& trouble) {
-  sd_bus_error error = SD_BUS_ERROR_NULL;
+  sd_bus_error error{};
   sd_bus_message* raw = nullptr;
   const int result = sd_bus_call(bus, request.get(), kCallLimitMicroseconds, &error, &raw);
   if (result < 0) trouble = error.message != nullptr ? std::string(error.message) : textOf(result);
