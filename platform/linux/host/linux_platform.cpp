@@ -11,9 +11,10 @@
 namespace zal {
 namespace {
 
-/// For one user alone; the number keeps users of one machine apart.
+/// For one user alone; the number keeps users of one machine apart. On the file system that archives
+/// go to in the end: moving one there then needs no room that a full disk would not have.
 std::string temporaryArea(const DirectoryRoots& roots, const HostEnvironment& environment) {
-  return roots.TemporaryRoot + "/com.vendel.lirra-" + std::to_string(environment.userId);
+  return roots.DiagnosticReportRoot + "/.com.vendel.lirra-" + std::to_string(environment.userId);
 }
 
 LinuxAgentLog::Options agentLogOptions(const Configuration& configuration,
