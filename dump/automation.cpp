@@ -8,6 +8,7 @@
 #include "platform/platform.h"
 #include "platform/standard_path.h"
 #include "session/collected_files.h"
+#include "session/session_lines.h"
 
 namespace zal {
 namespace {
@@ -36,7 +37,7 @@ std::string targetOf(const ValueMap* userInfo) {
 }  // namespace
 
 void Automation::startVideoCalls(OptionalText sender, ActionServer& server) {
-  _log("Starting automation on behalf of: ", textOr(sender, "No Sender"));
+  _log("Starting automation on behalf of: ", textOr(sender, kNoSender));
   _platform.shell.PerformSystem(callStressCommand(resolveAndStandardize(
       _platform.configuration.roots.DiagnosticReportRoot, _platform.files.homeDirectory())));
   server.setAutomationRunning(true);
@@ -44,7 +45,7 @@ void Automation::startVideoCalls(OptionalText sender, ActionServer& server) {
 }
 
 void Automation::stopVideoCalls(OptionalText sender, ActionServer& server) {
-  _log("Stopping automation on behalf of: ", textOr(sender, "No Sender"));
+  _log("Stopping automation on behalf of: ", textOr(sender, kNoSender));
   _platform.shell.PerformSystem("/usr/bin/killall -9 runnel");
   server.setAutomationRunning(false);
   _alert(kVideoCalls, "Stopped Vistel automation");
@@ -52,7 +53,7 @@ void Automation::stopVideoCalls(OptionalText sender, ActionServer& server) {
 
 void Automation::startMessaging(OptionalText sender, const ValueMap* userInfo, ActionServer& server) {
   if (!_platform.configuration.internalInstall) return;
-  _log("Starting Quillet automation on behalf of: ", textOr(sender, "No Sender"));
+  _log("Starting Quillet automation on behalf of: ", textOr(sender, kNoSender));
   const std::string target = targetOf(userInfo);
   if (target.empty()) {
     _alert(kMessaging, kNoTarget);
@@ -67,7 +68,7 @@ void Automation::startMessaging(OptionalText sender, const ValueMap* userInfo, A
 }
 
 void Automation::stopMessaging(OptionalText sender, ActionServer& server) {
-  _log("Stopping Quillet automation on behalf of: ", textOr(sender, "No Sender"));
+  _log("Stopping Quillet automation on behalf of: ", textOr(sender, kNoSender));
   _platform.shell.PerformSystem("/usr/bin/killall -9 zaltool");
   server.setAutomationRunning(false);
   _alert(kMessaging, "Stopped Quillet automation");

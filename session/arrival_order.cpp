@@ -16,7 +16,7 @@ namespace {
 using Entries = std::vector<ZalPair<std::string_view, double>>;
 
 // So many entries ahead are asked for that they are there when it is their turn.
-constexpr std::size_t kFetchAhead = 16;
+constexpr std::size_t kEntriesAhead = 16;
 constexpr unsigned kDigitBits = 11;
 constexpr std::size_t kBuckets = std::size_t{1} << kDigitBits;
 constexpr std::size_t kDigits = (64 + kDigitBits - 1) / kDigitBits;
@@ -98,7 +98,7 @@ void appendInTimeOrder(const Entries& entries, std::vector<std::string_view>& te
     sortByKey(keyed);
   }
   for (std::size_t place = 0; place < keyed.size(); ++place) {
-    const std::size_t ahead = std::min(place + kFetchAhead, keyed.size() - 1);
+    const std::size_t ahead = std::min(place + kEntriesAhead, keyed.size() - 1);
     fetchSoon(&entries[keyed[ahead].index]);
     texts.push_back(entries[keyed[place].index].first);
   }

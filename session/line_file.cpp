@@ -24,7 +24,7 @@ constexpr std::size_t kLargePiece = 64U * 1024U;
 // A stretch is cut here, so that it is still in the processor's cache when it is written.
 constexpr std::ptrdiff_t kLargestStretch = 256 * 1024;
 // Lines ahead that are asked for, and how far into them: most are not longer than two cache lines.
-constexpr std::size_t kFetchAhead = 8;
+constexpr std::size_t kLinesAhead = 8;
 constexpr std::size_t kCacheLine = 64;
 
 class BufferedFile {
@@ -92,7 +92,7 @@ void writeStrings(const LogLines& strings, const std::string& path, AgentLog& lo
   const char* end = nullptr;
   for (std::size_t number = 0; number < strings.lines.size(); ++number) {
     const std::string_view line = strings.lines[number];
-    const char* const later = strings.lines[std::min(number + kFetchAhead, strings.lines.size() - 1)].data();
+    const char* const later = strings.lines[std::min(number + kLinesAhead, strings.lines.size() - 1)].data();
     fetchSoon(later);
     fetchSoon(later, kCacheLine);
     const std::size_t units = plain ? line.size() : std::min(utf16Length(line), line.size());

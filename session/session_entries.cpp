@@ -5,7 +5,6 @@
 namespace zal {
 
 namespace {
-constexpr std::string_view kNoSender = "No Sender";
 constexpr std::string_view kNoInfo = "No Info";
 constexpr std::string_view kNoDescription = "No Description";
 constexpr std::string_view kDefaultFileCategory = "Collected Files";

@@ -6,7 +6,7 @@ namespace zal {
 
 namespace {
 
-constexpr std::string_view kNoSender = "(No sender)";
+constexpr std::string_view kNoLineSender = "(No sender)";
 constexpr std::string_view kNoCheckpoint = "(No checkpoint provided)";
 constexpr std::string_view kNoLog = "** No Log Provided **";
 
@@ -34,7 +34,7 @@ std::string endLine(std::string_view sender, std::string_view timeText) {
 }
 
 std::string checkpointLine(OptionalText checkpoint, OptionalText sender, std::string_view timeText) {
-  return entryLine(textOr(sender, kNoSender), textOr(checkpoint, kNoCheckpoint), timeText);
+  return entryLine(textOr(sender, kNoLineSender), textOr(checkpoint, kNoCheckpoint), timeText);
 }
 
 std::string descriptionLine(OptionalText description, OptionalText log, std::string_view sender,

@@ -8,6 +8,9 @@
 
 namespace zal {
 
+/// What stands for a sender who gave no name, except in lines of checkpoints.
+inline constexpr std::string_view kNoSender = "No Sender";
+
 // The lines of session logs, without their newline. A time text is an entry's ("14:03:07.251
 // (2024-05-02) (CEST)"); a sender comes as it shall be shown, except where it is optional.
 

@@ -7,7 +7,6 @@
 namespace zal {
 
 namespace {
-constexpr std::string_view kNoSender = "No Sender";
 constexpr std::string_view kOwnSender = "Lirra";
 }  // namespace
 

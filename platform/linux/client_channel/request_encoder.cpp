@@ -8,7 +8,7 @@
 namespace zal {
 namespace {
 
-constexpr std::size_t kKeptCapacity = 256U << 10U;
+constexpr std::size_t kKeptFrameCapacity = 256U << 10U;
 
 struct Encoder {
   MessageBuilder builder;
@@ -18,7 +18,7 @@ struct Encoder {
 Encoder& encoderOfThread() {
   thread_local std::unique_ptr<Encoder> encoder;
   // One huge text must not keep its memory for the life of the thread.
-  if (!encoder || encoder->frame.capacity() > kKeptCapacity) encoder = std::make_unique<Encoder>();
+  if (!encoder || encoder->frame.capacity() > kKeptFrameCapacity) encoder = std::make_unique<Encoder>();
   encoder->frame.clear();
   encoder->builder.reset();
   return *encoder;

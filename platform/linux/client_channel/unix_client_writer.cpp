@@ -16,7 +16,7 @@ using std::chrono::steady_clock;
 using namespace std::chrono_literals;
 
 /// An agent that is there but busy taking in others is asked again soon.
-constexpr auto kBusyRetry = 5ms;
+constexpr auto kFullSocketRetry = 5ms;
 /// A connection that lived this long was a good one.
 constexpr auto kGoodConnection = 1s;
 /// While requests are dropped all the time the agent's log is told this often.
@@ -61,7 +61,7 @@ void UnixClientChannel::_connectWhenDue() {
   }
   const bool busy = attempt == AgentSocket::Attempt::busy;
   if (busy) {
-    _retry.postpone(now + kBusyRetry);
+    _retry.postpone(now + kFullSocketRetry);
   } else {
     _retry.failed(now);
   }

@@ -16,14 +16,14 @@ namespace zal {
 namespace {
 
 constexpr mode_t kFileMode = 0640;
-constexpr mode_t kDirectoryMode = 0770;
+constexpr mode_t kLogDirectoryMode = 0770;
 
 bool makeDirectories(const std::string& path) {
-  if (::mkdir(path.c_str(), kDirectoryMode) == 0 || errno == EEXIST) return true;
+  if (::mkdir(path.c_str(), kLogDirectoryMode) == 0 || errno == EEXIST) return true;
   const std::size_t slash = path.rfind('/');
   if (errno != ENOENT || slash == std::string::npos || slash == 0) return false;
   return makeDirectories(path.substr(0, slash)) &&
-         (::mkdir(path.c_str(), kDirectoryMode) == 0 || errno == EEXIST);
+         (::mkdir(path.c_str(), kLogDirectoryMode) == 0 || errno == EEXIST);
 }
 
 int openForAppending(const std::string& path) {

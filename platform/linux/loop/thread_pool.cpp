@@ -24,7 +24,7 @@ constexpr int kIoPriorityClassIdle = 3;
 constexpr int kIoPriorityClassShift = 13;
 constexpr int kLowestNice = 19;
 
-constexpr std::chrono::nanoseconds kLongestDelay = std::chrono::hours{24 * 365 * 100};
+constexpr std::chrono::nanoseconds kLongestQueueDelay = std::chrono::hours{24 * 365 * 100};
 
 /// New threads inherit the signal mask of their maker.
 class AllSignalsBlocked {
@@ -86,7 +86,7 @@ void ThreadPool::submitAfter(std::chrono::nanoseconds delay, const asio::any_io_
   const std::scoped_lock lock(_mutex);
   if (_closing) return;
   if (_threads.empty()) _startThread();  // somebody must notice that the delay has passed
-  _delays.emplace_front(_context, std::min(delay, kLongestDelay));
+  _delays.emplace_front(_context, std::min(delay, kLongestQueueDelay));
   _delays.front().async_wait([this, position = _delays.begin(), where, queue,
                               job = std::move(job)](const std::error_code& error) mutable {
     {

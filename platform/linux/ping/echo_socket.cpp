@@ -11,6 +11,7 @@
 #include <cerrno>
 #include <cstring>
 
+#include "platform/linux/files/system_error.h"
 #include "platform/linux/ping/ping_text.h"
 
 namespace zal {
@@ -18,8 +19,6 @@ namespace {
 
 // One turn of the loop reads no more foreign packets than this; the rest waits for the next one.
 constexpr int kForeignPacketsAtOnce = 64;
-
-std::error_code lastError() { return {errno, std::generic_category()}; }
 
 void switchOn(int socket, int level, int option) {
   const int on = 1;
@@ -84,7 +83,7 @@ EchoSocket::EchoSocket(EchoSocketKind kind, const asio::ip::address& peer, const
   Descriptor socket(::socket(isV4 ? AF_INET : AF_INET6, type | SOCK_NONBLOCK | SOCK_CLOEXEC,
                              isV4 ? int{IPPROTO_ICMP} : int{IPPROTO_ICMPV6}));
   if (!socket.isOpen()) {
-    error = lastError();
+    error = lastSystemError();
     return;
   }
   const InterfaceBinding binding = bindToInterface(socket.get(), peer, interface, choice);
@@ -96,7 +95,7 @@ EchoSocket::EchoSocket(EchoSocketKind kind, const asio::ip::address& peer, const
   if (kind == EchoSocketKind::datagram && !binding.byAddress) {
     const asio::ip::icmp::endpoint any(isV4 ? asio::ip::icmp::v4() : asio::ip::icmp::v6(), 0);
     if (::bind(_socket.get(), any.data(), static_cast<socklen_t>(any.size())) != 0) {
-      error = lastError();
+      error = lastSystemError();
       _socket = Descriptor();
       return;
     }
@@ -150,7 +149,7 @@ std::error_code EchoSocket::send(std::uint16_t sequence) {
   const auto trySend = [&] {
     const ssize_t sent = ::sendto(_socket.get(), message.data(), message.size(), MSG_NOSIGNAL, _peer.data(),
                                   static_cast<socklen_t>(_peer.size()));
-    return sent < 0 ? lastError() : std::error_code{};
+    return sent < 0 ? lastSystemError() : std::error_code{};
   };
   // The first refusal may be the error of an earlier request, which the socket reports once.
   return trySend() ? trySend() : std::error_code{};

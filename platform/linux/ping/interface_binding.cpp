@@ -12,13 +12,12 @@
 #include <asio/ip/udp.hpp>
 
 #include "platform/linux/files/descriptor.h"
+#include "platform/linux/files/system_error.h"
 
 namespace zal {
 namespace {
 
 using asio::ip::udp;
-
-std::error_code lastError() { return {errno, std::generic_category()}; }
 
 bool isLinkLocal(const asio::ip::address& address) {
   return address.is_v6() && address.to_v6().is_link_local();
@@ -56,7 +55,7 @@ InterfaceBinding bindToInterface(int socket, const asio::ip::address& peer, cons
   if (choice == BindingChoice::deviceFirst) {
     const auto length = static_cast<socklen_t>(interface.size());
     if (::setsockopt(socket, SOL_SOCKET, SO_BINDTODEVICE, interface.data(), length) == 0) return result;
-    result.error = lastError();
+    result.error = lastSystemError();
     if (result.error != std::errc::operation_not_permitted) return result;
   }
   const auto own = ownAddress(interface, peer);
@@ -66,7 +65,7 @@ InterfaceBinding bindToInterface(int socket, const asio::ip::address& peer, cons
   }
   const udp::endpoint endpoint(*own, 0);
   const int status = ::bind(socket, endpoint.data(), static_cast<socklen_t>(endpoint.size()));
-  result.error = status == 0 ? std::error_code{} : lastError();
+  result.error = status == 0 ? std::error_code{} : lastSystemError();
   result.byAddress = true;
   result.sourceAddress = own->to_string();
   return result;
@@ -77,7 +76,7 @@ SourceProbe probeSource(const asio::ip::address& peer, const std::string& interf
   SourceProbe probe;
   const Descriptor socket(::socket(peer.is_v4() ? AF_INET : AF_INET6, SOCK_DGRAM | SOCK_CLOEXEC, 0));
   if (!socket.isOpen()) {
-    probe.error = lastError();
+    probe.error = lastSystemError();
     return probe;
   }
   const InterfaceBinding binding = bindToInterface(socket.get(), peer, interface, choice);
@@ -89,7 +88,7 @@ SourceProbe probeSource(const asio::ip::address& peer, const std::string& interf
   auto length = static_cast<socklen_t>(source.capacity());
   if (::connect(socket.get(), target.data(), static_cast<socklen_t>(target.size())) != 0 ||
       ::getsockname(socket.get(), source.data(), &length) != 0) {
-    probe.error = lastError();
+    probe.error = lastSystemError();
     return probe;
   }
   source.resize(length);

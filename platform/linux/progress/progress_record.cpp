@@ -11,7 +11,7 @@ namespace zal {
 namespace {
 
 constexpr std::size_t kMostSteps = 10'000;
-constexpr std::size_t kLongestText = 4096;
+constexpr std::size_t kLongestLineText = 4096;
 
 /// Takes one blank-separated word off the line.
 std::string_view takeWord(std::string_view& line) {
@@ -93,7 +93,7 @@ void readLine(DumpProgressRecord& record, std::string_view line) {
 }
 
 std::string momentText(WallTime moment) { return std::to_string(unixMilliseconds(moment)); }
-std::string lineText(std::string_view text) { return escapedLine(cutAtCharacter(text, kLongestText)); }
+std::string lineText(std::string_view text) { return escapedLine(cutAtCharacter(text, kLongestLineText)); }
 
 }  // namespace
 
@@ -117,8 +117,8 @@ std::string progressBeginText(std::string_view service, std::string_view directo
                               const ProcessIdentity& agent) {
   std::string text = "BEGIN " + momentText(now) + " pid=" + std::to_string(agent.processId) +
                      " start=" + std::to_string(agent.startTime) + " steps=" + std::to_string(steps.size()) +
-                     " service=" + escapedWord(cutAtCharacter(service, kLongestText)) +
-                     " directory=" + escapedWord(cutAtCharacter(directory, kLongestText)) + "\n";
+                     " service=" + escapedWord(cutAtCharacter(service, kLongestLineText)) +
+                     " directory=" + escapedWord(cutAtCharacter(directory, kLongestLineText)) + "\n";
   for (std::size_t i = 0; i < steps.size(); ++i) {
     text += "PLAN " + std::to_string(i + 1) + " " + lineText(steps[i]) + "\n";
   }
