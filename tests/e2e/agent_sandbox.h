@@ -24,8 +24,9 @@ class AgentSandbox {
  public:
   AgentSandbox();
 
-  /// Lines of lirra.toml besides `[roots]`; before the agent starts.
-  std::string settings;
+  /// Lines of lirra.toml besides `[roots]`; before the agent starts. By default sessions that ended
+  /// stay as they are: nothing archives them while a test looks at them.
+  std::string settings = "[testing]\nclosingStageDelay = 3600\n";
   /// Where the log and report roots lie; another directory when a test wants another file system.
   std::string stateRoot;
 

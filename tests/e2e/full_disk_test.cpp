@@ -1,10 +1,8 @@
-#include <sys/mount.h>
-#include <unistd.h>
-
-#include <cerrno>
 #include <cstring>
+#include <random>
 
-#include "tests/e2e/e2e_fixture.h"
+#include "tests/e2e/dump_fixture.h"
+#include "tests/e2e/small_disk.h"
 
 namespace zal {
 namespace {
@@ -12,35 +10,16 @@ namespace {
 using ::testing::EndsWith;
 using ::testing::HasSubstr;
 using testing::RawClient;
+using ::testing::SizeIs;
 
-/// The logs on a file system of one mebibyte.
-class FullDiskE2eTest : public testing::E2eFixture {
+/// The logs and reports on a file system of four mebibytes.
+class FullDiskE2eTest : public testing::DumpFixture {
  protected:
   void SetUp() override {
-    _disk = sandbox / "disk";
-    std::filesystem::create_directories(_disk);
-    if (::mount("tmpfs", _disk.c_str(), "tmpfs", 0, "size=1m") != 0) {
-      const int error = errno;
-      _disk.clear();
-      GTEST_SKIP() << "a tmpfs cannot be mounted here: " << std::strerror(error);
-    }
-    sandbox.stateRoot = _disk;
+    if (disk.error() != 0) GTEST_SKIP() << "a tmpfs cannot be mounted here: " << std::strerror(disk.error());
+    sandbox.stateRoot = sandbox / "disk";
   }
-  void TearDown() override {
-    E2eFixture::TearDown();
-    if (!_disk.empty()) ::umount2(_disk.c_str(), MNT_DETACH);
-  }
-  void fill() {
-    testing::writeFile(_disk + "/ballast", "");
-    std::ofstream ballast(_disk + "/ballast", std::ios::binary);
-    const std::string block(4096, 'x');
-    while (ballast.write(block.data(), static_cast<std::streamsize>(block.size())).flush()) {
-    }
-  }
-  void makeRoom() { std::filesystem::remove(_disk + "/ballast"); }
-
- private:
-  std::string _disk;
+  testing::SmallDisk disk{sandbox / "disk", "4m"};
 };
 
 TEST_F(FullDiskE2eTest, TheAgentLivesOnSaysSoAndWritesAgainWhenThereIsRoom) {
@@ -48,7 +27,7 @@ TEST_F(FullDiskE2eTest, TheAgentLivesOnSaysSoAndWritesAgainWhenThereIsRoom) {
   RawClient client(sandbox.socketPath());
   client.sendLog("Disk", "before");
   ASSERT_TRUE(client.barrier());
-  fill();
+  disk.fill();
   const std::string longText(3000, 'y');
   for (int i = 0; i < 10; ++i) client.sendLog("Disk", longText);
   ASSERT_TRUE(client.barrier());
@@ -57,12 +36,54 @@ TEST_F(FullDiskE2eTest, TheAgentLivesOnSaysSoAndWritesAgainWhenThereIsRoom) {
   ASSERT_TRUE(client.barrier());
   EXPECT_THAT(output(), HasSubstr("No space left on device"));
   EXPECT_THAT(output(), HasSubstr("/Disk/Disk.log"));
-  makeRoom();
+  disk.makeRoom();
   client.sendLog("Disk", "after");
   ASSERT_TRUE(client.barrier());
   EXPECT_THAT(sandbox.wholeLogSet("Disk"), EndsWith("[test:e2e] after\n"));
   EXPECT_EQ(agent->terminate(), 0);
   EXPECT_THAT(sandbox.sessionFile("Vistel", "Log"), HasSubstr("End Session"));
+}
+
+/// Text that no compression makes much smaller.
+std::string noise(std::size_t bytes) {
+  std::mt19937_64 random(20261121);
+  std::string text;
+  while (text.size() < bytes) text += static_cast<char>('!' + random() % 90);
+  return text;
+}
+
+TEST_F(FullDiskE2eTest, ADumpThatFindsNoRoomForItsArchiveStaysAsItIsAndSaysSo) {
+  start();
+  const std::string content = noise(1'000'000);
+  testing::writeFile(sandbox.logRoot() + "/Vistel/Vistel.log", content);
+  disk.fill(200'000);
+  lirra::Client client = makeClient();
+  const std::string archive = archiveOf(client, ask(client, "Vistel", 0));
+  EXPECT_THAT(archive, EndsWith(".zip"));  // where it would have been
+  EXPECT_FALSE(std::filesystem::exists(archive));
+  ASSERT_THAT(reportsEndingWith(" (not archived)"), SizeIs(1));
+  const std::string kept = reportsEndingWith(" (not archived)")[0];
+  EXPECT_EQ(kept, archive.substr(0, archive.size() - 4) + " (not archived)");
+  EXPECT_EQ(testing::readFile(kept + "/Vistel/Vistel.log"), content);
+  EXPECT_EQ(testing::readFile(kept + "/Reason.txt"), "Vistel");
+  EXPECT_THAT(output(), HasSubstr("No space left on device"));
+  ASSERT_THAT(records(), SizeIs(1));
+  EXPECT_EQ(records()[0].record.state, DumpProgressRecord::State::failed);
+}
+
+TEST_F(FullDiskE2eTest, ADumpOnADiskWithoutAnyRoomIsAnsweredAndLosesNothing) {
+  start();
+  const std::string content = noise(300'000);
+  testing::writeFile(sandbox.logRoot() + "/Vistel/Vistel.log", content);
+  disk.fill();
+  lirra::Client client = makeClient();
+  const std::string archive = archiveOf(client, ask(client, "Vistel", 0x0E));
+  EXPECT_NE(archive, "");
+  EXPECT_FALSE(std::filesystem::exists(archive));
+  EXPECT_EQ(testing::readFile(sandbox.logRoot() + "/Vistel/Vistel.log"), content);
+  disk.makeRoom();
+  const std::string next = archiveOf(client, ask(client, "Messages", 0));
+  EXPECT_THAT(entriesOf(next), ::testing::Contains("Reason.txt"));
 }
 
 }  // namespace
