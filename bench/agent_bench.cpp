@@ -10,6 +10,7 @@
 #include <filesystem>
 #include <vector>
 
+#include "bench/dump/dump_figures.h"
 #include "bench/ingest/idle.h"
 #include "bench/ingest/list_figures.h"
 #include "bench/ingest/rounds.h"
@@ -153,6 +154,24 @@ bool addLists(Rows& rows, std::map<std::string, double> figures) {
   return true;
 }
 
+/// Returned: whether there was a dump.
+bool addDump(Rows& rows, const std::filesystem::path& programs, bool quick) {
+  constexpr double kClosingDelay = 8;
+  constexpr double kLongestHold = 0.020;
+  fprintf(stderr, "a dump, and a client who has nothing to do with it\n");
+  const DumpFigures figures = measureDump(programs, quick ? 0.1 : 0);
+  if (!figures.missing.empty()) {
+    rows.push_back(skipped("a dump's cost", figures.missing));
+    return false;
+  }
+  rows.push_back({"another client's barrier, usual", duration(figures.usualAnswer), "", "", "", ""});
+  rows.push_back({"another client's barrier, longest during a dump", duration(figures.longestAnswer), "", "",
+                  "20 ms", figures.longestAnswer <= kLongestHold ? "met" : "MISSED"});
+  rows.push_back({"dump: request to reply, beyond its own 8 s",
+                  duration(figures.requestToReply - (quick ? 0 : kClosingDelay)), "", "", "", ""});
+  return true;
+}
+
 int run(const std::filesystem::path& programs, bool quick) {
   Extent extent;
   if (quick) extent = {1, 5'000, 50, 3, 2, 20'000};
@@ -164,6 +183,7 @@ int run(const std::filesystem::path& programs, bool quick) {
   addLatency(rows, results);
   addMemory(rows, results);
   bool ownPart = addStartUp(rows, programs, extent.startUps);
+  ownPart = addDump(rows, programs, quick) && ownPart;
   {
     // The idle agent idles on while the lists are measured: its own switches are counted, nobody else's.
     IdleWatch idle(programs);
