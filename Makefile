@@ -8,14 +8,14 @@ FUZZ_SECONDS ?= 120
 TEST_FUZZ_SECONDS ?= 10
 
 .PHONY: help demo test build bench fuzz lint format hooks install clean \
-	dependencies-build dependencies-test dependencies-bench dependencies-develop \
+	dependencies-build dependencies-demo dependencies-test dependencies-bench dependencies-develop \
 	build-plain build-address build-thread test-plain test-address test-thread house-check fuzz-short bench-once
 
 help:
 	@sed -n 's/^## //p' Makefile
 
-## make demo     a real call through the real agent, from nothing to its log files
-demo: build
+## make demo     a real call through the real agent, its log files, and a dump of the whole machine
+demo: build dependencies-demo
 	scripts/demo $(BUILD)
 
 ## make build    the programs, in build/bin
@@ -98,5 +98,5 @@ install: build
 clean:
 	rm -rf $(BUILD)
 
-dependencies-build dependencies-test dependencies-bench dependencies-develop:
+dependencies-build dependencies-demo dependencies-test dependencies-bench dependencies-develop:
 	@scripts/install-dependencies $(@:dependencies-%=%)
