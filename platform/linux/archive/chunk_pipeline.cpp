@@ -5,6 +5,7 @@
 
 #include <cerrno>
 #include <cstring>
+#include <string>
 #include <utility>
 
 #include "platform/linux/files/system_error.h"
@@ -49,7 +50,10 @@ class ChunkPipeline::Worker {
       return;
     }
     result.endsStream = task.last;
-    if (result.read > 1 && _trial.chunkShrinks(input, result.read)) {
+    if (_isEmptyChunk(task, result.read)) {
+      std::memcpy(slot.output.get(), _emptyChunk.data(), _emptyChunk.size());
+      result.size = _emptyChunk.size();
+    } else if (result.read > 1 && _trial.chunkShrinks(input, result.read)) {
       result.size = _compressor->compress(input, result.read, task.last, slot.output.get(), result.read - 1);
     }
     if (result.size > 0) return;
@@ -63,8 +67,22 @@ class ChunkPipeline::Worker {
   }
 
  private:
+  /// Whether it is one of the chunks of zeros that sparse files are full of. They are compressed once.
+  bool _isEmptyChunk(const ChunkTask& task, std::size_t read) {
+    const char* const input = _input.get();
+    if (task.last || read != kChunkSize || input[0] != 0 || std::memcmp(input, input + 1, read - 1) != 0) {
+      return false;
+    }
+    if (_emptyChunk.empty()) {
+      _emptyChunk.resize(kChunkSize / 8);
+      _emptyChunk.resize(_compressor->compress(input, read, false, _emptyChunk.data(), _emptyChunk.size()));
+    }
+    return !_emptyChunk.empty();
+  }
+
   const std::unique_ptr<ChunkCompressor> _compressor;
   CompressionTrial _trial;
+  std::string _emptyChunk;
   const std::unique_ptr<char[]> _input{new char[kChunkSize]};
 };
 

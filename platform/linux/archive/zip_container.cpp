@@ -9,6 +9,8 @@
 #include <limits>
 #include <utility>
 
+#include "platform/linux/wire/little_endian.h"
+
 namespace zal {
 namespace {
 
@@ -18,6 +20,8 @@ constexpr unsigned long kDirectoryAttribute = 0x10;
 constexpr std::size_t kLongestName = 65535;
 // Below 4 GiB by what a stream of stored blocks and the headers may add.
 constexpr std::uint64_t kZip64From = 0xFF000000U;
+constexpr std::uint64_t kWideFrom = 0xFFFFFFFFU, kWideEntries = 0xFFFF;
+constexpr std::size_t kEndSize = 22;
 constexpr int kFirstYear = 1980, kLastYear = 2107;
 
 ArchiveOutput& outputOf(void* stream) { return *static_cast<ArchiveOutput*>(stream); }
@@ -113,6 +117,35 @@ void ZipContainer::endEntry(std::uint64_t size, std::uint32_t crc) {
   _check(::zipCloseFileInZipRaw64(_archive, size, crc));
 }
 
-void ZipContainer::finish() { _check(::zipClose(std::exchange(_archive, nullptr), nullptr)); }
+void ZipContainer::finish() {
+  const std::uint64_t directory = _output.size();
+  _check(::zipClose(std::exchange(_archive, nullptr), nullptr));
+  if (_entries >= kWideEntries && directory < kWideFrom) _addWideEnd(directory);
+}
+
+/// The library counts to 65535 only, unless the archive is larger than 4 GiB: puts the records that
+/// count further before its last one.
+void ZipContainer::_addWideEnd(std::uint64_t directory) {
+  const std::uint64_t wideEnd = _output.size() - kEndSize;
+  std::array<char, 56> end{'P', 'K', 6, 6, 44 /* bytes that follow */};
+  end[12] = end[14] = 45;  // the version that knows this
+  storeLittle(&end[24], _entries, 8);
+  storeLittle(&end[32], _entries, 8);
+  storeLittle(&end[40], wideEnd - directory, 8);
+  storeLittle(&end[48], directory, 8);
+  std::array<char, 20> locator{'P', 'K', 6, 7};
+  storeLittle(&locator[8], wideEnd, 8);
+  locator[16] = 1;  // disk
+  std::array<char, kEndSize> last{'P', 'K', 5, 6};
+  storeLittle(&last[8], kWideEntries, 2);
+  storeLittle(&last[10], kWideEntries, 2);
+  storeLittle(&last[12], wideEnd - directory, 4);
+  storeLittle(&last[16], directory, 4);
+  _output.seek(wideEnd);
+  _output.write(end.data(), end.size());
+  _output.write(locator.data(), locator.size());
+  _output.write(last.data(), last.size());
+  _check(ZIP_OK);
+}
 
 }  // namespace zal

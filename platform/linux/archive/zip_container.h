@@ -38,6 +38,7 @@ class ZipContainer {
 
  private:
   void _check(int result) const;
+  void _addWideEnd(std::uint64_t directory);
 
   ArchiveOutput& _output;
   void* _archive = nullptr;
