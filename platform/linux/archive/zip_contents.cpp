@@ -9,12 +9,12 @@ namespace zal {
 namespace {
 
 constexpr std::uint64_t kLargestText = 1ULL << 30U;
-constexpr std::size_t kLongestName = 65'535;  // what the container can hold
+constexpr std::size_t kLongestEntryName = 65'535;  // what the container can hold
 
-struct CloseArchive {
+struct CloseZip {
   void operator()(void* archive) const { unzClose(archive); }
 };
-using Archive = std::unique_ptr<void, CloseArchive>;
+using OpenZip = std::unique_ptr<void, CloseZip>;
 
 struct Current {
   std::string name;
@@ -26,7 +26,7 @@ std::optional<Current> currentEntry(unzFile archive) {
   if (unzGetCurrentFileInfo64(archive, &entry.information, nullptr, 0, nullptr, 0, nullptr, 0) != UNZ_OK) {
     return std::nullopt;
   }
-  if (entry.information.size_filename > kLongestName) return std::nullopt;
+  if (entry.information.size_filename > kLongestEntryName) return std::nullopt;
   entry.name.resize(entry.information.size_filename + 1);
   if (unzGetCurrentFileInfo64(archive, &entry.information, entry.name.data(), entry.name.size(), nullptr, 0,
                               nullptr, 0) != UNZ_OK) {
@@ -76,7 +76,7 @@ std::optional<std::string> readCurrent(unzFile archive, std::uint64_t bytes) {
 }  // namespace
 
 std::optional<std::vector<ZipEntry>> listZip(const std::string& archive) {
-  const Archive file(unzOpen64(archive.c_str()));
+  const OpenZip file(unzOpen64(archive.c_str()));
   if (!file) return std::nullopt;
   std::vector<ZipEntry> entries;
   const bool readable = forEachEntry(file.get(), [&](const Current& entry) {
@@ -88,7 +88,7 @@ std::optional<std::vector<ZipEntry>> listZip(const std::string& archive) {
 }
 
 std::optional<std::string> readZipEntry(const std::string& archive, const std::string& name) {
-  const Archive file(unzOpen64(archive.c_str()));
+  const OpenZip file(unzOpen64(archive.c_str()));
   if (!file) return std::nullopt;
   std::optional<std::string> text;
   forEachEntry(file.get(), [&](const Current& entry) {
