@@ -21,6 +21,7 @@ namespace zal::testing {
 /// Keeps every alert; the test is the person who answers.
 class FakeUserAlerts : public UserAlerts {
  public:
+  ~FakeUserAlerts() override;
   struct Posted {
     UserAlert alert;
     Listener listener;  ///< empty after it was called
@@ -39,6 +40,7 @@ class FakeUserAlerts : public UserAlerts {
 /// holds the completions back.
 class FakeFileCopier : public FileCopier {
  public:
+  ~FakeFileCopier() override;
   struct Request {
     std::string input, output, identifier;
     CopierOperation operation;
@@ -89,6 +91,7 @@ class FakeFileCopier : public FileCopier {
 
 class FakeDeviceSupport : public DeviceSupport {
  public:
+  ~FakeDeviceSupport() override;
   std::string name;
   bool videoCallsOverCellular = false;
   [[nodiscard]] std::string deviceName() override { return name; }
@@ -98,6 +101,7 @@ class FakeDeviceSupport : public DeviceSupport {
 /// Completes inside the call unless a test holds the completions back.
 class FakeWifiDiagnostics : public WifiDiagnostics {
  public:
+  ~FakeWifiDiagnostics() override;
   struct Taken {
     std::string directory, reason;
     bool operator==(const Taken&) const = default;
@@ -118,6 +122,7 @@ class FakeWifiDiagnostics : public WifiDiagnostics {
 
 class FakeRadioCoexistence : public RadioCoexistence {
  public:
+  ~FakeRadioCoexistence() override;
   bool present = false;
   std::function<void()> whenDumped;
   int lookUps = 0;
@@ -135,6 +140,7 @@ class FakeRadioCoexistence : public RadioCoexistence {
 /// Writes "key = value" lines where the real one writes XML.
 class FakePropertyListWriter : public PropertyListWriter {
  public:
+  ~FakePropertyListWriter() override;
   std::vector<std::pair<std::string, ValueMap>> written;
   std::error_code write(const ValueMap& dictionary, const std::string& path) override {
     written.emplace_back(path, dictionary);
@@ -148,6 +154,7 @@ class FakePropertyListWriter : public PropertyListWriter {
 /// "FAILED reason".
 class RecordingDumpProgress : public DumpProgressRecords {
  public:
+  ~RecordingDumpProgress() override;
   std::vector<std::string> lines;
   std::vector<DumpPlan> plans;
   [[nodiscard]] std::shared_ptr<DumpProgress> begin(DumpPlan plan) override {

@@ -15,6 +15,7 @@ namespace zal::testing {
 /// A message from values; remembers the keys that were asked for, in order.
 class FakeMessage : public Message {
  public:
+  ~FakeMessage() override;
   FakeMessage() = default;
   FakeMessage(std::initializer_list<ValueMap::value_type> entries) : values(entries) {}
 
@@ -65,6 +66,7 @@ class FakeMessage : public Message {
 
 class FakePeer : public PeerConnection {
  public:
+  ~FakePeer() override;
   explicit FakePeer(pid_t processId = 4711) : _processId(processId) {}
   bool connected = true;
   std::vector<std::pair<std::uint64_t, ValueMap>> replies;
@@ -84,6 +86,7 @@ class FakePeer : public PeerConnection {
 /// Hands out listeners through which the test plays the peers.
 class FakeIpcService : public IpcService {
  public:
+  ~FakeIpcService() override;
   std::vector<std::string> listenerNames;
   IpcListener::ErrorHandler onInvalid;
   PeerHandler onPeerEvent;  ///< empty until a listener was resumed

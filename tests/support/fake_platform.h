@@ -16,6 +16,7 @@ namespace zal::testing {
 
 class FakeHostSignals : public HostSignals {
  public:
+  ~FakeHostSignals() override;
   std::function<void()> terminate, reload;
   void onTerminate(std::function<void()> handler) override { terminate = std::move(handler); }
   void onReload(std::function<void()> handler) override { reload = std::move(handler); }
@@ -25,24 +26,8 @@ class FakeHostSignals : public HostSignals {
 /// faked. Each service can be reached by itself, and all together as a Platform.
 class FakePlatform {
  public:
-  FakePlatform() {
-    DirectoryRoots& roots = configuration.roots;
-    roots.UserLogRoot = home / "Logs";
-    roots.MobileLogRoot = home / "Logs";
-    roots.DiagnosticReportRoot = home / "Logs/Reports";
-    roots.WirelessLogRoot = home / "Wireless/Logs";
-    roots.WirelessReportRoot = home / "Wireless/Reports";
-    roots.RootReportRoot = home / "Root/Reports";
-    roots.SystemLogRoot = home / "System/Logs";
-    roots.SystemReportRoot = home / "System/Reports";
-    roots.NetworkConfigRoot = home / "System/Network";
-    roots.MediaLogCacheDir = home / "Media";
-    roots.LocationCacheDir = home / "LocationCache";
-    roots.UartLogFile = home / "uart.log";
-    roots.VarLogRoot = home / "var/log";
-    roots.TemporaryRoot = home / "tmp";
-    std::filesystem::create_directories(roots.TemporaryRoot);
-  }
+  FakePlatform();
+  ~FakePlatform();
 
   TemporaryDirectory home;
   Configuration configuration;
@@ -76,36 +61,7 @@ class FakePlatform {
   Platform platform = with(preferences);
 
   /// The same host with other preferences.
-  [[nodiscard]] Platform with(PreferenceStore& store) {
-    return {.configuration = configuration,
-            .clock = host,
-            .mainLoop = host,
-            .queues = queues,
-            .ipc = ipc,
-            .preferences = store,
-            .systemNotifications = systemNotifications,
-            .localNotifications = localNotifications,
-            .logFacility = logFacility,
-            .agentLog = agentLog,
-            .crashReporter = crashReporter,
-            .files = files,
-            .shell = shell,
-            .processes = processes,
-            .deviceRegistry = deviceRegistry,
-            .systemVersion = systemVersion,
-            .networkStatus = networkStatus,
-            .telephony = telephony,
-            .pings = pings,
-            .processExit = processExit,
-            .hostSignals = hostSignals,
-            .userAlerts = userAlerts,
-            .fileCopier = fileCopier,
-            .deviceSupport = deviceSupport,
-            .wifiDiagnostics = wifiDiagnostics,
-            .radioCoexistence = radioCoexistence,
-            .propertyLists = propertyLists,
-            .dumpProgress = dumpProgress};
-  }
+  [[nodiscard]] Platform with(PreferenceStore& store);
 };
 
 }  // namespace zal::testing

@@ -26,6 +26,7 @@ namespace zal::testing {
 /// "console:CATEGORY: text"; log lines only of enabled categories. Not for several threads.
 class RecordingAgentLog : public AgentLog {
  public:
+  ~RecordingAgentLog() override;
   std::set<std::string, std::less<>> enabledCategories;
   std::vector<std::string> lines;
   int backtraces = 0;
@@ -49,6 +50,7 @@ class RecordingAgentLog : public AgentLog {
 
 class RecordingLogFacility : public PlatformLogFacility {
  public:
+  ~RecordingLogFacility() override;
   struct Kept {
     int level;
     std::string type, category;
@@ -68,6 +70,7 @@ class RecordingLogFacility : public PlatformLogFacility {
 
 class FakePreferences : public PreferenceStore {
  public:
+  ~FakePreferences() override;
   /// What is stored; visible to readers after the next synchronize.
   std::map<std::string, bool, std::less<>> stored;
   std::vector<std::string> readKeys;
@@ -90,6 +93,7 @@ class FakePreferences : public PreferenceStore {
 
 class FakeSystemNotifications : public SystemNotifications {
  public:
+  ~FakeSystemNotifications() override;
   std::vector<std::string> posts;
   std::multimap<std::string, std::function<void()>, std::less<>> observers;
   void observe(std::string name, std::function<void()> handler) override {
@@ -104,6 +108,7 @@ class FakeSystemNotifications : public SystemNotifications {
 
 class RecordingCrashReporter : public CrashReporter {
  public:
+  ~RecordingCrashReporter() override;
   struct Crash {
     pid_t process;
     std::uint32_t code;
@@ -131,6 +136,7 @@ class RecordingCrashReporter : public CrashReporter {
 /// Keeps the lines; `respond` may do what the command would have done and gives the status.
 class ScriptedShell : public SystemShell {
  public:
+  ~ScriptedShell() override;
   std::vector<std::string> commands;
   std::function<int(const std::string&)> respond;
   int PerformSystem(const std::string& commandLine) override {
@@ -141,6 +147,7 @@ class ScriptedShell : public SystemShell {
 
 class FakeProcessTable : public ProcessTable {
  public:
+  ~FakeProcessTable() override;
   std::optional<std::vector<ProcessEntry>> table = std::vector<ProcessEntry>{};
   mutable int reads = 0;
   std::vector<FileWriter> writers;
@@ -159,6 +166,7 @@ class FakeProcessTable : public ProcessTable {
 
 class FakeDeviceRegistry : public DeviceRegistry {
  public:
+  ~FakeDeviceRegistry() override;
   std::optional<std::string> bytes;
   int reads = 0;
   [[nodiscard]] std::optional<std::string> modelBytes() override {
@@ -169,6 +177,7 @@ class FakeDeviceRegistry : public DeviceRegistry {
 
 class FakeSystemVersion : public SystemVersion {
  public:
+  ~FakeSystemVersion() override;
   std::optional<std::map<std::string, std::string>> values;
   int reads = 0;
   [[nodiscard]] std::optional<std::map<std::string, std::string>> read() override {
@@ -179,6 +188,7 @@ class FakeSystemVersion : public SystemVersion {
 
 class FakeNetworkStatus : public NetworkStatus {
  public:
+  ~FakeNetworkStatus() override;
   bool associated = false;
   std::optional<Number> rssi, strength, rate;
   [[nodiscard]] bool isWifiAssociated() override { return associated; }
@@ -189,6 +199,7 @@ class FakeNetworkStatus : public NetworkStatus {
 
 class FakeTelephony : public Telephony {
  public:
+  ~FakeTelephony() override;
   bool reachable = false;
   std::optional<CellularSignal> signal;
   /// What the queries give; one that is not in here fails.
@@ -222,6 +233,7 @@ class FakeTelephony : public Telephony {
 
 class RecordingProcessExit : public ProcessExit {
  public:
+  ~RecordingProcessExit() override;
   std::vector<int> exits;
   void exit(int status) override { exits.push_back(status); }
 };

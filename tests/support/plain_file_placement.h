@@ -13,6 +13,7 @@ namespace zal::testing {
 /// move and copy fail for the sources that it names an error for.
 class PlainFilePlacement : public FilePlacement {
  public:
+  ~PlainFilePlacement() override;
   explicit PlainFilePlacement(std::string home) : _home(std::move(home)) {}
   std::function<std::error_code(const std::string& source)> failWith;
 

@@ -49,9 +49,7 @@ class ScriptedPings : public PingFacility {
   };
 
   /// Tests that never finished are let go: their handlers hold them.
-  ~ScriptedPings() override {
-    for (const auto& test : tests) test->handler = nullptr;
-  }
+  ~ScriptedPings() override;
 
   std::vector<std::shared_ptr<Test>> tests;
   [[nodiscard]] std::shared_ptr<PingTest> makeTest(std::string address, bool useWifi) override {
