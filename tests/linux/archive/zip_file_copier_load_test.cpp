@@ -1,10 +1,8 @@
 #include <sys/mount.h>
 #include <unistd.h>
 
-#include <atomic>
 #include <cerrno>
 #include <cstring>
-#include <thread>
 
 #include "platform/linux/loop/linux_run_loop.h"
 #include "platform/linux/loop/linux_work_queues.h"
@@ -12,8 +10,6 @@
 
 namespace zal::testing {
 namespace {
-
-constexpr std::size_t kMebibyte = 1U << 20U;
 
 bool isSanitized() {
 #if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
@@ -83,30 +79,6 @@ TEST_P(ZipFileCopierLoadTest, AFileOfFiveGigabytes) {
   if (GetParam() == ArchiveCompression::small) return;
   EXPECT_EQ(printed("7z t -bd " + quoted + " > '" + files() + "/said' || cat '" + files() + "/said'"), "");
   EXPECT_EQ(printed("unzip -p " + quoted + " Dump/sparse | cmp - '" + input("sparse") + "'"), "");
-}
-
-/// A file that somebody writes to while it is read: what is there in the end is not the test's choice,
-/// so only what must hold every time is asked for.
-TEST_P(ZipFileCopierLoadTest, AFileThatGrowsIsCutAtTheSizeThatItHad) {
-  writeFile(input("growing"), std::string(3 * kMebibyte, 'a'));
-  std::atomic<bool> stop{false};
-  std::atomic<bool> grown{false};
-  std::thread writer([&] {
-    std::ofstream file(input("growing"), std::ios::app);
-    while (!stop) {
-      file << "more of it\n" << std::flush;
-      grown = true;
-    }
-  });
-  while (!grown) std::this_thread::yield();
-  archive();
-  stop = true;
-  writer.join();
-  EXPECT_EQ(log.lines, std::vector<std::string>{});
-  EXPECT_EQ(complaintsAbout(output()), "");
-  const std::string content = printed("unzip -p '" + output() + "' Dump/growing");
-  EXPECT_GE(content.size(), 3 * kMebibyte);
-  EXPECT_EQ(content, readFile(input("growing")).substr(0, content.size()));
 }
 
 /// Real queues, two threads of them at work at once.
