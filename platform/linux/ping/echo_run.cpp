@@ -14,13 +14,14 @@ constexpr int kEventsAtOnce = 64;
 
 }  // namespace
 
-EchoRun::EchoRun(asio::io_context& context, EchoSocket socket, std::shared_ptr<PingReport> report,
-                 std::function<void()> onEnd)
+EchoRun::EchoRun(asio::io_context& context, EchoSocket socket, std::chrono::nanoseconds duration,
+                 std::shared_ptr<PingReport> report, std::function<void()> onEnd)
     : _socket(std::move(socket)),
       _readiness(context, _socket.descriptor()),
       _timer(context),
       _report(std::move(report)),
-      _onEnd(std::move(onEnd)) {}
+      _onEnd(std::move(onEnd)),
+      _duration(duration) {}
 
 EchoRun::~EchoRun() {
   if (_readiness.is_open()) _readiness.release();
@@ -46,8 +47,13 @@ std::chrono::milliseconds EchoRun::_elapsed() const {
   return std::chrono::duration_cast<std::chrono::milliseconds>(std::chrono::steady_clock::now() - _started);
 }
 
+bool EchoRun::_hasNothingToWaitFor() const {
+  return _unanswered == 0 && _timer.expiry() >= _started + _duration;
+}
+
 void EchoRun::_sendNext() {
   ++_sequence;
+  ++_unanswered;
   _requests[_sequence] = {std::chrono::steady_clock::now(), false};
   const std::error_code error = _socket.send(_sequence);
   // A refused request counts as sent and lost: the interval without it would look like a good one.
@@ -68,7 +74,11 @@ void EchoRun::_waitForEvents() {
                         [self = shared_from_this()](const std::error_code& cancelled) {
                           if (cancelled || !self->_onEnd) return;
                           self->_takeEvents();
-                          self->_waitForEvents();
+                          if (self->_hasNothingToWaitFor()) {
+                            self->stop();
+                          } else {
+                            self->_waitForEvents();
+                          }
                         });
 }
 
@@ -89,6 +99,7 @@ void EchoRun::_take(const EchoAnswer& answer) {
   const auto waited = std::clamp(answer.waited, std::chrono::nanoseconds{0}, whole);
   const auto roundTrip = std::chrono::duration_cast<std::chrono::microseconds>(whole - waited);
   const bool duplicate = std::exchange(request.answered, true);
+  if (!duplicate) --_unanswered;
   _report->updateStatistics([&](PingStatistics& statistics) {
     statistics.elapsed = _elapsed();
     if (duplicate) {

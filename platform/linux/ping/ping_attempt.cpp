@@ -118,7 +118,7 @@ void PingAttempt::_openRun(const asio::ip::address& peer, const SourceProbe& pro
     if (socket.isOpen()) {
       _log.log(kLogCategory, "Pinging " + _task.host + " over " + _task.interface + " through a " + name);
       _addHeading(peer, probe);
-      _start(std::make_shared<EchoRun>(_context, std::move(socket), _task.report, onEnd));
+      _start(std::make_shared<EchoRun>(_context, std::move(socket), _task.duration, _task.report, onEnd));
       return;
     }
     refusals += std::string(name) + ": " + error.message() + "; ";

@@ -112,7 +112,7 @@ TEST_F(PingPacketsTest, PartialLossIsASuccess) {
 TEST_F(PingPacketsTest, OneRequestASecond) {
   const auto begin = std::chrono::steady_clock::now();
   run("10.77.0.2", 2.5);
-  EXPECT_GE(std::chrono::steady_clock::now() - begin, 2500ms);
+  EXPECT_GE(std::chrono::steady_clock::now() - begin, 2000ms);  // the last request goes out then
   EXPECT_EQ(timeless(result), "3 packets transmitted, 3 received, 0% packet loss, time Tms");
 }
 
