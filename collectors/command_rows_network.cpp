@@ -182,6 +182,6 @@ const std::span<const CommandRow> kNetworkRoutes = kNetworkRoutesRows;
 const std::span<const CommandRow> kNetworkConsoleEnd = kNetworkConsoleEndRows;
 
 const CommandRow kStopReaders = {
-    "captures.stop", "/usr/bin/killall -9 tessel", "/usr/bin/killall -9 {reader}", {}};
+    "captures.stop", "/usr/bin/killall -9 tessel", "/usr/bin/killall -q -9 {reader}", {}};
 
 }  // namespace zal::command_rows

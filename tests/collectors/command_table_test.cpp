@@ -238,7 +238,7 @@ bluetooth.kill-corvell: /usr/bin/killall -USR2 bluetoothd > kill_corvell_usr2_co
 [pushService]
 push.pushprobe-state: /usr/local/bin/pushprobe -dumpState > pushprobe_state.txt
 [no file]
-/usr/bin/killall -9 tessel
+/usr/bin/killall -q -9 tessel
 )rows");
 }
 
@@ -311,7 +311,7 @@ TEST_F(CommandTableTest, RowsThatDoNotExistAreNamedInOneWarning) {
 TEST_F(CommandTableTest, ReadersAreKilledByTheNameTheyWereStartedUnder) {
   configuration.commands.systemLogReader = "tessel-7";
   EXPECT_EQ(line("captures.syslog"), "/usr/lib/zal/tessel-7 -w");
-  EXPECT_EQ(table().stopReadersCommand(), "/usr/bin/killall -9 tessel-7");
+  EXPECT_EQ(table().stopReadersCommand(), "/usr/bin/killall -q -9 tessel-7");
 }
 
 TEST_F(CommandTableTest, StopOfTheReadersCanBeConfigured) {
