@@ -13,8 +13,10 @@
 namespace zal {
 namespace {
 
-// Measured over a dump's kind of files: one less makes archives larger than the usual tools do.
-constexpr int kSmallLevel = 6;
+// Measured over a dump's kind of files: one less throughout makes archives larger than the usual tools do,
+// but what leaves much anyway (captures, tables) gains next to nothing by the last level.
+constexpr int kSmallLevel = 6, kSmallLevelOfStubborn = 5;
+constexpr double kStubbornShare = 0.4;
 constexpr int kFastLevel = 3;
 constexpr int kTrialLevel = 1;
 constexpr std::size_t kLongestStored = 65535;
@@ -44,10 +46,9 @@ std::size_t deflateAtOnce(isal_zstream& stream, int level, std::uint8_t* workspa
 
 class FastCompressor : public ChunkCompressor {
  public:
-  std::size_t compress(const char* chunk, std::size_t size, bool last, char* output,
-                       std::size_t capacity) override {
-    return deflateAtOnce(_stream, kFastLevel, _workspace.data(), _workspace.size(), chunk, size, last, output,
-                         capacity);
+  std::size_t compress(const Chunk& chunk, char* output, std::size_t capacity) override {
+    return deflateAtOnce(_stream, kFastLevel, _workspace.data(), _workspace.size(), chunk.bytes, chunk.size,
+                         chunk.last, output, capacity);
   }
 
  private:
@@ -55,22 +56,28 @@ class FastCompressor : public ChunkCompressor {
   std::array<std::uint8_t, ISAL_DEF_LVL3_DEFAULT> _workspace;
 };
 
+using Compressor = std::unique_ptr<libdeflate_compressor, void (*)(libdeflate_compressor*)>;
+
+Compressor makeCompressor(int level) {
+  Compressor compressor(::libdeflate_alloc_compressor(level), &::libdeflate_free_compressor);
+  if (!compressor) throw std::bad_alloc();
+  return compressor;
+}
+
 class SmallCompressor : public ChunkCompressor {
  public:
-  SmallCompressor() : _compressor(::libdeflate_alloc_compressor(kSmallLevel), &::libdeflate_free_compressor) {
-    if (!_compressor) throw std::bad_alloc();
-  }
-  std::size_t compress(const char* chunk, std::size_t size, bool last, char* output,
-                       std::size_t capacity) override {
+  std::size_t compress(const Chunk& chunk, char* output, std::size_t capacity) override {
     if (capacity <= kContinuationRoom) return 0;
-    const std::size_t written =
-        ::libdeflate_deflate_compress(_compressor.get(), chunk, size, output, capacity - kContinuationRoom);
+    const Compressor& compressor = chunk.share > kStubbornShare ? _ofStubborn : _usual;
+    const std::size_t written = ::libdeflate_deflate_compress(compressor.get(), chunk.bytes, chunk.size,
+                                                              output, capacity - kContinuationRoom);
     // The library knows whole streams only.
-    return last || written == 0 ? written : _continuation.letAnotherFollow(output, written, size);
+    return chunk.last || written == 0 ? written : _continuation.letAnotherFollow(output, written, chunk.size);
   }
 
  private:
-  const std::unique_ptr<libdeflate_compressor, void (*)(libdeflate_compressor*)> _compressor;
+  const Compressor _usual = makeCompressor(kSmallLevel);
+  const Compressor _ofStubborn = makeCompressor(kSmallLevelOfStubborn);
   DeflateContinuation _continuation;
 };
 
@@ -90,14 +97,16 @@ struct CompressionTrial::Workspace {
 CompressionTrial::CompressionTrial() : _workspace(std::make_unique<Workspace>()) {}
 CompressionTrial::~CompressionTrial() = default;
 
-bool CompressionTrial::shrinks(const char* sample, std::size_t size) {
-  return deflateAtOnce(_workspace->stream, kTrialLevel, _workspace->level.data(), _workspace->level.size(),
-                       sample, size, true, _workspace->output.data(), size - size / 32) > 0;
+double CompressionTrial::share(const char* sample, std::size_t size) {
+  const std::size_t left =
+      deflateAtOnce(_workspace->stream, kTrialLevel, _workspace->level.data(), _workspace->level.size(),
+                    sample, size, true, _workspace->output.data(), size);
+  return left > 0 ? static_cast<double>(left) / static_cast<double>(size) : 1;
 }
 
-bool CompressionTrial::chunkShrinks(const char* chunk, std::size_t size) {
-  if (size < 8 * kSample) return true;
-  return shrinks(chunk + size / 4, kSample) || shrinks(chunk + size / 4 * 3, kSample);
+double CompressionTrial::chunkShare(const char* chunk, std::size_t size) {
+  if (size < 8 * kSample) return 0;
+  return (share(chunk + size / 4, kSample) + share(chunk + size / 4 * 3, kSample)) / 2;
 }
 
 std::size_t storeChunk(const char* chunk, std::size_t size, bool last, char* output) {

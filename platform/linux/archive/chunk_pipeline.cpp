@@ -53,8 +53,11 @@ class ChunkPipeline::Worker {
     if (_isEmptyChunk(task, result.read)) {
       std::memcpy(slot.output.get(), _emptyChunk.data(), _emptyChunk.size());
       result.size = _emptyChunk.size();
-    } else if (result.read > 1 && _trial.chunkShrinks(input, result.read)) {
-      result.size = _compressor->compress(input, result.read, task.last, slot.output.get(), result.read - 1);
+    } else if (result.read > 1) {
+      const Chunk chunk{input, result.read, task.last, _trial.chunkShare(input, result.read)};
+      if (chunk.share < CompressionTrial::kHardlyShrinks) {
+        result.size = _compressor->compress(chunk, slot.output.get(), result.read - 1);
+      }
     }
     if (result.size > 0) return;
     if (task.first && task.last) {
@@ -75,7 +78,7 @@ class ChunkPipeline::Worker {
     }
     if (_emptyChunk.empty()) {
       _emptyChunk.resize(kChunkSize / 8);
-      _emptyChunk.resize(_compressor->compress(input, read, false, _emptyChunk.data(), _emptyChunk.size()));
+      _emptyChunk.resize(_compressor->compress({input, read, false}, _emptyChunk.data(), _emptyChunk.size()));
     }
     return !_emptyChunk.empty();
   }

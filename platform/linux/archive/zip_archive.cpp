@@ -84,7 +84,9 @@ class ArchiveWriter {
     for (std::uint64_t place = 0; place < kTrialPlaces; ++place) {
       const ssize_t got = ::pread(file.get(), sample.data(), sample.size(),
                                   static_cast<off_t>(size / kTrialPlaces * place + size / kTrialPlaces / 2));
-      if (got <= 0 || _trial.shrinks(sample.data(), static_cast<std::size_t>(got))) return true;
+      if (got <= 0) return true;
+      if (_trial.share(sample.data(), static_cast<std::size_t>(got)) < CompressionTrial::kHardlyShrinks)
+        return true;
     }
     return false;
   }

@@ -30,7 +30,8 @@ class ChunkCompressorTest : public ::testing::TestWithParam<ArchiveCompression> 
   /// One piece; stored when it does not shrink.
   std::string piece(const std::string& chunk, bool last) {
     std::string output(storedSize(chunk.size()), '\0');
-    std::size_t size = compressor->compress(chunk.data(), chunk.size(), last, output.data(), chunk.size());
+    std::size_t size =
+        compressor->compress({chunk.data(), chunk.size(), last, share}, output.data(), chunk.size());
     if (size == 0) size = storeChunk(chunk.data(), chunk.size(), last, output.data());
     output.resize(size);
     return output;
@@ -41,6 +42,7 @@ class ChunkCompressorTest : public ::testing::TestWithParam<ArchiveCompression> 
     for (std::size_t i = 0; i < size; ++i) text += static_cast<char>('a' + random() % (random() % kinds + 1));
     return text;
   }
+  double share = 0;
   std::mt19937 random{20240502};
   const std::unique_ptr<ChunkCompressor> compressor = makeChunkCompressor(GetParam());
 };
@@ -55,6 +57,7 @@ TEST_P(ChunkCompressorTest, PiecesOfEveryLengthMakeOneStream) {
                                  65535U, 65536U, 65537U, 100'000U, 300'000U}) {
     for (const unsigned kinds : {1U, 2U, 5U, 26U, 200U}) {
       const std::string chunk = letters(size, kinds);
+      share = kinds > 5 ? 0.9 : 0.1;  // which decides on the effort
       content += chunk;
       stream += piece(chunk, false);
     }
@@ -74,10 +77,10 @@ TEST_P(ChunkCompressorTest, EveryEndOfAPieceLetsAnotherFollow) {
 TEST_P(ChunkCompressorTest, WhatDoesNotFitIsRefused) {
   const std::string chunk = letters(50'000, 26);
   std::string output(50'000, '\0');
-  EXPECT_GT(compressor->compress(chunk.data(), chunk.size(), true, output.data(), output.size()), 0U);
+  EXPECT_GT(compressor->compress({chunk.data(), chunk.size(), true}, output.data(), output.size()), 0U);
   for (const std::size_t capacity : {0U, 1U, 5U, 6U, 100U, 1000U}) {
-    EXPECT_EQ(compressor->compress(chunk.data(), chunk.size(), true, output.data(), capacity), 0U);
-    EXPECT_EQ(compressor->compress(chunk.data(), chunk.size(), false, output.data(), capacity), 0U);
+    EXPECT_EQ(compressor->compress({chunk.data(), chunk.size(), true}, output.data(), capacity), 0U);
+    EXPECT_EQ(compressor->compress({chunk.data(), chunk.size(), false}, output.data(), capacity), 0U);
   }
 }
 
@@ -87,12 +90,13 @@ TEST(CompressionTrialTest, TellsTextFromWhatIsCompressedAlready) {
   for (std::size_t i = 0; i < 100'000; ++i) noise += static_cast<char>(random());
   while (text.size() < 100'000) text += "line " + std::to_string(random()) + "\n";
   CompressionTrial trial;
-  EXPECT_FALSE(trial.shrinks(noise.data(), CompressionTrial::kSample));
-  EXPECT_TRUE(trial.shrinks(text.data(), CompressionTrial::kSample));
-  EXPECT_FALSE(trial.chunkShrinks(noise.data(), noise.size()));
-  EXPECT_TRUE(trial.chunkShrinks(text.data(), text.size()));
-  EXPECT_TRUE(trial.chunkShrinks((text + noise).data(), 200'000));
-  EXPECT_TRUE(trial.chunkShrinks((noise + text).data(), 200'000));
+  const std::string mixed = text + noise;
+  EXPECT_EQ(trial.share(noise.data(), CompressionTrial::kSample), 1);
+  EXPECT_EQ(trial.chunkShare(noise.data(), noise.size()), 1);
+  EXPECT_LT(trial.share(text.data(), CompressionTrial::kSample), 0.7);
+  EXPECT_LT(trial.chunkShare(text.data(), text.size()), 0.7);
+  EXPECT_LT(trial.chunkShare(mixed.data(), mixed.size()), CompressionTrial::kHardlyShrinks);
+  EXPECT_EQ(trial.chunkShare(noise.data(), 1000), 0);
 }
 
 TEST(StoredChunkTest, HoldsItsBytesAsTheyAre) {
