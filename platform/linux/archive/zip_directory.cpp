@@ -16,7 +16,7 @@ namespace {
 // The format's records: their signatures and fixed parts.
 constexpr std::uint32_t kEntryMark = 0x02014B50, kHeaderMark = 0x04034B50, kEndMark = 0x06054B50;
 constexpr std::uint32_t kWideEndMark = 0x06064B50, kWideLocatorMark = 0x07064B50;
-constexpr std::size_t kEntrySize = 46, kHeaderSize = 30, kEndSize = 22;
+constexpr std::size_t kEntrySize = 46, kHeaderSize = 30, kEndRecordSize = 22;
 constexpr std::size_t kWideEndSize = 56, kWideLocatorSize = 20;
 constexpr std::uint64_t kWideField = 1;
 constexpr std::uint64_t kSeeWide = 0xFFFFFFFF, kSeeWideCount = 0xFFFF;
@@ -66,14 +66,14 @@ bool ZipDirectory::_findDirectory() {
   struct stat status {};
   if (::fstat(_file, &status) != 0) return false;
   const auto size = static_cast<std::uint64_t>(status.st_size);
-  std::array<char, kEndSize> end{};
-  if (size < kEndSize || !readAt(_file, size - kEndSize, end.data(), end.size())) return false;
+  std::array<char, kEndRecordSize> end{};
+  if (size < kEndRecordSize || !readAt(_file, size - kEndRecordSize, end.data(), end.size())) return false;
   const auto comment = loadLittle(end.data() + 20, 2);
   if (loadLittle(end.data(), 4) != kEndMark || comment != 0) return false;
   _entries = loadLittle(end.data() + 10, 2);
   std::uint64_t length = loadLittle(end.data() + 12, 4);
   _begin = loadLittle(end.data() + 16, 4);
-  _end = size - kEndSize;
+  _end = size - kEndRecordSize;
   if (_entries == kSeeWideCount || length == kSeeWide || _begin == kSeeWide) {
     std::array<char, kWideLocatorSize> locator{};
     std::array<char, kWideEndSize> wide{};
