@@ -4,6 +4,7 @@
 
 #include "platform/linux/alerts/alert_file.h"
 #include "platform/linux/config/host_paths.h"
+#include "platform/linux/files/root_parents.h"
 #include "platform/linux/files/temporary_leftovers.h"
 #include "platform/linux/notifications/notification_file.h"
 #include "platform/linux/progress/progress_file.h"
@@ -85,6 +86,7 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
                 .propertyLists = _propertyLists,
                 .dumpProgress = _dumpProgress} {
   std::signal(SIGPIPE, SIG_IGN);
+  makeRootParents(_loaded.configuration.roots);
   _agentLog.setLogFacility(&_logFacility);
   for (const std::string& warning : _loaded.warnings) _agentLog.warning(warning);
   removeTemporaryLeftoversLater(_queues.global(QueuePriority::background), _clock, _agentLog,
