@@ -25,7 +25,7 @@ std::string redirected(std::string_view commandLine, std::string_view directory,
 
 void CommandRunner::RunCommandInBackground(std::string_view commandLine, std::string_view directory,
                                            std::string_view fileName) {
-  _shell.PerformSystem(redirected(commandLine, directory, fileName) + " &");
+  _shell.PerformSystemInBackground(redirected(commandLine, directory, fileName) + " &");
 }
 
 void CommandRunner::RunCommandAndWait(std::string_view commandLine, std::string_view directory,

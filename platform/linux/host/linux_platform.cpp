@@ -45,6 +45,7 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
       _crashReporter(_agentLog),
       _files(environment.homeDirectory, temporaryArea(_loaded.configuration.roots, environment)),
       _shell(_agentLog),
+      _queueingShell(_shell, _queues),
       _systemVersion(_loaded.configuration.systemVersionFile),
       _pings(_mainLoop.context(), _loaded.configuration.interfaces, _agentLog),
       _userAlerts(_mainLoop.context(), _mainLoop, _clock, _agentLog,
@@ -54,6 +55,7 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
       _processExit([this] {
         _ipc.stopListening();
         _userAlerts.cutOffWaiting();
+        _queueingShell.startWhatIsQueued();
         _logFacility.flush();
       }),
       _hostSignals(_mainLoop, [this] { _ipc.terminationImminent(); }),
@@ -69,7 +71,7 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
                 .agentLog = _agentLog,
                 .crashReporter = _crashReporter,
                 .files = _files,
-                .shell = _shell,
+                .shell = _queueingShell,
                 .processes = _processes,
                 .deviceRegistry = _deviceRegistry,
                 .systemVersion = _systemVersion,

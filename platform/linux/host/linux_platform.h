@@ -28,6 +28,7 @@
 #include "platform/linux/process/immediate_process_exit.h"
 #include "platform/linux/process/posix_shell.h"
 #include "platform/linux/process/procfs_process_table.h"
+#include "platform/linux/process/queueing_shell.h"
 #include "platform/linux/progress/runtime_dump_progress.h"
 #include "platform/linux/property_list/pugixml_property_list_writer.h"
 #include "platform/platform.h"
@@ -61,6 +62,7 @@ class LinuxPlatform {
   AbsentCrashReporter _crashReporter;
   PosixFilePlacement _files;
   PosixShell _shell;
+  QueueingShell _queueingShell;
   ProcfsProcessTable _processes;
   LinuxDeviceRegistry _deviceRegistry;
   LinuxSystemVersion _systemVersion;
