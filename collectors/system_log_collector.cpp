@@ -10,7 +10,7 @@ namespace zal {
 namespace {
 
 constexpr std::string_view kSystemLogPrefix = "SystemLog";
-constexpr std::size_t kTimestampPosition = 10;
+constexpr std::size_t kSystemLogTimestampPosition = 10;
 
 // The doubled entry is as old as the list and changes nothing.
 const std::vector<std::string>& crashReportFragments() {
@@ -30,7 +30,7 @@ void LogCollectors::CollectSystemLogs(const std::string& destination, WallTime s
   walkLogs(_services.log, "system logs", [&] {
     for (const auto& name : sortedNames(source, _services.placement)) {
       if (!name.starts_with(kSystemLogPrefix)) continue;
-      const auto stamp = timestampAt(name, kTimestampPosition, kCompactTimestamp, _services.clock);
+      const auto stamp = timestampAt(name, kSystemLogTimestampPosition, kCompactTimestamp, _services.clock);
       if (stamp && *stamp > limit) {
         _services.files.LinkFileIntoDirectory(source + "/" + name, destination, "");
       }
