@@ -11,9 +11,9 @@
 #include <utility>
 #include <vector>
 
+#include "platform/linux/files/descriptor.h"
 #include "platform/linux/files/file_content.h"
 #include "platform/linux/files/system_error.h"
-#include "platform/linux/files/descriptor.h"
 
 namespace zal {
 

@@ -6,8 +6,8 @@
 
 #include <asio/posix/stream_descriptor.hpp>
 
-#include "platform/linux/ipc/access_policy.h"
 #include "platform/linux/files/descriptor.h"
+#include "platform/linux/ipc/access_policy.h"
 #include "platform/linux/ipc/ipc_context.h"
 #include "platform/linux/wire/frame_decoder.h"
 

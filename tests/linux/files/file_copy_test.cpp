@@ -10,8 +10,8 @@
 #include <filesystem>
 #include <string>
 
-#include "platform/linux/files/file_content.h"
 #include "platform/linux/files/descriptor.h"
+#include "platform/linux/files/file_content.h"
 #include "tests/support/real_places.h"
 #include "tests/support/temporary_directory.h"
 
