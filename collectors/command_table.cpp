@@ -6,6 +6,7 @@
 
 #include "collectors/command_rows.h"
 #include "collectors/command_runner.h"
+#include "collectors/single_quoted.h"
 #include "platform/agent_log.h"
 #include "platform/configuration.h"
 
@@ -49,9 +50,7 @@ std::string shellWord(std::string_view value) {
                   [](char c) { return isPlain(static_cast<unsigned char>(c)); })) {
     return std::string(value);
   }
-  std::string quoted = "'";
-  for (const char c : value) quoted += c == '\'' ? std::string("'\\''") : std::string(1, c);
-  return quoted + "'";
+  return singleQuoted(value);
 }
 
 std::string filledIn(std::string_view line, const Configuration& configuration) {

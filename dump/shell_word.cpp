@@ -2,6 +2,8 @@
 
 #include <algorithm>
 
+#include "collectors/single_quoted.h"
+
 namespace zal {
 namespace {
 
@@ -13,16 +15,7 @@ std::string wordOf(std::string_view text, std::string_view alsoPlain) {
     return kPlain.find(c) != std::string_view::npos || alsoPlain.find(c) != std::string_view::npos;
   };
   if (!text.empty() && std::all_of(text.begin(), text.end(), isPlain)) return std::string(text);
-  std::string word = "'";
-  for (const char c : text) {
-    // Nothing can stand for a quote inside quotes: they are closed, one follows, they are opened.
-    if (c == '\'') {
-      word += "'\\''";
-    } else {
-      word += c;
-    }
-  }
-  return word + "'";
+  return singleQuoted(text);
 }
 
 }  // namespace
