@@ -88,8 +88,12 @@ std::string ActionDispatcher::_makeSessionDirectory() {
 }
 
 void ActionDispatcher::_dumpBaseband(const ActionRequest& request) {
-  _services.collectors.cellular.DumpBasebandState(textOf(request.userInfo, "reasonForSnapshot"),
-                                                  "Vistel/Quillet");
+  // Not here: the telephony service may take its time, and other clients wait.
+  _services.platform.queues.global(QueuePriority::standard)
+      .async([&cellular = _services.collectors.cellular,
+              reason = textOf(request.userInfo, "reasonForSnapshot")] {
+        cellular.DumpBasebandState(reason, "Vistel/Quillet");
+      });
 }
 
 void ActionDispatcher::_collectVideoCallLogs() {

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <functional>
 #include <memory>
 #include <optional>
 #include <string_view>
@@ -68,12 +69,18 @@ class TelephonyConnection {
   virtual void dumpBasebandState(std::string_view reason) = 0;
 };
 
-/// The host telephony service. Any thread.
+/// The host telephony service.
 class Telephony {
  public:
+  /// Nothing when the service cannot be reached, failed, or did not answer in time.
+  using SignalHandler = std::function<void(std::optional<CellularSignal> signal)>;
   virtual ~Telephony() = default;
-  /// Nothing when the service cannot be reached.
+  /// Nothing when the service cannot be reached. Any thread that may wait a while; not the main one.
   [[nodiscard]] virtual std::unique_ptr<TelephonyConnection> connect() = 0;
+  /// The signal strength without a wait: opens and closes what it needs. Main thread only; the handler
+  /// runs there, once, within a second, perhaps inside the call. While an earlier question is still
+  /// open, a new one is answered with nothing at once.
+  virtual void sampleSignal(SignalHandler handler) = 0;
 };
 
 }  // namespace zal

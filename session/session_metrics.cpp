@@ -33,9 +33,12 @@ void ZalLoggingAgentVistelSession::_addQualityMetric(OptionalText name, std::opt
 }
 
 void ZalLoggingAgentVistelSession::_gatherQualityMetrics() {
-  for (const auto& [name, value] : signalMetricsSnapshot(_services.telephony, _services.networkStatus)) {
-    _addQualityMetric(name, value, kOwnSender);
-  }
+  gatherSignalMetrics(_services.telephony, _services.networkStatus,
+                      [this, pulse = std::weak_ptr<bool>(_pulseIsOn)](const SignalMetricsSnapshot& snapshot) {
+                        // An answer that comes after the end would begin the session again.
+                        if (pulse.expired()) return;
+                        for (const auto& [name, value] : snapshot) _addQualityMetric(name, value, kOwnSender);
+                      });
 }
 
 void ZalLoggingAgentVistelSession::_appendQualityMetrics() {

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <functional>
 #include <map>
 #include <string>
 
@@ -9,10 +10,14 @@
 
 namespace zal {
 
-/// Metric name to value. What the host cannot tell is left out; Wi-Fi that is not associated counts
-/// as zeros.
+/// Metric name to value. What the host cannot tell, or not in time, is left out; Wi-Fi that is not
+/// associated counts as zeros.
 using SignalMetricsSnapshot = std::map<std::string, Number>;
 
-[[nodiscard]] SignalMetricsSnapshot signalMetricsSnapshot(Telephony& telephony, NetworkStatus& networkStatus);
+using SignalMetricsHandler = std::function<void(const SignalMetricsSnapshot& snapshot)>;
+
+/// Asks both services and waits for neither: the handler runs once on the main thread, perhaps inside
+/// the call. The services outlive the answer. Main thread only.
+void gatherSignalMetrics(Telephony& telephony, NetworkStatus& networkStatus, SignalMetricsHandler handler);
 
 }  // namespace zal

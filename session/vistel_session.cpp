@@ -36,6 +36,7 @@ void ZalLoggingAgentVistelSession::beginSessionWithSender(OptionalText sender) {
   _simpleLogs.addLog(line, _currentTimeOfDay());
   _verboseLogs.addLog(line, _currentTimeOfDay());
   if (!_qualityPulse.isSet()) {
+    _pulseIsOn = std::make_shared<bool>(true);
     _qualityPulse =
         ScopedTimer(_services.mainLoop,
                     _services.mainLoop.callEvery(kQualityPulseInterval, [this] { _gatherQualityMetrics(); }));
@@ -46,6 +47,7 @@ void ZalLoggingAgentVistelSession::beginSessionWithSender(OptionalText sender) {
 void ZalLoggingAgentVistelSession::endSessionWithSender(OptionalText sender) {
   _mainThread.check("ZalLoggingAgentVistelSession");
   _qualityPulse.cancel();
+  _pulseIsOn.reset();
   _dateEnded = _services.clock.wallNow();
   _active = false;
   if (_simpleLogs.count() == 0 && _verboseLogs.count() == 0) {

@@ -154,6 +154,7 @@ class ZalLoggingAgentVistelSession : public std::enable_shared_from_this<ZalLogg
   std::uint32_t _endFlags = 0;
   MainThreadCheck _mainThread;
   ScopedTimer _qualityPulse;
+  std::shared_ptr<bool> _pulseIsOn;  // there from begin to end: answers to its questions look for it
   ScopedTimer _inactivity;
 };
 

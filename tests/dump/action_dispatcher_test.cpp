@@ -56,6 +56,8 @@ TEST_F(ActionDispatcherTest, ABasebandSnapshotIsTakenWithTheReasonOrTheLabel) {
   fake.telephony.reachable = true;
   perform(0, "Vistel", {{"reasonForSnapshot", "no voice"}});
   performWith(0, "Vistel", nullptr, &message);
+  EXPECT_THAT(fake.telephony.basebandDumps, IsEmpty());
+  finish();
   EXPECT_THAT(fake.telephony.basebandDumps,
               ElementsAre("no voice", "Baseband dump for Vistel/Quillet logging"));
 }

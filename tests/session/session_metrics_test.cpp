@@ -76,14 +76,13 @@ TEST_F(SessionMetricsTest, SamplesOnThe10thSecondAgain) {
 )");
 }
 
-TEST_F(SessionMetricsTest, SamplesTheCellAndClosesItsConnections) {
+TEST_F(SessionMetricsTest, SamplesTheCell) {
   fakes.telephony.reachable = true;
   fakes.telephony.signal = CellularSignal{-87, 61, 3};
   fakes.networkStatus.associated = true;
   session->beginSessionWithSender("caller");
   noteCheckpoints(2);
   host.advance(5s);
-  EXPECT_EQ(fakes.telephony.open, 0);
   session->endSessionWithSender("caller");
   EXPECT_TRUE(entriesOf(qualityLog())
                   .starts_with(R"([Sender: Lirra] cell-signal-graded: 3   [14:03:12.251  (2024-05-02) (CEST)]
@@ -99,6 +98,24 @@ TEST_F(SessionMetricsTest, TakesNoSampleAfterTheEnd) {
   host.advance(60s);
   EXPECT_FALSE(session->isActive());
   EXPECT_EQ(fakes.agentLog.lines, Lines{});
+}
+
+TEST_F(SessionMetricsTest, AnAnswerThatComesAfterTheEndIsNoSampleAndNoBegin) {
+  fakes.networkStatus.hangs = true;
+  session->beginSessionWithSender("caller");
+  host.advance(5s);
+  session->endSessionWithSender("caller");
+  ASSERT_EQ(fakes.networkStatus.waiting.size(), 1U);
+  fakes.networkStatus.waiting.front()(WifiSignal{});
+  EXPECT_FALSE(session->isActive());
+  session->beginSessionWithSender("caller");
+  noteCheckpoints(2);
+  fakes.networkStatus.waiting.front()(WifiSignal{});
+  session->endSessionWithSender("caller");
+  const std::string log =
+      readFile(base + "/2024-05-02 at 14-03-12 (CEST) (Receiver)/Quality Log (14-03-12).log");
+  EXPECT_NE(log, "");
+  EXPECT_EQ(log.find("wifi-signal"), std::string::npos);
 }
 
 TEST_F(SessionMetricsTest, AForcedBeginStartsTheFiveSecondsAnew) {

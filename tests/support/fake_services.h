@@ -191,10 +191,15 @@ class FakeNetworkStatus : public NetworkStatus {
   ~FakeNetworkStatus() override;
   bool associated = false;
   std::optional<Number> rssi, strength, rate;
-  [[nodiscard]] bool isWifiAssociated() override { return associated; }
-  [[nodiscard]] std::optional<Number> scaledRssi() override { return rssi; }
-  [[nodiscard]] std::optional<Number> signalStrength() override { return strength; }
-  [[nodiscard]] std::optional<Number> scaledRate() override { return rate; }
+  bool hangs = false;                ///< answers only when told to
+  std::vector<WifiHandler> waiting;  ///< for that answer
+  void sampleWifi(WifiHandler handler) override {
+    if (hangs) {
+      waiting.push_back(std::move(handler));
+    } else {
+      handler(WifiSignal{associated, rssi, strength, rate});
+    }
+  }
 };
 
 class FakeTelephony : public Telephony {
@@ -211,6 +216,7 @@ class FakeTelephony : public Telephony {
     if (!reachable) return nullptr;
     return std::make_unique<Connection>(*this);
   }
+  void sampleSignal(SignalHandler handler) override { handler(reachable ? signal : std::nullopt); }
 
  private:
   class Connection : public TelephonyConnection {

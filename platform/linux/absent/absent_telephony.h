@@ -8,6 +8,7 @@ namespace zal {
 class AbsentTelephony : public Telephony {
  public:
   [[nodiscard]] std::unique_ptr<TelephonyConnection> connect() override { return nullptr; }
+  void sampleSignal(SignalHandler handler) override { handler(std::nullopt); }
 };
 
 }  // namespace zal

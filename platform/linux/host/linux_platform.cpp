@@ -3,6 +3,7 @@
 #include <csignal>
 
 #include "platform/linux/alerts/alert_file.h"
+#include "platform/linux/bus_module/bus_addresses.h"
 #include "platform/linux/config/host_paths.h"
 #include "platform/linux/files/root_parents.h"
 #include "platform/linux/files/temporary_leftovers.h"
@@ -47,6 +48,18 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
       _shell(_agentLog),
       _queueingShell(_shell, _queues),
       _systemVersion(_loaded.configuration.systemVersionFile),
+      _descriptors(_mainLoop.context()),
+      _busHost{.configuration = _loaded.configuration,
+               .clock = _clock,
+               .mainLoop = _mainLoop,
+               .queues = _queues,
+               .log = _agentLog,
+               .descriptors = _descriptors,
+               .systemBus = systemBusAddress(environment),
+               .sessionBus = sessionBusAddress(environment)},
+      _bus(_busHost, busModulePath(environment)),
+      _networkStatus(_bus),
+      _telephony(_bus),
       _pings(_mainLoop.context(), _loaded.configuration.interfaces, _agentLog),
       _userAlerts(_mainLoop.context(), _mainLoop, _clock, _agentLog,
                   alertDirectory(_loaded.configuration.roots.RuntimeRoot)),

@@ -5,12 +5,12 @@
 
 #include "platform/linux/absent/absent_crash_reporter.h"
 #include "platform/linux/absent/absent_device_support.h"
-#include "platform/linux/absent/absent_network_status.h"
 #include "platform/linux/absent/absent_radio_coexistence.h"
-#include "platform/linux/absent/absent_telephony.h"
 #include "platform/linux/absent/absent_wifi_diagnostics.h"
 #include "platform/linux/alerts/runtime_alert_store.h"
 #include "platform/linux/archive/zip_file_copier.h"
+#include "platform/linux/bus_module/bus_module.h"
+#include "platform/linux/bus_module/on_demand_services.h"
 #include "platform/linux/config/configuration_loader.h"
 #include "platform/linux/config/toml_preference_store.h"
 #include "platform/linux/files/posix_file_placement.h"
@@ -23,6 +23,7 @@
 #include "platform/linux/loop/linux_clock.h"
 #include "platform/linux/loop/linux_run_loop.h"
 #include "platform/linux/loop/linux_work_queues.h"
+#include "platform/linux/loop/loop_descriptor_watcher.h"
 #include "platform/linux/notifications/runtime_directory_notifications.h"
 #include "platform/linux/ping/linux_ping_facility.h"
 #include "platform/linux/process/immediate_process_exit.h"
@@ -66,8 +67,11 @@ class LinuxPlatform {
   ProcfsProcessTable _processes;
   LinuxDeviceRegistry _deviceRegistry;
   LinuxSystemVersion _systemVersion;
-  AbsentNetworkStatus _networkStatus;
-  AbsentTelephony _telephony;
+  LoopDescriptorWatcher _descriptors;
+  BusHost _busHost;
+  BusModule _bus;
+  OnDemandNetworkStatus _networkStatus;
+  OnDemandTelephony _telephony;
   LinuxPingFacility _pings;
   RuntimeAlertStore _userAlerts;
   ZipFileCopier _fileCopier;

@@ -19,14 +19,24 @@ TEST(AbsentTelephonyTest, NobodyCanConnect) {
   AbsentTelephony telephony;
   EXPECT_EQ(telephony.connect(), nullptr);
   EXPECT_EQ(telephony.connect(), nullptr);
+  int answers = 0;
+  telephony.sampleSignal([&answers](const std::optional<CellularSignal>& signal) {
+    ++answers;
+    EXPECT_FALSE(signal);
+  });
+  EXPECT_EQ(answers, 1);
 }
 
 TEST(AbsentNetworkStatusTest, IsNotAssociatedAndHasNoValues) {
   AbsentNetworkStatus status;
-  EXPECT_FALSE(status.isWifiAssociated());
-  EXPECT_FALSE(status.scaledRssi());
-  EXPECT_FALSE(status.signalStrength());
-  EXPECT_FALSE(status.scaledRate());
+  int answers = 0;
+  status.sampleWifi([&answers](const std::optional<WifiSignal>& signal) {
+    ++answers;
+    ASSERT_TRUE(signal);
+    EXPECT_FALSE(signal->isAssociated);
+    EXPECT_FALSE(signal->scaledRssi || signal->signalStrength || signal->scaledRate);
+  });
+  EXPECT_EQ(answers, 1);
 }
 
 TEST(AbsentDeviceSupportTest, HasNoNameAndNoCallsOverCellular) {

@@ -1,0 +1,20 @@
+#pragma once
+
+#include <chrono>
+#include <memory>
+#include <string>
+
+#include <sdbus-c++/sdbus-c++.h>
+
+namespace zal {
+
+/// How long a thread that may wait gives a daemon for one answer. A healthy one takes milliseconds.
+inline constexpr std::chrono::milliseconds kAnswerLimit{1000};
+
+/// A connection of the caller's own, for calls that wait: for queue threads, never the main one. Calls
+/// on it without a limit of their own end after kAnswerLimit. Nothing when the bus cannot be reached.
+[[nodiscard]] std::unique_ptr<sdbus::IConnection> openPrivateBus(const std::string& address);
+/// Whether a service is there now; the question starts none. False when the bus does not answer.
+[[nodiscard]] bool hasOwner(sdbus::IConnection& bus, const std::string& serviceName);
+
+}  // namespace zal

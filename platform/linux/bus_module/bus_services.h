@@ -1,0 +1,25 @@
+#pragma once
+
+#include <memory>
+
+#include "platform/linux/bus_module/bus_host.h"
+#include "platform/network_status.h"
+#include "platform/telephony.h"
+
+namespace zal {
+
+/// The host services that are reached over D-Bus, as the module offers them. Made and ended on the
+/// main thread; nothing is connected before the first use.
+class BusServices {
+ public:
+  virtual ~BusServices() = default;
+  [[nodiscard]] virtual Telephony& telephony() = 0;
+  [[nodiscard]] virtual NetworkStatus& networkStatus() = 0;
+};
+
+/// What the module's one symbol, `lirraMakeBusServices`, is. Never empty; throws nothing but
+/// std::bad_alloc.
+using MakeBusServices = BusServices*(const BusHost& host);
+inline constexpr const char* kMakeBusServices = "lirraMakeBusServices";
+
+}  // namespace zal

@@ -1,0 +1,105 @@
+#include "platform/linux/bus/bus_connection.h"
+
+#include "tests/linux/bus/bus_fixture.h"
+
+namespace zal::testing {
+namespace {
+
+using Lines = std::vector<std::string>;
+
+/// One user that notes what happens to it.
+class BusConnectionTest : public BusFixture {
+ protected:
+  BusConnection connection{host, host.systemBus, "system bus"};
+  Lines events;
+  std::unique_ptr<sdbus::IProxy> proxy;
+  std::unique_ptr<BusConnection::User> user;
+
+  void join() {
+    user = connection.addUser({.onConnected =
+                                   [this](sdbus::IConnection& at) {
+                                     events.emplace_back("connected");
+                                     proxy = sdbus::createProxy(at, "com.example.Sleeper", "/");
+                                   },
+                               .onLost =
+                                   [this] {
+                                     events.emplace_back("lost");
+                                     proxy.reset();
+                                   }});
+  }
+  void askOwner() {
+    proxy->callMethodAsync("Ping")
+        .onInterface("org.freedesktop.DBus.Peer")
+        .withTimeout(std::chrono::milliseconds(200))
+        .uponReplyInvoke([this](const sdbus::Error* error) {
+          events.push_back(error != nullptr ? error->getName() : "answer");
+        });
+  }
+};
+
+TEST_F(BusConnectionTest, NothingIsConnectedBeforeSomebodyWantsIt) {
+  runFor(std::chrono::milliseconds(50));
+  EXPECT_EQ(bus.busctl({"list", "--unique", "--no-legend", "--no-pager"}).find("bus_tests"),
+            std::string::npos);
+}
+
+TEST_F(BusConnectionTest, IsMadeForItsFirstUserAndAnswersAsynchronously) {
+  join();
+  EXPECT_EQ(events, Lines{});
+  ASSERT_TRUE(runUntil([this] { return !events.empty(); }));
+  askOwner();
+  EXPECT_TRUE(runUntil([this] { return events.size() == 2; }));
+  EXPECT_EQ(events, (Lines{"connected", "org.freedesktop.DBus.Error.ServiceUnknown"}));
+  EXPECT_EQ(log.lines, Lines{});
+}
+
+TEST_F(BusConnectionTest, ABusThatDiesIsSaidOnceAndPickedUpAgain) {
+  join();
+  ASSERT_TRUE(runUntil([this] { return !events.empty(); }));
+  bus.kill();
+  ASSERT_TRUE(runUntil([this] { return events.size() == 2; }));
+  runFor(std::chrono::milliseconds(800));
+  EXPECT_EQ(connection.connection(), nullptr);
+  bus.start();
+  ASSERT_TRUE(runUntil([this] { return events.size() == 3; }));
+  EXPECT_EQ(events, (Lines{"connected", "lost", "connected"}));
+  ASSERT_EQ(log.lines.size(), 2U);
+  EXPECT_TRUE(log.lines[0].starts_with("warning: The system bus is lost: ")) << log.lines[0];
+  EXPECT_EQ(log.lines[1], "notice: The system bus is back");
+}
+
+TEST_F(BusConnectionTest, ABusThatHangsHoldsUpNobodyAndCallsRunIntoTheirLimit) {
+  join();
+  ASSERT_TRUE(runUntil([this] { return !events.empty(); }));
+  bus.hang();
+  const SteadyTime before = clock.steadyNow();
+  askOwner();
+  EXPECT_LT(clock.steadyNow() - before, std::chrono::milliseconds(100));
+  EXPECT_TRUE(runUntil([this] { return events.size() == 2; }));
+  EXPECT_EQ(events.back(), "org.freedesktop.DBus.Error.NoReply");
+  bus.goOn();
+}
+
+TEST_F(BusConnectionTest, ABusThatIsNotThereCostsNoTimerAndComesWithALaterWish) {
+  bus.kill();
+  join();
+  runFor(std::chrono::milliseconds(50));
+  EXPECT_EQ(events, Lines{});
+  EXPECT_EQ(log.lines, Lines{});
+  bus.start();
+  EXPECT_TRUE(runUntil([this] { return connection.connection() != nullptr; }));
+  EXPECT_EQ(events, Lines{"connected"});
+}
+
+TEST_F(BusConnectionTest, AUserThatLeftIsToldNothingMore) {
+  join();
+  ASSERT_TRUE(runUntil([this] { return !events.empty(); }));
+  proxy.reset();
+  user.reset();
+  bus.kill();
+  EXPECT_TRUE(runUntil([this] { return connection.connection() == nullptr; }));
+  EXPECT_EQ(events, Lines{"connected"});
+}
+
+}  // namespace
+}  // namespace zal::testing
