@@ -13,17 +13,21 @@ std::unique_ptr<sdbus::IConnection> openPrivateBus(const std::string& address) {
 }
 
 bool hasOwner(sdbus::IConnection& bus, const std::string& serviceName) {
+  return ownerOf(bus, serviceName).has_value();
+}
+
+std::optional<std::string> ownerOf(sdbus::IConnection& bus, const std::string& serviceName) {
   try {
-    bool isOwned = false;
+    std::string owner;
     sdbus::createProxy(bus, "org.freedesktop.DBus", "/org/freedesktop/DBus")
-        ->callMethod("NameHasOwner")
+        ->callMethod("GetNameOwner")
         .onInterface("org.freedesktop.DBus")
         .withTimeout(kAnswerLimit)
         .withArguments(serviceName)
-        .storeResultsTo(isOwned);
-    return isOwned;
+        .storeResultsTo(owner);
+    return owner;
   } catch (const sdbus::Error&) {
-    return false;
+    return std::nullopt;
   }
 }
 

@@ -2,6 +2,7 @@
 
 #include <chrono>
 #include <memory>
+#include <optional>
 #include <string>
 
 #include <sdbus-c++/sdbus-c++.h>
@@ -16,5 +17,8 @@ inline constexpr std::chrono::milliseconds kAnswerLimit{1000};
 [[nodiscard]] std::unique_ptr<sdbus::IConnection> openPrivateBus(const std::string& address);
 /// Whether a service is there now; the question starts none. False when the bus does not answer.
 [[nodiscard]] bool hasOwner(sdbus::IConnection& bus, const std::string& serviceName);
+/// The unique name that has it now, if any. Calls to that one never start a service, not even when it
+/// dies between two of them.
+[[nodiscard]] std::optional<std::string> ownerOf(sdbus::IConnection& bus, const std::string& serviceName);
 
 }  // namespace zal
