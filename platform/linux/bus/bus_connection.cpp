@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <utility>
 
+#include "platform/linux/bus/private_bus.h"
 #include "platform/linux/bus_module/bus_addresses.h"
 
 namespace zal {
@@ -14,8 +15,32 @@ using namespace std::chrono_literals;
 
 constexpr std::chrono::milliseconds kFirstDelay = 500ms;
 constexpr std::chrono::milliseconds kLongestDelay = 30s;
+/// Messages taken in one go; then others of the loop get their turn.
+constexpr int kMessagesPerTurn = 64;
+
+std::unique_ptr<sdbus::IProxy> daemonOf(sdbus::IConnection& bus) {
+  return sdbus::createProxy(bus, "org.freedesktop.DBus", "/org/freedesktop/DBus");
+}
 
 }  // namespace
+
+/// A connection with the matches that were made together with it, which go before it.
+struct BusConnection::Link {
+  std::shared_ptr<sdbus::IConnection> bus;
+  std::vector<sdbus::Slot> matches;
+  unsigned signalWishes = 0;
+
+  /// Waits for the bus: on a queue thread.
+  void match(const std::vector<Signals>& signals) {
+    if (signals.empty()) return;
+    bus->setMethodCallTimeout(kAnswerLimit);
+    const auto daemon = daemonOf(*bus);
+    for (const Signals& wanted : signals) {
+      matches.push_back(bus->addMatch(wanted.rule, wanted.onSignal));
+      daemon->callMethod("RemoveMatch").onInterface("org.freedesktop.DBus").withArguments(wanted.rule);
+    }
+  }
+};
 
 BusConnection::BusConnection(const BusHost& host, std::string address, std::string name)
     : _host(host), _address(std::move(address)), _name(std::move(name)), _delay(kFirstDelay) {
@@ -26,18 +51,23 @@ BusConnection::BusConnection(const BusHost& host, std::string address, std::stri
 }
 
 BusConnection::~BusConnection() {
-  for (const Handlers& user : _users) {
-    if (_bus != nullptr) user.onLost();
+  if (_bus == nullptr) return;
+  for (const auto& member : _members()) {
+    if (const auto user = member.lock()) user->onLost();
   }
 }
 
 std::unique_ptr<BusConnection::User> BusConnection::addUser(Handlers handlers) {
   _mainThread.check("BusConnection");
-  _users.push_back(std::move(handlers));
+  _users.push_back(std::make_shared<Handlers>(std::move(handlers)));
   const auto place = std::prev(_users.end());
+  if (!(*place)->signals.empty()) {
+    ++_signalWishes;
+    if (_bus != nullptr) _renew();
+  }
   if (sdbus::IConnection* bus = connection()) {
     try {
-      place->onConnected(*bus);
+      (*place)->onConnected(*bus);
     } catch (const sdbus::Error& error) {
       _lose(error.getMessage());
     }
@@ -51,6 +81,11 @@ sdbus::IConnection* BusConnection::connection() {
   return _bus.get();
 }
 
+/// As they are now: handlers may let users join and leave.
+std::vector<std::weak_ptr<BusConnection::Handlers>> BusConnection::_members() const {
+  return {_users.begin(), _users.end()};
+}
+
 void BusConnection::_connect() {
   _retry.cancel();
   if (!mayBeThere(_address)) {
@@ -60,47 +95,98 @@ void BusConnection::_connect() {
   }
   _isConnecting = true;
   _host.queues.global(QueuePriority::standard)
-      .async([this, address = _address, &loop = _host.mainLoop, alive = std::weak_ptr<bool>(_alive)] {
-        std::shared_ptr<sdbus::IConnection> bus;
+      .async([this, address = _address, signals = _guardedSignals(), wishes = _signalWishes,
+              &loop = _host.mainLoop, alive = std::weak_ptr<bool>(_alive)] {
+        auto link = std::make_shared<Link>();
+        link->signalWishes = wishes;
         std::string trouble;
         try {
-          bus = sdbus::createSessionBusConnectionWithAddress(address);
+          link->bus = sdbus::createSessionBusConnectionWithAddress(address);
+          link->match(signals);
         } catch (const sdbus::Error& error) {
           trouble = error.getMessage();
+          link = std::make_shared<Link>();
         }
-        loop.post([this, alive, bus = std::move(bus), trouble] {
-          if (!alive.expired()) _adopt(bus, trouble);
+        loop.post([this, alive, link = std::move(link), trouble] {
+          if (!alive.expired()) _adopt(link, trouble);
         });
       });
 }
 
-void BusConnection::_adopt(std::shared_ptr<sdbus::IConnection> bus, const std::string& trouble) {
+/// Nothing is called for a user that left; what a handler throws is the loop's, not the bus library's.
+std::vector<BusConnection::Signals> BusConnection::_guardedSignals() const {
+  std::vector<Signals> guarded;
+  for (const auto& user : _users) {
+    for (const Signals& wanted : user->signals) {
+      guarded.push_back({wanted.rule, [user = std::weak_ptr(user), onSignal = wanted.onSignal,
+                                       &loop = _host.mainLoop](sdbus::Message& signal) {
+                           if (user.expired()) return;
+                           try {
+                             onSignal(signal);
+                           } catch (const sdbus::Error&) {
+                             // Not what a signal of that name holds: not for us.
+                           } catch (...) {
+                             loop.post([error = std::current_exception()] { std::rethrow_exception(error); });
+                           }
+                         }});
+    }
+  }
+  return guarded;
+}
+
+void BusConnection::_adopt(std::shared_ptr<Link> link, const std::string& trouble) {
   _isConnecting = false;
-  if (bus == nullptr) {
+  if (link->bus == nullptr) {
     if (!std::exchange(_saidLost, true)) {
       _host.log.warning("The " + _name + " cannot be reached: " + trouble);
     }
     _retryLater();
     return;
   }
+  if (link->signalWishes != _signalWishes) return _connect();
   try {
-    _watch = _host.descriptors.watch(bus->getEventLoopPollData().fd, [this] { _process(); });
+    _watch = _host.descriptors.watch(link->bus->getEventLoopPollData().fd, [this] { _process(); });
   } catch (const std::exception& error) {
     _lose(error.what());
     return;
   }
-  _bus = std::move(bus);
+  _link = std::move(link);
+  _bus = _link->bus;
   _wasThere = true;
   _delay = kFirstDelay;
   if (std::exchange(_saidLost, false)) _host.log.notice("The " + _name + " is back");
   try {
-    for (auto place = _users.begin(); place != _users.end();) {
-      const auto user = place++;
-      user->onConnected(*_bus);
+    _daemon = daemonOf(*_bus);
+    const std::weak_ptr<bool> alive = _alive;
+    const auto bus = _bus;
+    for (const auto& member : _members()) {
+      if (const auto user = member.lock()) user->onConnected(*bus);
+      if (alive.expired() || _bus != bus) return;
     }
     _tend();
   } catch (const sdbus::Error& error) {
     _lose(error.getMessage());
+  }
+}
+
+/// Its matches want to be made with it.
+void BusConnection::_renew() {
+  const std::weak_ptr<bool> alive = _alive;
+  _drop(_users.back().get());
+  if (!alive.expired() && _bus == nullptr && !_isConnecting) _connect();
+}
+
+void BusConnection::_ask(const char* what, const std::string& rule) {
+  _mainThread.check("BusConnection");
+  if (_daemon == nullptr) return;
+  try {
+    _daemon->callMethodAsync(what)
+        .onInterface("org.freedesktop.DBus")
+        .withTimeout(kAnswerLimit)
+        .withArguments(rule)
+        .uponReplyInvoke([](const sdbus::Error*) {});
+  } catch (const sdbus::Error&) {
+    // The connection is about to be found lost.
   }
 }
 
@@ -109,8 +195,12 @@ void BusConnection::_process() {
   const auto bus = _bus;
   const std::weak_ptr<bool> alive = _alive;
   try {
-    while (bus != nullptr && bus == _bus && bus->processPendingRequest()) {
+    for (int taken = 0; bus != nullptr && bus == _bus && bus->processPendingRequest();) {
       if (alive.expired()) return;
+      if (++taken < kMessagesPerTurn) continue;
+      return _host.mainLoop.post([this, alive] {
+        if (!alive.expired()) _process();
+      });
     }
   } catch (const sdbus::Error& error) {
     if (!alive.expired()) _lose(error.getMessage());
@@ -149,18 +239,26 @@ void BusConnection::_tend() {
 
 void BusConnection::_lose(const std::string& reason) {
   if (!std::exchange(_saidLost, true)) _host.log.warning("The " + _name + " is lost: " + reason);
+  const std::weak_ptr<bool> alive = _alive;
+  _drop();
+  if (!alive.expired()) _retryLater();
+}
+
+/// Tells everybody but the newcomer, who never had it.
+void BusConnection::_drop(const Handlers* newcomer) {
   const auto bus = std::exchange(_bus, nullptr);
   _watch.reset();
   _timeout.cancel();
+  _daemon.reset();
+  // Later: a handler of one of its matches may be on the stack.
+  if (auto link = std::exchange(_link, nullptr)) _host.mainLoop.post([link] {});
+  if (bus == nullptr) return;
   const std::weak_ptr<bool> alive = _alive;
-  if (bus != nullptr) {
-    for (auto place = _users.begin(); place != _users.end();) {
-      const auto user = place++;
-      user->onLost();
-      if (alive.expired()) return;
-    }
+  for (const auto& member : _members()) {
+    const auto user = member.lock();
+    if (user != nullptr && user.get() != newcomer) user->onLost();
+    if (alive.expired()) return;
   }
-  _retryLater();
 }
 
 void BusConnection::_retryLater() {
@@ -171,7 +269,7 @@ void BusConnection::_retryLater() {
   _delay = std::min(_delay * 2, kLongestDelay);
 }
 
-BusConnection::User::User(BusConnection& owner, std::list<Handlers>::iterator place)
+BusConnection::User::User(BusConnection& owner, std::list<std::shared_ptr<Handlers>>::iterator place)
     : _owner(&owner), _ownerAlive(owner._alive), _place(place) {}
 
 BusConnection::User::~User() {

@@ -91,6 +91,101 @@ TEST_F(BusConnectionTest, ABusThatIsNotThereCostsNoTimerAndComesWithALaterWish) 
   EXPECT_EQ(events, Lines{"connected"});
 }
 
+/// A user that notes which signals of com.example.Bell reach it.
+class BusConnectionSignalsTest : public BusConnectionTest {
+ protected:
+  static constexpr const char* kOne = "type='signal',interface='com.example.Bell',member='One'";
+  Lines heard;
+  std::unique_ptr<BusConnection::User> listener;
+
+  void joinListening() {
+    listener = connection.addUser(
+        {.onConnected =
+             [this](sdbus::IConnection&) {
+               events.emplace_back("listening");
+               connection.listen(kOne);
+             },
+         .signals = {{"type='signal',interface='com.example.Bell'",
+                      [this](sdbus::Message& signal) { heard.push_back(signal.getMemberName()); }}}});
+  }
+  void ring(const std::string& member) const {
+    EXPECT_EQ(bus.busctl({"emit", "/bell", "com.example.Bell", member}), "");
+  }
+  /// What this side asked of the bus is done, and what the bus sent before is here.
+  void settle() {
+    bool isAnswered = false;
+    const auto daemon =
+        sdbus::createProxy(*connection.connection(), "org.freedesktop.DBus", "/org/freedesktop/DBus");
+    daemon->callMethodAsync("GetId")
+        .onInterface("org.freedesktop.DBus")
+        .withTimeout(std::chrono::seconds(5))
+        .uponReplyInvoke([&](const sdbus::Error*, const std::string&) { isAnswered = true; });
+    EXPECT_TRUE(runUntil([&] { return isAnswered; }));
+  }
+  bool runUntilHeard(std::size_t count) {
+    return runUntil([this, count] { return heard.size() == count; });
+  }
+};
+
+TEST_F(BusConnectionSignalsTest, OnlyWhatIsListenedForArrivesAndOnlyAsLongAsItIs) {
+  joinListening();
+  ASSERT_TRUE(runUntil([this] { return !events.empty(); }));
+  settle();
+  ring("Other");
+  ring("One");
+  ASSERT_TRUE(runUntilHeard(1));
+  EXPECT_EQ(heard, Lines{"One"});
+  connection.stopListening(kOne);
+  settle();
+  ring("One");
+  settle();
+  EXPECT_EQ(heard, Lines{"One"});
+}
+
+TEST_F(BusConnectionSignalsTest, SignalsArriveAgainAfterTheBusWasGone) {
+  joinListening();
+  ASSERT_TRUE(runUntil([this] { return !events.empty(); }));
+  bus.kill();
+  ASSERT_TRUE(runUntil([this] { return connection.connection() == nullptr; }));
+  bus.start();
+  ASSERT_TRUE(runUntil([this] { return events.size() == 2; }));
+  settle();
+  ring("One");
+  EXPECT_TRUE(runUntilHeard(1));
+}
+
+TEST_F(BusConnectionSignalsTest, WhoWantsSignalsMayComeWhenTheConnectionIsThereAlready) {
+  join();
+  ASSERT_TRUE(runUntil([this] { return !events.empty(); }));
+  joinListening();
+  ASSERT_TRUE(runUntil([this] { return events.size() == 4; }));
+  EXPECT_EQ(events, (Lines{"connected", "lost", "connected", "listening"}));
+  settle();
+  ring("One");
+  EXPECT_TRUE(runUntilHeard(1));
+  EXPECT_EQ(log.lines, Lines{});
+}
+
+TEST_F(BusConnectionSignalsTest, WhoWantsSignalsMayComeWhileTheConnectionIsBeingMade) {
+  join();
+  joinListening();
+  ASSERT_TRUE(runUntil([this] { return events.size() == 2; }));
+  EXPECT_EQ(events, (Lines{"connected", "listening"}));
+  settle();
+  ring("One");
+  EXPECT_TRUE(runUntilHeard(1));
+}
+
+TEST_F(BusConnectionSignalsTest, AUserThatLeftHearsNothingMore) {
+  joinListening();
+  ASSERT_TRUE(runUntil([this] { return !events.empty(); }));
+  settle();
+  listener.reset();
+  ring("One");
+  settle();
+  EXPECT_EQ(heard, Lines{});
+}
+
 TEST_F(BusConnectionTest, AUserThatLeftIsToldNothingMore) {
   join();
   ASSERT_TRUE(runUntil([this] { return !events.empty(); }));
