@@ -43,6 +43,8 @@ struct LogSettings {
   std::vector<std::string> categories;       ///< switched on; LIRRA_LOG_CATEGORIES adds to them
   std::uint64_t rotationSize = 4ULL << 20U;  ///< bytes after which a log file is rotated
   std::uint32_t maximumOpenFiles = 64;
+  bool journal = true;  ///< records go to the journal as well, where there is one
+  std::string journalSocket = "/run/systemd/journal/socket";
 };
 
 /// Which command lines the collectors run: `[commands] profile`.

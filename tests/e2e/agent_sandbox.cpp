@@ -72,6 +72,7 @@ void AgentSandbox::writeConfiguration() const {
       {"RuntimeRoot", _directory / "runtime"},
   };
   for (const auto& [key, value] : roots) text << key << " = '" << value << "'\n";
+  text << "[log]\n" << logSettings;
   // Other log readers on this machine, and those of tests beside this one, are left alone.
   text << "[commands]\n\"captures.stop\" = 'true'\n";
   text << "[device]\nSystemVersionFile = '" << (_directory / "config/version.plist") << "'\n" << settings;

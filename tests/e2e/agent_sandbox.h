@@ -24,9 +24,11 @@ class AgentSandbox {
  public:
   AgentSandbox();
 
-  /// Lines of lirra.toml besides `[roots]`; before the agent starts. By default sessions that ended
-  /// stay as they are: nothing archives them while a test looks at them.
+  /// Lines of lirra.toml besides `[roots]` and `[log]`; before the agent starts. By default sessions that
+  /// ended stay as they are: nothing archives them while a test looks at them.
   std::string settings = "[testing]\nclosingStageDelay = 3600\n";
+  /// Lines of its section `[log]`. The machine's journal is none of these tests' business.
+  std::string logSettings = "journal = false\n";
   /// Where the log and report roots lie; another directory when a test wants another file system.
   std::string stateRoot;
 

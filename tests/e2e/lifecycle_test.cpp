@@ -119,7 +119,7 @@ TEST_F(AgentLifecycleE2eTest, SigtermDuringASessionWritesItsFilesAndExitsWith0) 
 }
 
 TEST_F(AgentLifecycleE2eTest, PeersThatAreConnectedHearOfTheTermination) {
-  sandbox.settings = "[log]\ncategories = [\"IPC\"]\n";
+  sandbox.logSettings += "categories = [\"IPC\"]\n";
   start();
   RawClient first(sandbox.socketPath());
   RawClient second(sandbox.socketPath());

@@ -34,7 +34,7 @@ std::vector<int> recordNumbers(const AgentSandbox& sandbox, const std::string& t
 class LoadE2eTest : public testing::E2eFixture {};
 
 TEST_F(LoadE2eTest, RecordsBeforeTheLastAnsweredBarrierSurviveAKillOnceAndInOrder) {
-  sandbox.settings = "[log]\nrotationSize = 2097152\n";  // some rotations, and none that is dropped
+  sandbox.logSettings += "rotationSize = 2097152\n";  // some rotations, and none that is dropped
   start();
   RawClient client(sandbox.socketPath());
   std::thread sender([&] {

@@ -119,12 +119,21 @@ std::string takeCompression(const toml::node& value, const std::string& /*home*/
                                       {"fast", ArchiveCompression::fast}, configuration.archiveCompression);
 }
 
-std::string takeInternalInstall(const toml::node& value, const std::string& /*home*/,
-                                Configuration& configuration) {
+std::string takeFlagInto(const toml::node& value, bool& target) {
   const auto flag = value.value_exact<bool>();
   if (!flag) return "wants true or false";
-  configuration.internalInstall = *flag;
+  target = *flag;
   return {};
+}
+
+std::string takeInternalInstall(const toml::node& value, const std::string& /*home*/,
+                                Configuration& configuration) {
+  return takeFlagInto(value, configuration.internalInstall);
+}
+
+template <auto Section, auto Field>
+std::string takeFlag(const toml::node& value, const std::string& /*home*/, Configuration& configuration) {
+  return takeFlagInto(value, configuration.*Section.*Field);
 }
 
 template <auto Section, auto Field, std::int64_t Least, std::int64_t Most>
@@ -206,6 +215,8 @@ constexpr ConfigurationKey kKeys[] = {
     {"log", "categories", takeCategories},
     {"log", "rotationSize", takeCount<&Configuration::log, &LogSettings::rotationSize, 1024, kLargestBlock>},
     {"log", "maximumOpenFiles", takeCount<&Configuration::log, &LogSettings::maximumOpenFiles, 1, 65536>},
+    {"log", "journal", takeFlag<&Configuration::log, &LogSettings::journal>},
+    {"log", "journalSocket", takePathOf<&Configuration::log, &LogSettings::journalSocket>},
     {"commands", "profile", takeProfile},
     {"commands", "systemLogReader",
      takeChecked<&Configuration::commands, &CommandSettings::systemLogReader, faultOfProgramName>},

@@ -1,5 +1,7 @@
 #include "platform/linux/host/linux_platform.h"
 
+#include <unistd.h>
+
 #include <csignal>
 
 #include "platform/linux/alerts/alert_file.h"
@@ -7,6 +9,7 @@
 #include "platform/linux/config/host_paths.h"
 #include "platform/linux/files/root_parents.h"
 #include "platform/linux/files/temporary_leftovers.h"
+#include "platform/linux/log/journal_stream.h"
 #include "platform/linux/notifications/notification_file.h"
 #include "platform/linux/progress/progress_file.h"
 
@@ -19,11 +22,15 @@ std::string temporaryArea(const DirectoryRoots& roots, const HostEnvironment& en
   return roots.DiagnosticReportRoot + "/.com.vendel.lirra-" + std::to_string(environment.userId);
 }
 
+bool speaksToJournal(const HostEnvironment& environment) {
+  return isJournalStream(environment.variable("JOURNAL_STREAM"), STDERR_FILENO);
+}
+
 LinuxAgentLog::Options agentLogOptions(const Configuration& configuration,
                                        const HostEnvironment& environment) {
   LinuxAgentLog::Options options;
   options.categories = configuration.log.categories;
-  options.forJournal = !environment.variable("JOURNAL_STREAM").empty();
+  options.forJournal = speaksToJournal(environment);
   return options;
 }
 
@@ -37,9 +44,12 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
       _ipc(_mainLoop.context(), _mainLoop, _agentLog,
            {.path = socketPath(environment).value_or(""),
             .settings = _loaded.configuration.ipc,
-            .flush = [this] { _logFacility.flush(); }}),
-      _logFacility({_clock, _mainLoop, _queues, _agentLog}, _loaded.configuration.roots.UserLogRoot,
-                   _loaded.configuration.log),
+            .flush = [this] { _logFiles.flush(); }}),
+      _logFiles({_clock, _mainLoop, _queues, _agentLog}, _loaded.configuration.roots.UserLogRoot,
+                _loaded.configuration.log),
+      _logMirror(_logFiles, {_clock, _mainLoop, _agentLog}, _loaded.configuration.log.journalSocket),
+      _logFacility(_loaded.configuration.log.journal ? static_cast<PlatformLogFacility&>(_logMirror)
+                                                     : _logFiles),
       _preferences(preferenceDirectory(environment), _agentLog),
       _systemNotifications(_mainLoop.context(),
                            notificationDirectory(_loaded.configuration.roots.RuntimeRoot), _agentLog),
@@ -102,7 +112,8 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
                 .dumpProgress = _dumpProgress} {
   std::signal(SIGPIPE, SIG_IGN);
   makeRootParents(_loaded.configuration.roots);
-  _agentLog.setLogFacility(&_logFacility);
+  // Where standard error goes to the journal, each line is there already.
+  _agentLog.setLogFacility(speaksToJournal(environment) ? &_logFiles : &_logFacility);
   for (const std::string& warning : _loaded.warnings) _agentLog.warning(warning);
   removeTemporaryLeftoversLater(_queues.global(QueuePriority::background), _clock, _agentLog,
                                 temporaryArea(_loaded.configuration.roots, environment));

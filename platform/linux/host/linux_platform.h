@@ -20,6 +20,7 @@
 #include "platform/linux/ipc/unix_ipc_service.h"
 #include "platform/linux/log/file_log_facility.h"
 #include "platform/linux/log/linux_agent_log.h"
+#include "platform/linux/log/mirroring_log_facility.h"
 #include "platform/linux/loop/linux_clock.h"
 #include "platform/linux/loop/linux_run_loop.h"
 #include "platform/linux/loop/linux_work_queues.h"
@@ -56,7 +57,9 @@ class LinuxPlatform {
   LinuxAgentLog _agentLog;
   LinuxWorkQueues _queues;
   UnixIpcService _ipc;
-  FileLogFacility _logFacility;
+  FileLogFacility _logFiles;
+  MirroringLogFacility _logMirror;
+  PlatformLogFacility& _logFacility;
   TomlPreferenceStore _preferences;
   RuntimeDirectoryNotifications _systemNotifications;
   LocalNotifications _localNotifications;

@@ -102,6 +102,8 @@ maximumReplyBacklog = 4096
 categories = ["IPC", "Ping"]
 rotationSize = 1024
 maximumOpenFiles = 2
+journal = false
+journalSocket = "/r/journal"
 [commands]
 profile = "literal"
 systemLogReader = "log-reader_1.0+"
@@ -157,6 +159,8 @@ closingStageDelay = 0.25
   EXPECT_THAT(c.log.categories, ElementsAre("IPC", "Ping"));
   EXPECT_EQ(c.log.rotationSize, 1024U);
   EXPECT_EQ(c.log.maximumOpenFiles, 2U);
+  EXPECT_FALSE(c.log.journal);
+  EXPECT_EQ(c.log.journalSocket, "/r/journal");
   EXPECT_EQ(c.commands.profile, CommandProfile::literal);
   EXPECT_EQ(c.commands.systemLogReader, "log-reader_1.0+");
   EXPECT_EQ(c.commands.toolDirectory, "/home/ann/tools");

@@ -1,5 +1,6 @@
 #include "platform/linux/host/linux_platform.h"
 
+#include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -10,6 +11,7 @@
 
 #include "platform/linux/alerts/alert_file.h"
 #include "platform/linux/progress/progress_file.h"
+#include "tests/linux/log/listening_journal.h"
 #include "tests/support/temporary_directory.h"
 
 namespace zal {
@@ -30,7 +32,11 @@ class LinuxPlatformTest : public ::testing::Test {
                         {"XDG_RUNTIME_DIR", home / "run"}};
     return result;
   }
-  void configure(const std::string& text) const { writeFile(home / "config/lirra.toml", text); }
+  LinuxPlatformTest() { configure(""); }
+  /// The machine's own journal is left alone.
+  void configure(const std::string& text) const {
+    writeFile(home / "config/lirra.toml", text + "[log]\njournalSocket = '" + (home / "journal") + "'\n");
+  }
 
   TemporaryDirectory home;
 };
@@ -61,6 +67,38 @@ TEST_F(LinuxPlatformTest, WarningsOfTheConfigurationReachTheAgentsOwnLogSet) {
   platform.services().logFacility.flush();
   EXPECT_THAT(readFile(home / "logs/ZalLogging/ZalLogging.log"),
               ::testing::HasSubstr("lirra.toml:3: unknown key roots.NoSuchRoot"));
+}
+
+TEST_F(LinuxPlatformTest, RecordsAreCopiedToTheJournalUnlessThatIsSwitchedOff) {
+  for (const bool isOn : {true, false}) {
+    testing::ListeningJournal journal(home / "journal");
+    writeFile(home / "config/lirra.toml", "[roots]\nUserLogRoot = '" + (home / "logs") +
+                                              "'\n[log]\njournal = " + (isOn ? "true" : "false") +
+                                              "\njournalSocket = '" + (home / "journal") + "'\n");
+    LinuxPlatform platform(environment());
+    platform.services().logFacility.record({.type = "Set", .category = "Set", .line = "a line"});
+    platform.services().agentLog.notice("own line");
+    platform.services().logFacility.flush();
+    EXPECT_EQ(journal.messages(),
+              isOn ? (std::vector<std::string>{"a line", "own line"}) : std::vector<std::string>());
+  }
+}
+
+TEST_F(LinuxPlatformTest, OwnLinesAreInTheJournalOnceWhenStandardErrorGoesThere) {
+  configure("[roots]\nUserLogRoot = '" + (home / "logs") + "'\n");
+  testing::ListeningJournal journal(home / "journal");
+  ::testing::internal::CaptureStderr();
+  struct stat status {};
+  ASSERT_EQ(::fstat(STDERR_FILENO, &status), 0);
+  HostEnvironment service = environment();
+  service.variables["JOURNAL_STREAM"] = std::to_string(status.st_dev) + ":" + std::to_string(status.st_ino);
+  LinuxPlatform platform(service);
+  platform.services().agentLog.warning("own line");
+  platform.services().logFacility.record({.type = "Set", .category = "Set", .line = "a line"});
+  platform.services().logFacility.flush();
+  EXPECT_EQ(::testing::internal::GetCapturedStderr(), "<4>own line\n");
+  EXPECT_THAT(journal.messages(), ::testing::ElementsAre("a line"));
+  EXPECT_THAT(readFile(home / "logs/ZalLogging/ZalLogging.log"), ::testing::EndsWith("warning: own line\n"));
 }
 
 TEST_F(LinuxPlatformTest, AlertsAndProgressAreRecordsInTheRuntimeDirectory) {
