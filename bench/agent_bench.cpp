@@ -54,6 +54,8 @@ void addIngest(Rows& rows, const RoundResults& results) {
   add("ingest, 1 client,  one record a write : undecoded", Subject::agent, 1, Subject::undecoded, 0);
   add("ingest, 4 clients, client library : journald", Subject::library, 4, Subject::journald, 14);
   add("ingest, 1 client,  client library : journald", Subject::library, 1, Subject::journald, 0);
+  add("ingest, 4 clients, copies to a journal : none", Subject::mirroring, 4, Subject::agent, 0);
+  add("ingest, 1 client,  copies to a journal : none", Subject::mirroring, 1, Subject::agent, 0);
   constexpr auto kCpu = &IngestResult::cpuSecondsPerMillion;
   add("server CPU a million, 4 clients, one a write : journald", Subject::agent, 4, Subject::journald, 0.1,
       kCpu);

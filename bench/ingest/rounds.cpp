@@ -14,8 +14,8 @@
 namespace zal::bench {
 namespace {
 
-constexpr Subject kSubjects[] = {Subject::journald, Subject::agent, Subject::rsyslog, Subject::library,
-                                 Subject::undecoded};
+constexpr Subject kSubjects[] = {Subject::journald, Subject::agent,   Subject::mirroring,
+                                 Subject::rsyslog,  Subject::library, Subject::undecoded};
 constexpr unsigned kClientCounts[] = {1, 4};
 
 std::unique_ptr<LogServer> makeServer(Subject subject, const std::filesystem::path& programs) {
@@ -28,6 +28,8 @@ std::unique_ptr<LogServer> makeServer(Subject subject, const std::filesystem::pa
       return std::make_unique<UndecodedServer>(programs);
     case Subject::agent:
       return std::make_unique<AgentServer>(programs, AgentClients::oneRecordAWrite);
+    case Subject::mirroring:
+      return std::make_unique<MirroringAgentServer>(programs);
     case Subject::library:
       return std::make_unique<AgentServer>(programs, AgentClients::library);
   }
@@ -57,6 +59,8 @@ const char* subjectName(Subject subject) {
       return "undecoded";
     case Subject::agent:
       return "agent";
+    case Subject::mirroring:
+      return "agent, mirroring";
     case Subject::library:
       return "agent, client library";
   }

@@ -21,7 +21,7 @@ struct Extent {
   std::uint64_t entries = 1'000'000;  ///< of lists and sessions
 };
 
-enum class Subject { journald, rsyslog, undecoded, agent, library };
+enum class Subject { journald, rsyslog, undecoded, agent, mirroring, library };
 [[nodiscard]] const char* subjectName(Subject subject);
 
 /// Medians over the rounds, and why a subject has none.

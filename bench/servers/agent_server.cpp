@@ -16,7 +16,8 @@ std::filesystem::path AgentServer::socketIn(const std::filesystem::path& folder)
 }
 
 ChildProcess::Options AgentServer::options(const std::filesystem::path& programFolder,
-                                           const std::filesystem::path& folder, std::uint64_t rotationSize) {
+                                           const std::filesystem::path& folder, std::uint64_t rotationSize,
+                                           const std::filesystem::path& journalSocket) {
   const std::string home = folder.string();
   std::ofstream settings(folder / "lirra.toml");
   settings << "[roots]\n";
@@ -26,6 +27,9 @@ ChildProcess::Options AgentServer::options(const std::filesystem::path& programF
     settings << root << " = \"" << home << "/" << root << "\"\n";
   }
   settings << "[log]\nrotationSize = " << rotationSize << "\n";
+  // The machine's own journal gets nothing of this: the peers write once, too.
+  settings << "journal = " << (journalSocket.empty() ? "false" : "true") << "\n";
+  if (!journalSocket.empty()) settings << "journalSocket = \"" << journalSocket.string() << "\"\n";
   ChildProcess::Options options;
   options.command = {(programFolder / "zalloggingagent").string()};
   options.environment = {"LIRRA_SOCKET=" + socketIn(folder).string(),
@@ -40,13 +44,19 @@ ChildProcess::Options AgentServer::options(const std::filesystem::path& programF
 
 std::string AgentServer::start(const std::filesystem::path& folder) {
   _socket = socketIn(folder);
-  const ChildProcess::Options how = options(_programFolder, folder, _rotationSize);
+  const ChildProcess::Options how = options(_programFolder, folder, _rotationSize, _journalSocket);
   _process = ChildProcess(how);
   const std::string type = kRecordType;
   _file.watch(folder / "UserLogRoot" / type / (type + ".log"));
   const auto ready = [this] { return UnixSocket(UnixSocket::Kind::stream, _socket).connected(); };
   if (!waitUntil(10, [&] { return !running() || ready(); }) || !running()) return "the agent does not start";
   return {};
+}
+
+std::string MirroringAgentServer::start(const std::filesystem::path& folder) {
+  if (std::string missing = _journal.start(folder); !missing.empty()) return missing;
+  setJournal(_journal.socket());
+  return AgentServer::start(folder);
 }
 
 std::unique_ptr<RecordSender> AgentServer::connect(unsigned client) {

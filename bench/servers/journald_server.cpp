@@ -66,11 +66,10 @@ std::string JournaldServer::start(const std::filesystem::path& folder) {
   // Its socket accepts before its file exists, so the file with the first entry is the sign.
   const auto ready = [this] {
     std::error_code error;
-    for (const auto& machine : std::filesystem::directory_iterator(_run / "log/journal", error)) {
+    for (const auto& machine : std::filesystem::directory_iterator(directory(), error)) {
       _count.watch(machine.path() / "system.journal");
     }
-    return _count.entries() > 0 &&
-           UnixSocket(UnixSocket::Kind::datagram, _run / "systemd/journal/socket").connected();
+    return _count.entries() > 0 && UnixSocket(UnixSocket::Kind::datagram, socket()).connected();
   };
   if (!waitUntil(10, [&] { return !running() || ready(); }) || !running()) {
     return "systemd-journald does not start here (private namespaces needed)";
@@ -81,14 +80,14 @@ std::string JournaldServer::start(const std::filesystem::path& folder) {
 }
 
 std::unique_ptr<RecordSender> JournaldServer::connect(unsigned client) {
-  return std::make_unique<JournalSender>(_run / "systemd/journal/socket", client);
+  return std::make_unique<JournalSender>(socket(), client);
 }
 
 std::uint64_t JournaldServer::stored() { return _count.entries() - _ownEntries; }
 
 std::uint64_t JournaldServer::storedByReading() {
   const std::string command =
-      "journalctl --quiet --directory=" + (_run / "log/journal").string() +
+      "journalctl --quiet --directory=" + directory().string() +
       " --output=cat --output-fields=MESSAGE SYSLOG_IDENTIFIER=callservice 2>/dev/null";
   FILE* lines = popen(command.c_str(), "r");
   if (lines == nullptr) return 0;

@@ -14,6 +14,11 @@ class JournaldServer final : public LogServer {
   [[nodiscard]] std::unique_ptr<RecordSender> connect(unsigned client) override;
   [[nodiscard]] std::uint64_t stored() override;
   [[nodiscard]] std::uint64_t storedByReading() override;
+  /// Where it listens once it is started.
+  [[nodiscard]] std::filesystem::path socket() const { return _run / "systemd/journal/socket"; }
+
+  /// Where it keeps its files.
+  [[nodiscard]] std::filesystem::path directory() const { return _run / "log/journal"; }
 
  private:
   [[nodiscard]] bool _noticeFirstRecord() override { return stored() > 0; }

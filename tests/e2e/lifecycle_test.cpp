@@ -76,7 +76,8 @@ TEST_F(AgentLifecycleE2eTest, OptionsGoBeforeTheEnvironment) {
   options.waitUntilListening = false;
   options.arguments = {"--socket", sandbox / "run/other.socket",
                        "--config=" + (sandbox / "config/other.toml")};
-  testing::writeFile(sandbox / "config/other.toml", "[testing]\ninactivityLimit = nonsense\n");
+  testing::writeFile(sandbox / "config/other.toml",
+                     "[testing]\ninactivityLimit = nonsense\n[log]\njournal = false\n");
   start(options);
   EXPECT_TRUE(eventually([&] { return RawClient::canConnect(sandbox / "run/other.socket"); }));
   EXPECT_FALSE(RawClient::canConnect(sandbox.socketPath()));

@@ -45,11 +45,12 @@ void JournalMirror::record(const LogRecord& record) {
 
 void JournalMirror::flush() {
   _mainThread.check("JournalMirror");
-  _retry.cancel();
-  _retry = {};
-  _send();
+  _sendWhatGoes();
   _giveUpQueue();
-  if (_missed > 0) _sayMissed();
+  if (_missed == 0) return;
+  _sayMissed();
+  _sendWhatGoes();
+  _queue.clear();
 }
 
 bool JournalMirror::_maySend() {
@@ -112,6 +113,12 @@ void JournalMirror::_send() {
   if (_missed > 0) _armReport();
 }
 
+void JournalMirror::_sendWhatGoes() {
+  _windowStart = SteadyTime::min();
+  if (!_queue.empty()) _send();
+  _retry = {};
+}
+
 void JournalMirror::_awaitRoom(SteadyTime now) {
   if (!std::exchange(_isFull, true)) _fullSince = now;
   if (_state == State::stalled || now - _fullSince >= kPatience) {
@@ -169,7 +176,7 @@ void JournalMirror::_report() {
 }
 
 void JournalMirror::_sayMissed() {
-  _say(std::to_string(std::exchange(_missed, 0)) + " records are in their files but not in the journal");
+  _say("records in their files but not in the journal: " + std::to_string(std::exchange(_missed, 0)));
 }
 
 void JournalMirror::_say(std::string_view text) {

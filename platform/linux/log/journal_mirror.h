@@ -51,6 +51,7 @@ class JournalMirror {
   [[nodiscard]] bool _maySend();
   void _beforeSleep();
   void _send();
+  void _sendWhatGoes();
   void _awaitRoom(SteadyTime now);
   void _leaveOut(State state, std::string_view why);
   void _giveUpQueue();

@@ -1,19 +1,11 @@
 #include "platform/linux/log/journal_mirror.h"
 
-#include <fcntl.h>
 #include <unistd.h>
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include "platform/linux/log/file_log_facility.h"
-#include "platform/linux/log/linux_agent_log.h"
-#include "platform/linux/log/mirroring_log_facility.h"
-#include "platform/linux/log/record_text.h"
-#include "tests/linux/log/listening_journal.h"
-#include "tests/support/manual_run_loop.h"
-#include "tests/support/manual_work_queues.h"
-#include "tests/support/temporary_directory.h"
+#include "tests/linux/log/mirroring_fixture.h"
 
 namespace zal {
 namespace {
@@ -26,56 +18,15 @@ using testing::ListeningJournal;
 using ::testing::Pair;
 using testing::readFile;
 
-/// The whole way: the agent's own log speaks into the facility that it is about.
-class JournalMirrorTest : public ::testing::Test {
- protected:
-  JournalMirrorTest() { agentLog.setLogFacility(&facility); }
-  ~JournalMirrorTest() override { agentLog.setLogFacility(nullptr); }
-  void record(const std::string& line) { facility.record({6, "Set", "Set", false, line, 0}); }
-  /// One turn of the loop with so many records, named by their numbers.
-  void burst(int count) {
-    for (int i = 0; i < count; ++i) record(std::to_string(++_last));
-    loop.drain();
-  }
-  void wait(std::chrono::nanoseconds time) {
-    // In steps, as a loop would sleep: sending is what it does before.
-    for (; time > 0ns; time -= 10ms) {
-      loop.advance(10ms);
-      loop.drain();
-    }
-  }
-  /// How many records the files have.
-  [[nodiscard]] std::size_t kept() const { return countRecords(readFile(root + "/Set/Set.log")); }
-  /// What the agent has said, without times.
-  [[nodiscard]] std::string said() const { return readFile(directory / "stderr"); }
-  std::unique_ptr<ListeningJournal> listen() { return std::make_unique<ListeningJournal>(path); }
-
-  testing::TemporaryDirectory directory;
-  const std::string root = directory / "Logs";
-  const std::string path = directory / "journal";
-  const Descriptor errors{::open((directory / "stderr").c_str(), O_CREAT | O_WRONLY | O_APPEND, 0600)};
-  testing::ManualRunLoop loop;
-  testing::ManualWorkQueues queues{loop};
-  LinuxAgentLog agentLog{loop, {{}, false, errors.get()}};
-  FileLogFacility files{{loop, loop, queues, agentLog}, root, LogSettings()};
-  MirroringLogFacility facility{files, {loop, loop, agentLog}, path};
-
- private:
-  int _last = 0;
-};
+class JournalMirrorTest : public testing::MirroringFixture {};
 
 constexpr const char* kGoneLine =
     "zalloggingagent: warning: the journal is gone; records go into their files alone\n";
 constexpr const char* kStalledLine =
     "zalloggingagent: warning: the journal takes nothing; records go into their files alone\n";
-std::string missedLine(int count) {
-  return "zalloggingagent: warning: " + std::to_string(count) +
-         " records are in their files but not in the journal\n";
-}
-
 TEST_F(JournalMirrorTest, ARecordGoesIntoItsFileAndWithItsFieldsToTheJournal) {
   const auto journal = listen();
-  facility.record({6, "Set", "Set-Event", false, "[a:b] one\ntwo", 7});
+  mirroring->record({6, "Set", "Set-Event", false, "[a:b] one\ntwo", 7});
   EXPECT_THAT(journal->entries(), IsEmpty());
   loop.drain();
   EXPECT_THAT(journal->entries(),
@@ -132,7 +83,7 @@ TEST_F(JournalMirrorTest, WithoutAJournalNothingIsSaidAndNothingWaits) {
   burst(1000);
   EXPECT_EQ(kept(), 1000U);
   EXPECT_EQ(loop.pendingTimers(), 0U);
-  facility.flush();
+  mirroring->flush();
   EXPECT_EQ(said(), "");
 }
 
@@ -173,8 +124,7 @@ TEST_F(JournalMirrorTest, AJournalThatIsAwayForAWhileIsSaidOnceWithTheCountAtThe
   burst(1);
   wait(2s);
   EXPECT_EQ(said(), kGoneLine + missedLine(4));
-  EXPECT_THAT(journal->messages(),
-              ElementsAre("6", "warning: 4 records are in their files but not in the journal"));
+  EXPECT_THAT(journal->messages(), ElementsAre("6", "warning: " + missedText(4)));
   EXPECT_EQ(kept(), 6U);
   EXPECT_EQ(loop.pendingTimers(), 0U);
 }
@@ -206,8 +156,7 @@ TEST_F(JournalMirrorTest, WhatDoesNotFitIsCountedAndSaidOnceAfterTheFlood) {
   const int missed = 20'000 - static_cast<int>(messages.size() - 1);
   EXPECT_GT(missed, 10'000);
   EXPECT_EQ(said(), missedLine(missed));
-  EXPECT_EQ(messages.back(),
-            "warning: " + std::to_string(missed) + " records are in their files but not in the journal");
+  EXPECT_EQ(messages.back(), "warning: " + missedText(missed));
   EXPECT_EQ(loop.pendingTimers(), 0U);
 }
 
@@ -237,17 +186,32 @@ TEST_F(JournalMirrorTest, AJournalThatReadsAgainGetsWhatComesThenAndTheCount) {
   burst(1);
   wait(2s);
   EXPECT_EQ(said(), kStalledLine + missedLine(2000 - taken));
-  EXPECT_THAT(journal->messages(), ElementsAre("2001", "warning: " + std::to_string(2000 - taken) +
-                                                           " records are in their files but not in the "
-                                                           "journal"));
+  EXPECT_THAT(journal->messages(), ElementsAre("2001", "warning: " + missedText(2000 - taken)));
 }
 
 TEST_F(JournalMirrorTest, TheEndOfTheProcessSaysWhatTheJournalDidNotTake) {
   const auto journal = listen();
   burst(2000);
-  facility.flush();
-  EXPECT_EQ(said(), missedLine(2000 - static_cast<int>(journal->messages().size())));
+  mirroring->flush();
+  const int missed = 2000 - static_cast<int>(journal->messages().size());
+  EXPECT_EQ(said(), missedLine(missed));
+  mirroring->flush();
+  EXPECT_EQ(said(), missedLine(missed));
+  EXPECT_THAT(journal->messages(), IsEmpty());
   EXPECT_EQ(readFile(root + "/ZalLogging/ZalLogging.log").empty(), false);
+}
+
+TEST_F(JournalMirrorTest, WhatIsSaidAtTheEndReachesAJournalThatReads) {
+  auto journal = listen();
+  burst(1);
+  journal->die();
+  burst(3);
+  journal.reset();
+  journal = listen();
+  wait(1s);
+  burst(1);
+  mirroring->flush();
+  EXPECT_THAT(journal->messages(), ElementsAre("5", "warning: " + missedText(3)));
 }
 
 TEST_F(JournalMirrorTest, NoMoreThanAThousandRecordsGoInATenthOfASecond) {

@@ -20,25 +20,41 @@ namespace zal::testing {
 /// One entry as a journal would take it apart.
 using JournalFields = std::vector<std::pair<std::string, std::string>>;
 
-/// Takes an entry apart as the journal does; what cannot be is a field named "BROKEN".
-inline JournalFields parsedEntry(std::string_view bytes) {
-  JournalFields fields;
+/// Takes entries apart as the journal does, and as it exports them; an empty line ends one. What cannot
+/// be is a field named "BROKEN".
+inline std::vector<JournalFields> parsedEntries(std::string_view bytes) {
+  std::vector<JournalFields> entries(1);
+  const auto brokenAt = [&](std::string_view where) {
+    entries.back().emplace_back("BROKEN", where);
+    return entries;
+  };
   while (!bytes.empty()) {
     const std::size_t lineEnd = bytes.find('\n');
-    if (lineEnd == std::string_view::npos) return {{"BROKEN", std::string(bytes)}};
+    if (lineEnd == std::string_view::npos) return brokenAt(bytes);
     const std::string_view line = bytes.substr(0, lineEnd);
     bytes.remove_prefix(lineEnd + 1);
-    if (const std::size_t sign = line.find('='); sign != std::string_view::npos) {
-      fields.emplace_back(line.substr(0, sign), line.substr(sign + 1));
+    if (line.empty()) {
+      entries.emplace_back();
       continue;
     }
-    if (bytes.size() < 9) return {{"BROKEN", std::string(line)}};
+    if (const std::size_t sign = line.find('='); sign != std::string_view::npos) {
+      entries.back().emplace_back(line.substr(0, sign), line.substr(sign + 1));
+      continue;
+    }
+    if (bytes.size() < 9) return brokenAt(line);
     const std::uint64_t size = loadLittle(bytes.data(), 8);
-    if (size > bytes.size() - 9 || bytes[8 + size] != '\n') return {{"BROKEN", std::string(line)}};
-    fields.emplace_back(line, bytes.substr(8, size));
+    if (size > bytes.size() - 9 || bytes[8 + size] != '\n') return brokenAt(line);
+    entries.back().emplace_back(line, bytes.substr(8, size));
     bytes.remove_prefix(9 + size);
   }
-  return fields;
+  if (entries.back().empty()) entries.pop_back();
+  return entries;
+}
+
+/// The one entry that the bytes have to be.
+inline JournalFields parsedEntry(std::string_view bytes) {
+  const auto entries = parsedEntries(bytes);
+  return entries.size() == 1 ? entries.front() : JournalFields{{"BROKEN", std::to_string(entries.size())}};
 }
 
 /// A journal's socket, whose datagrams wait until the test takes them.
