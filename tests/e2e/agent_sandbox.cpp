@@ -24,6 +24,12 @@ constexpr const char* kSystemVersion = R"(<?xml version="1.0" encoding="UTF-8"?>
 </dict></plist>
 )";
 
+/// A stackshot stops every thread that it sees: among process ids of its own it sees none of this machine.
+void writeStackshotTool(const std::string& path, const std::string& program) {
+  writeFile(path, "#!/bin/sh\nexec " + ownProcessIds() + " '" + program + "' \"$@\"\n");
+  std::filesystem::permissions(path, std::filesystem::perms(0755));
+}
+
 /// The content of an archive's one member; empty when there is no archive.
 std::string unzipped(const std::string& archive) {
   if (!std::filesystem::exists(archive)) return "";
@@ -40,6 +46,11 @@ std::string unzipped(const std::string& archive) {
 
 }  // namespace
 
+std::string ownProcessIds() {
+  return std::string("unshare") + (::geteuid() == 0 ? "" : " --user --map-root-user") +
+         " --pid --fork --mount-proc";
+}
+
 bool eventually(const std::function<bool()>& condition, std::chrono::milliseconds deadline) {
   const auto end = std::chrono::steady_clock::now() + deadline;
   while (!condition()) {
@@ -50,10 +61,15 @@ bool eventually(const std::function<bool()>& condition, std::chrono::millisecond
 }
 
 AgentSandbox::AgentSandbox() : stateRoot(_directory / "state") {
-  for (const char* name : {"run", "config", "home", "tmp", "state"}) {
+  for (const char* name : {"run", "config", "home", "tmp", "state", "tools"}) {
     std::filesystem::create_directories(_directory / name);
   }
   writeFile(_directory / "config/version.plist", kSystemVersion);
+  const std::filesystem::path programs = std::filesystem::path(ZAL_AGENT_PATH).parent_path();
+  for (const char* name : {"tessel", "secretlist"}) {
+    std::filesystem::create_symlink(programs / name, _directory / ("tools/" + std::string(name)));
+  }
+  writeStackshotTool(_directory / "tools/lirra-stackshot", programs / "lirra-stackshot");
   setSwitches({"CallLogging"});
 }
 
@@ -74,7 +90,7 @@ void AgentSandbox::writeConfiguration() const {
   for (const auto& [key, value] : roots) text << key << " = '" << value << "'\n";
   text << "[log]\n" << logSettings;
   // Other log readers on this machine, and those of tests beside this one, are left alone.
-  text << "[commands]\n\"captures.stop\" = 'true'\n";
+  text << "[commands]\n\"captures.stop\" = 'true'\ntoolDirectory = '" << (_directory / "tools") << "'\n";
   text << "[device]\nSystemVersionFile = '" << (_directory / "config/version.plist") << "'\n" << settings;
   writeFile(configurationFile(), text.str());
 }

@@ -15,6 +15,9 @@ inline constexpr std::chrono::seconds kDeadline{180};
 /// Asks again and again, with short waits, until the condition holds. False after the deadline.
 bool eventually(const std::function<bool()>& condition, std::chrono::milliseconds deadline = kDeadline);
 
+/// The beginning of a command that is to see no process of this machine but its own.
+[[nodiscard]] std::string ownProcessIds();
+
 /// A place of its own for one agent: configuration, preferences, socket and all roots below one
 /// temporary directory.
 class AgentSandbox {

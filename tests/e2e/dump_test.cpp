@@ -1,5 +1,7 @@
 #include <signal.h>
 
+#include <algorithm>
+#include <cstdlib>
 #include <fstream>
 
 #include "tests/e2e/dump_fixture.h"
@@ -109,6 +111,30 @@ TEST_F(DumpE2eTest, ADumpDuringACallLeavesTheCallAlone) {
     return;
   }
   FAIL() << "no simple log in " << archive;
+}
+
+TEST_F(DumpE2eTest, TheStackshotOfThisDumpIsInItsArchiveAndNoOlderOne) {
+  if (std::system((testing::ownProcessIds() + " true 2>/dev/null").c_str()) != 0)
+    GTEST_SKIP() << "no process ids of one's own";
+  writeFile(sandbox.reportRoot() + "/Homeframe+2024-05-02-140307.stackshot", "of an earlier dump");
+  start();
+  lirra::Client client = makeClient();
+  holdSecondStage();
+  const std::uint64_t ticket = ask(client, "Messages", 0x2C);
+  ASSERT_TRUE(eventually([&] { return reportsEndingWith(".stackshot").size() == 2; })) << output();
+  std::vector<std::string> made = reportsEndingWith(".stackshot");
+  std::sort(made.begin(), made.end());  // the later one has the later time
+  const std::string name = std::filesystem::path(made.back()).filename().string();
+  releaseSecondStage();
+  const std::string archive = archiveOf(client, ticket);
+  std::vector<std::string> stackshots;
+  for (const std::string& entry : entriesOf(archive)) {
+    if (entry.ends_with(".stackshot")) stackshots.push_back(entry);
+  }
+  ASSERT_THAT(stackshots, ElementsAre("Snapshots/" + name));
+  EXPECT_THAT(textIn(archive, stackshots[0]),
+              AllOf(HasSubstr("Reason:         ZalLogging Log Dump\nCode:           0xF33D1337\n"),
+                    HasSubstr("[lirra-stackshot]")));
 }
 
 TEST_F(DumpE2eTest, AClientThatDiesMeanwhileLeavesTheArchive) {

@@ -3,7 +3,6 @@
 #include <optional>
 #include <string>
 
-#include "platform/linux/absent/absent_crash_reporter.h"
 #include "platform/linux/absent/absent_device_support.h"
 #include "platform/linux/absent/absent_radio_coexistence.h"
 #include "platform/linux/absent/absent_wifi_diagnostics.h"
@@ -13,6 +12,7 @@
 #include "platform/linux/bus_module/on_demand_services.h"
 #include "platform/linux/config/configuration_loader.h"
 #include "platform/linux/config/toml_preference_store.h"
+#include "platform/linux/crash/linux_crash_reporter.h"
 #include "platform/linux/files/posix_file_placement.h"
 #include "platform/linux/host/loop_host_signals.h"
 #include "platform/linux/host_identity/linux_device_registry.h"
@@ -63,7 +63,7 @@ class LinuxPlatform {
   TomlPreferenceStore _preferences;
   RuntimeDirectoryNotifications _systemNotifications;
   LocalNotifications _localNotifications;
-  AbsentCrashReporter _crashReporter;
+  LinuxCrashReporter _crashReporter;
   PosixFilePlacement _files;
   PosixShell _shell;
   QueueingShell _queueingShell;

@@ -3,13 +3,11 @@
 #include <thread>
 #include <vector>
 
-#include "platform/linux/absent/absent_crash_reporter.h"
 #include "platform/linux/absent/absent_device_support.h"
 #include "platform/linux/absent/absent_network_status.h"
 #include "platform/linux/absent/absent_radio_coexistence.h"
 #include "platform/linux/absent/absent_telephony.h"
 #include "platform/linux/absent/absent_wifi_diagnostics.h"
-#include "tests/support/fake_services.h"
 #include "tests/support/temporary_directory.h"
 
 namespace zal::testing {
@@ -61,20 +59,6 @@ TEST(AbsentWifiDiagnosticsTest, CompletesInsideTheCallWithAFailureAndLeavesTheDi
 TEST(AbsentRadioCoexistenceTest, HasNothingToCall) {
   AbsentRadioCoexistence coexistence;
   EXPECT_FALSE(coexistence.logDumpEntryPoint());
-}
-
-TEST(AbsentCrashReporterTest, RefusesEverythingAndSaysSoOnceForEachKind) {
-  RecordingAgentLog log;
-  AbsentCrashReporter reporter(log);
-  for (int round = 0; round < 3; ++round) {
-    EXPECT_FALSE(reporter.simulateCrash(1, 0xFED9E2FFU, "message"));
-    EXPECT_FALSE(reporter.simulateCrashForException("description"));
-    EXPECT_FALSE(reporter.stackshot("reason", 1));
-  }
-  EXPECT_EQ(log.lines, (std::vector<std::string>{
-                           "notice: This host has no crash service: crash reports of processes are not made",
-                           "notice: This host has no crash service: crash reports of exceptions are not made",
-                           "notice: This host has no crash service: stackshots are not made"}));
 }
 
 }  // namespace
