@@ -34,6 +34,18 @@ LinuxAgentLog::Options agentLogOptions(const Configuration& configuration,
   return options;
 }
 
+/// One of our helper programs; looked for in PATH when nobody knows where they are.
+std::string helperProgram(const Configuration& configuration, const std::string& name) {
+  const std::string& directory = configuration.commands.toolDirectory;
+  return directory.empty() ? name : directory + "/" + name;
+}
+
+BasebandDumpStarter::Places basebandPlaces(const Configuration& configuration) {
+  return {.helper = helperProgram(configuration, "lirra-modemdump"),
+          .directory = configuration.roots.WirelessReportRoot + "/Baseband",
+          .marker = configuration.roots.TemporaryRoot + "/Telvane.dumping"};
+}
+
 }  // namespace
 
 LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
@@ -61,6 +73,7 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
       _queueingShell(_shell, _queues),
       _systemVersion(_loaded.configuration.systemVersionFile),
       _descriptors(_mainLoop.context()),
+      _basebandDumps(_mainLoop.context(), _agentLog, basebandPlaces(_loaded.configuration)),
       _busHost{.configuration = _loaded.configuration,
                .clock = _clock,
                .mainLoop = _mainLoop,
@@ -68,7 +81,8 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
                .log = _agentLog,
                .descriptors = _descriptors,
                .systemBus = systemBusAddress(environment),
-               .sessionBus = sessionBusAddress(environment)},
+               .sessionBus = sessionBusAddress(environment),
+               .startBasebandDump = [this](std::string_view reason) { _basebandDumps.start(reason); }},
       _bus(_busHost, busModulePath(environment)),
       _networkStatus(_bus),
       _telephony(_bus),

@@ -8,6 +8,7 @@
 #include "platform/linux/absent/absent_wifi_diagnostics.h"
 #include "platform/linux/alerts/runtime_alert_store.h"
 #include "platform/linux/archive/zip_file_copier.h"
+#include "platform/linux/baseband/baseband_dump_starter.h"
 #include "platform/linux/bus_module/bus_module.h"
 #include "platform/linux/bus_module/on_demand_services.h"
 #include "platform/linux/config/configuration_loader.h"
@@ -71,6 +72,7 @@ class LinuxPlatform {
   LinuxDeviceRegistry _deviceRegistry;
   LinuxSystemVersion _systemVersion;
   LoopDescriptorWatcher _descriptors;
+  BasebandDumpStarter _basebandDumps;
   BusHost _busHost;
   BusModule _bus;
   OnDemandNetworkStatus _networkStatus;

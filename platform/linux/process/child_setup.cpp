@@ -28,6 +28,16 @@ void ChildSetup::sendOutputTo(int descriptor) {
   ::posix_spawn_file_actions_adddup2(&_actions, descriptor, STDERR_FILENO);
 }
 
+void ChildSetup::sendErrorsTo(int descriptor) {
+  ::posix_spawn_file_actions_adddup2(&_actions, descriptor, STDERR_FILENO);
+}
+
+void ChildSetup::putIntoOwnGroup() {
+  short flags = 0;
+  ::posix_spawnattr_getflags(&_attributes, &flags);
+  ::posix_spawnattr_setflags(&_attributes, static_cast<short>(flags | POSIX_SPAWN_SETPGROUP));
+}
+
 int ChildSetup::start(pid_t& child, const std::string& file, std::vector<std::string> arguments,
                       char* const* environment) {
   ::posix_spawn_file_actions_addclosefrom_np(&_actions, STDERR_FILENO + 1);

@@ -20,6 +20,10 @@ class ChildSetup {
 
   /// Standard output and errors go into that descriptor instead of ours.
   void sendOutputTo(int descriptor);
+  /// After sendOutputTo: the errors go there alone.
+  void sendErrorsTo(int descriptor);
+  /// It leads a process group of its own, so that it can be ended together with its children.
+  void putIntoOwnGroup();
   /// Starts the file, looked for in PATH when its name has no slash. Returned: zero, or the errno
   /// that says why there is no child.
   [[nodiscard]] int start(pid_t& child, const std::string& file, std::vector<std::string> arguments,
