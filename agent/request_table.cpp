@@ -137,12 +137,13 @@ void addLogFile(const RequestContext& c) {
 
 /// Log and event records differ in the key of their text alone.
 AgentLogRecord readRecord(const RequestContext& c, std::string_view textKey) {
+  // In the order in which the keys lie in a message: that finds each at once.
   AgentLogRecord record;
-  record.text = c.message.string(textKey);
-  record.level = c.message.int64("level");
-  record.time = c.message.uint64("time");
   record.category = c.message.string("category");
+  record.level = c.message.int64("level");
+  record.text = c.message.string(textKey);
   record.sender = c.message.string("sender");
+  record.time = c.message.uint64("time");
   record.type = c.message.string("type");
   record.pid = c.peer->processId();
   return record;

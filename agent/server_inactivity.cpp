@@ -9,7 +9,7 @@ namespace zal {
 void ZalLoggingAgentServer::_noteActivity() {
   _mainThread.check("ZalLoggingAgentServer");
   if (!_sessions.empty()) return;
-  _lastActivity = _platform.clock.steadyNow();
+  _lastActivity = _platform.clock.steadyNowRoughly();
   _setInactivityTimer();
 }
 

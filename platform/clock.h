@@ -27,6 +27,8 @@ class Clock {
  public:
   virtual ~Clock() = default;
   [[nodiscard]] virtual SteadyTime steadyNow() const = 0;
+  /// Late by some milliseconds at most, for a fraction of the cost: for what is noted at every record.
+  [[nodiscard]] virtual SteadyTime steadyNowRoughly() const { return steadyNow(); }
   [[nodiscard]] virtual WallTime wallNow() const = 0;
   /// Any moment of the years 1 to 9999 works; the process locale plays no part.
   [[nodiscard]] virtual LocalTime localTime(WallTime moment) const = 0;

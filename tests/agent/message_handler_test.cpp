@@ -83,8 +83,8 @@ TEST_F(MessageHandlerTest, ReadsTheKeysOfEachRequestInOrder) {
   EXPECT_THAT(keysRead(12), ElementsAre("receiver", "session", "sender"));
   EXPECT_THAT(keysRead(13), ElementsAre("failureReason", "session", "sender"));
   EXPECT_THAT(keysRead(14), ElementsAre("session", "sender", "category", "path"));
-  EXPECT_THAT(keysRead(15), ElementsAre("logString", "level", "time", "category", "sender", "type"));
-  EXPECT_THAT(keysRead(16), ElementsAre("eventString", "level", "time", "category", "sender", "type"));
+  EXPECT_THAT(keysRead(15), ElementsAre("category", "level", "logString", "sender", "time", "type"));
+  EXPECT_THAT(keysRead(16), ElementsAre("category", "level", "eventString", "sender", "time", "type"));
 }
 
 TEST_F(MessageHandlerTest, AMessageWithoutAnyKeyBeginsASessionOfTypeCurrentWithoutSenderAndFlags) {

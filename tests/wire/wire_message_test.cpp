@@ -55,6 +55,24 @@ TEST_F(WireMessageTest, ReadsEveryTypeThatItsBuilderWrites) {
   EXPECT_EQ(message->replyToken(), 77U);
 }
 
+TEST_F(WireMessageTest, KeysAreFoundInWhateverOrderSomebodyAsksForThem) {
+  const std::vector<std::string> keys{"", "a", "ab", "b", "category", "type", "typed"};
+  const auto& message = messageWith([&](Builder& builder) {
+    for (std::size_t i = 0; i < keys.size(); ++i)
+      builder.Int(keys[i].c_str(), static_cast<std::int64_t>(i) + 1);
+  });
+  for (std::size_t first = 0; first < keys.size(); ++first) {
+    for (std::size_t second = 0; second < keys.size(); ++second) {
+      for (const char* absent : {"aa", "zz", "categor", "typedd"}) {
+        EXPECT_EQ(message.int64(keys[first]), static_cast<std::int64_t>(first) + 1);
+        EXPECT_EQ(message.int64(absent), 0);
+        EXPECT_EQ(message.int64(keys[second]), static_cast<std::int64_t>(second) + 1);
+      }
+    }
+  }
+  EXPECT_EQ(message.int64(std::string_view("a\0", 2)), 0);
+}
+
 TEST_F(WireMessageTest, AMissingValueReadsAsItsDefault) {
   const auto& message = messageWith([](Builder&) {});
   EXPECT_EQ(message.string("x"), std::nullopt);

@@ -8,6 +8,7 @@
 #include <asio/io_context.hpp>
 
 #include "platform/agent_log.h"
+#include "platform/clock.h"
 #include "platform/configuration.h"
 #include "platform/ipc_peer.h"
 #include "platform/main_thread_check.h"
@@ -38,6 +39,7 @@ struct IpcContext {
   /// One for all peers: each is read, decoded and handled in one go. Not zeroed, so that a quiet
   /// agent's memory does not grow by what it never reads.
   const std::unique_ptr<char[]> readBuffer{new char[kReadBufferSize]};
+  SteadyTime lastRead{};  // roughly
   MainThreadCheck mainThread;
 };
 

@@ -6,6 +6,7 @@
 
 #include <asio/post.hpp>
 
+#include "platform/linux/loop/rough_time.h"
 #include "platform/linux/wire/message_builder.h"
 #include "platform/linux/wire/wire_message.h"
 
@@ -13,6 +14,9 @@ namespace zal {
 namespace {
 
 using asio::posix::descriptor_base;
+
+/// Of what one client says in a moment without being in a hurry.
+constexpr std::size_t kLargestLoneRead = 4096;
 
 bool isRetryLater(int error) { return error == EAGAIN || error == EWOULDBLOCK; }
 
@@ -50,25 +54,35 @@ void UnixPeerConnection::_awaitInput() {
 void UnixPeerConnection::_readTurn() {
   _context->mainThread.check("UnixPeerConnection");
   if (!_socket) return;
-  const auto keptAlive = shared_from_this();
+  const std::shared_ptr<PeerConnection> keptAlive = shared_from_this();
   char* const buffer = _context->readBuffer.get();
   const auto size = ::recv(_socket->native_handle(), buffer, kReadBufferSize, MSG_DONTWAIT);
   if (size < 0 && (isRetryLater(errno) || errno == EINTR)) return _awaitInput();
   if (size <= 0) return _becomeInvalid();
 
   _decoder.feed({buffer, static_cast<std::size_t>(size)});
-  _takeFrames();
+  _takeFrames(keptAlive);
   if (!_socket) return;
+  _writeOutWhatCameAlone(static_cast<std::size_t>(size));
   if (static_cast<std::size_t>(size) == kReadBufferSize) {
-    asio::post(_context->io, [keptAlive] { keptAlive->_readTurn(); });
+    asio::post(_context->io, [self = shared_from_this()] { self->_readTurn(); });
   } else {
     _awaitInput();
   }
 }
 
-void UnixPeerConnection::_takeFrames() {
+/// A record that comes alone is in its file before the loop asks the kernel for more, twice, only to
+/// hear that there is nothing. In a flood this happens once a tick.
+void UnixPeerConnection::_writeOutWhatCameAlone(std::size_t size) {
+  const SteadyTime now = roughSteadyTime();
+  const bool isAlone = size <= kLargestLoneRead && now != _context->lastRead;
+  _context->lastRead = now;
+  if (isAlone && _context->flush) _context->flush();
+}
+
+void UnixPeerConnection::_takeFrames(const std::shared_ptr<PeerConnection>& self) {
   while (const auto frame = _decoder.next()) {
-    _takeFrame(*frame);
+    _takeFrame(self, *frame);
     if (!_socket) return;  // cancelled by its handler, or dropped
   }
   if (_decoder.failed()) {
@@ -77,11 +91,11 @@ void UnixPeerConnection::_takeFrames() {
   }
 }
 
-void UnixPeerConnection::_takeFrame(const Frame& frame) {
+void UnixPeerConnection::_takeFrame(const std::shared_ptr<PeerConnection>& self, const Frame& frame) {
   switch (frame.header.kind) {
     case FrameKind::message:
     case FrameKind::messageExpectingReply:
-      return _takeMessage(frame);
+      return _takeMessage(self, frame);
     case FrameKind::barrier: {
       if (_context->flush) _context->flush();
       FrameHeader passed;
@@ -95,10 +109,10 @@ void UnixPeerConnection::_takeFrame(const Frame& frame) {
   }
 }
 
-void UnixPeerConnection::_takeMessage(const Frame& frame) {
+void UnixPeerConnection::_takeMessage(const std::shared_ptr<PeerConnection>& self, const Frame& frame) {
   const auto message = WireMessage::fromFrame(frame);
   if (!message) return _skipFrame();
-  _deliver(&*message);
+  if (_context->delivering) _context->handler(self, &*message);
 }
 
 void UnixPeerConnection::_skipFrame() {

@@ -38,9 +38,10 @@ class UnixPeerConnection final : public PeerConnection,
   void _deliver(const IpcEvent& event);
   void _awaitInput();
   void _readTurn();
-  void _takeFrames();
-  void _takeFrame(const Frame& frame);
-  void _takeMessage(const Frame& frame);
+  void _writeOutWhatCameAlone(std::size_t size);
+  void _takeFrames(const std::shared_ptr<PeerConnection>& self);
+  void _takeFrame(const std::shared_ptr<PeerConnection>& self, const Frame& frame);
+  void _takeMessage(const std::shared_ptr<PeerConnection>& self, const Frame& frame);
   void _skipFrame();
   void _queue(const FrameHeader& header, std::string_view payload);
   void _sendBacklog();

@@ -71,6 +71,7 @@ void FileLogFacility::record(const LogRecord& record) {
 
 void FileLogFacility::flush() {
   _mainThread.check("FileLogFacility");
+  _time.forget();
   _flushDirty();
   // What is said about a failure is itself a record, which belongs into its file as well.
   for (int round = 0; round < 3 && !_messages.empty() && !_isDelivering; ++round) {

@@ -15,6 +15,10 @@ constexpr std::uint64_t kTops = 0x8080808080808080U;
 /// Top bit of each byte that is zero; bytes above a zero one may be marked too, never below it.
 constexpr std::uint64_t zeroBytes(std::uint64_t word) { return (word - kOnes) & ~word & kTops; }
 constexpr std::uint64_t bytesBelow0x20(std::uint64_t word) { return (word - kOnes * 0x20) & ~word & kTops; }
+/// True for eight bytes from 0x20 to 0x7e; below the first byte that is none of these nothing carries over.
+constexpr bool isPrintableAscii(std::uint64_t word) {
+  return ((word | (word - kOnes * 0x20) | (word + kOnes)) & kTops) == 0;
+}
 
 bool isSpecial(unsigned char c) { return c < 0x20 || c == 0x7f || c == 0xC2; }
 
@@ -27,6 +31,7 @@ std::size_t plainLength(const char* text, std::size_t length) {
     for (; at + 8 <= length; at += 8) {
       std::uint64_t word = 0;
       std::memcpy(&word, text + at, 8);
+      if (isPrintableAscii(word)) continue;
       const std::uint64_t found =
           bytesBelow0x20(word) | zeroBytes(word ^ (kOnes * 0x7f)) | zeroBytes(word ^ (kOnes * 0xC2));
       if (found != 0) return at + static_cast<std::size_t>(std::countr_zero(found)) / 8;

@@ -10,6 +10,13 @@ void putDigits(char* last, int count, int number) {
 }  // namespace
 
 std::string_view RecordTime::nowText() {
+  const SteadyTime roughly = _clock.steadyNowRoughly();
+  if (_calls > 0 && roughly == _lookedAt) {
+    --_calls;
+    return {_text.data(), _text.size()};
+  }
+  _calls = kCallsBetweenLooks - 1;
+  _lookedAt = roughly;
   const WallTime now = _clock.wallNow();
   const auto second = std::chrono::floor<std::chrono::seconds>(now);
   if (second != _second) {

@@ -4,6 +4,8 @@
 
 #include <atomic>
 
+#include "platform/linux/loop/rough_time.h"
+
 namespace zal {
 
 namespace {
@@ -39,6 +41,8 @@ LinuxClock::LinuxClock() {
 }
 
 SteadyTime LinuxClock::steadyNow() const { return std::chrono::steady_clock::now(); }
+
+SteadyTime LinuxClock::steadyNowRoughly() const { return roughSteadyTime(); }
 
 WallTime LinuxClock::wallNow() const {
   return std::chrono::floor<std::chrono::microseconds>(std::chrono::system_clock::now());

@@ -10,6 +10,7 @@ class LinuxClock : public Clock {
  public:
   LinuxClock();
   [[nodiscard]] SteadyTime steadyNow() const override;
+  [[nodiscard]] SteadyTime steadyNowRoughly() const override;
   [[nodiscard]] WallTime wallNow() const override;
   /// Cheap for moments of one second in a row: each thread keeps the last second taken apart.
   [[nodiscard]] LocalTime localTime(WallTime moment) const override;

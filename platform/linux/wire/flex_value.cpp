@@ -28,6 +28,14 @@ int compareKey(const char* key, std::string_view wanted) {
   return *key == 0 ? 0 : 1;
 }
 
+bool isKey(const char* key, std::string_view wanted) {
+  for (const char character : wanted) {
+    if (*key != character || character == 0) return false;
+    ++key;
+  }
+  return *key == 0;
+}
+
 }  // namespace
 
 const char* FlexValue::_target() const { return _at - loadLittle(_at, _parentWidth); }
@@ -108,26 +116,40 @@ FlexMap::FlexMap(const char* values, std::uint8_t width)
       _keys(values - 3 * width - loadLittle(values - 3 * width, width)),
       _keyWidth(static_cast<std::uint8_t>(loadLittle(values - 2 * width, width))) {}
 
-std::string_view FlexMap::key(std::size_t index) const {
+const char* FlexMap::_keyAt(std::size_t index) const {
   const char* at = _keys + index * _keyWidth;
   return at - loadLittle(at, _keyWidth);
 }
 
-FlexValue FlexMap::find(std::string_view key) const {
+std::string_view FlexMap::key(std::size_t index) const { return _keyAt(index); }
+
+std::size_t FlexMap::_indexOf(std::string_view key) const {
   std::size_t first = 0;
   std::size_t end = size();
   while (first < end) {
     const std::size_t middle = first + (end - first) / 2;
-    const char* at = _keys + middle * _keyWidth;
-    const int order = compareKey(at - loadLittle(at, _keyWidth), key);
-    if (order == 0) return _values[middle];
+    const int order = compareKey(_keyAt(middle), key);
+    if (order == 0) return middle;
     if (order < 0) {
       first = middle + 1;
     } else {
       end = middle;
     }
   }
-  return {};
+  return size();
+}
+
+FlexValue FlexMap::find(std::string_view key) const {
+  const std::size_t index = _indexOf(key);
+  return index < size() ? _values[index] : FlexValue();
+}
+
+FlexValue FlexMap::find(std::string_view key, std::size_t& next) const {
+  std::size_t index = next;
+  if (index >= size() || !isKey(_keyAt(index), key)) index = _indexOf(key);
+  if (index == size()) return {};
+  next = index + 1;
+  return _values[index];
 }
 
 }  // namespace zal

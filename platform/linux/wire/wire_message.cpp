@@ -16,24 +16,24 @@ std::optional<WireMessage> WireMessage::fromFrame(const Frame& frame) {
 }
 
 std::optional<std::string_view> WireMessage::string(std::string_view key) const {
-  const auto text = _map.find(key).asString();
+  const auto text = _find(key).asString();
   if (!text || isUtf8(*text)) return text;
   return _replaced.emplace_front(replacedUtf8(*text));
 }
 
-std::int64_t WireMessage::int64(std::string_view key) const { return _map.find(key).asInt().value_or(0); }
+std::int64_t WireMessage::int64(std::string_view key) const { return _find(key).asInt().value_or(0); }
 
-std::uint64_t WireMessage::uint64(std::string_view key) const { return _map.find(key).asUInt().value_or(0); }
+std::uint64_t WireMessage::uint64(std::string_view key) const { return _find(key).asUInt().value_or(0); }
 
-double WireMessage::real(std::string_view key) const { return _map.find(key).asFloat().value_or(0.0); }
+double WireMessage::real(std::string_view key) const { return _find(key).asFloat().value_or(0.0); }
 
 std::optional<ValueMap> WireMessage::dictionary(std::string_view key) const {
-  const auto map = _map.find(key).asMap();
+  const auto map = _find(key).asMap();
   return map ? convertedMap(*map) : std::nullopt;
 }
 
 std::optional<Number> WireMessage::codedNumber(std::string_view key) const {
-  const auto blob = _map.find(key).asBlob();
+  const auto blob = _find(key).asBlob();
   const auto content = blob ? decodedScalar(*blob) : std::nullopt;
   if (!content) return std::nullopt;
   if (const auto* number = content->as<std::int64_t>()) return *number;

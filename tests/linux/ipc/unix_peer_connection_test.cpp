@@ -119,11 +119,18 @@ TEST_F(UnixPeerConnectionTest, AHalfOpenPeerIsInvalidOnceItStopsWriting) {
 TEST_F(UnixPeerConnectionTest, AResetWithUnreadAnswersStillDeliversWhatWasSent) {
   TestClient client(path);
   ASSERT_TRUE(client.send(bareFrame(FrameKind::barrier, 1)));
-  ASSERT_TRUE(runUntil([this] { return flushes == 1; }));
+  ASSERT_TRUE(runUntil([this] { return flushes > 0; }));
   ASSERT_TRUE(client.send(requestFrame(7, "last")));
   client.close();  // the barrier's answer was never read: the kernel resets the connection
   ASSERT_TRUE(runUntilEvents(2));
   EXPECT_EQ(events, (Lines{"7:last", "invalid"}));
+}
+
+TEST_F(UnixPeerConnectionTest, WhatComesAloneIsWrittenOutBeforeTheLoopLooksAround) {
+  TestClient client(path);
+  ASSERT_TRUE(client.send(requestFrame(1)));
+  ASSERT_TRUE(runUntilEvents(1));
+  EXPECT_EQ(flushes, 1);
 }
 
 TEST_F(UnixPeerConnectionTest, ABarrierIsAnsweredAfterWhatCameBeforeItWasHandledAndFlushed) {

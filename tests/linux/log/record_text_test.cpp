@@ -106,10 +106,21 @@ TEST(RecordTimeTest, FollowsAWallClockThatJumps) {
   testing::ManualRunLoop clock;
   RecordTime time(clock);
   EXPECT_EQ(time.nowText(), "2024-05-02 14:03:07.251");
+  time.forget();
   clock.setWall(WallTime{-1ms});
   EXPECT_EQ(time.nowText(), "1970-01-01 01:59:59.999");
+  time.forget();
   clock.setWall(WallTime{std::chrono::seconds{253402300799 - 7200}});
   EXPECT_EQ(time.nowText(), "9999-12-31 23:59:59.000");
+}
+
+TEST(RecordTimeTest, OfAFloodEverySixteenthRecordAsksTheClock) {
+  testing::ManualRunLoop clock;
+  RecordTime time(clock);
+  EXPECT_EQ(time.nowText(), "2024-05-02 14:03:07.251");
+  clock.setWall(WallTime{-1ms});
+  for (int call = 2; call <= 16; ++call) EXPECT_EQ(time.nowText(), "2024-05-02 14:03:07.251");
+  EXPECT_EQ(time.nowText(), "1970-01-01 01:59:59.999");
 }
 
 }  // namespace
