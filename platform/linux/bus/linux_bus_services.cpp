@@ -5,6 +5,7 @@ namespace zal {
 LinuxBusServices::LinuxBusServices(const BusHost& host)
     : _host(host),
       _systemBus(_host, _host.systemBus, "system bus"),
-      _sessionBus(_host, _host.sessionBus, "session bus") {}
+      _sessionBus(_host, _host.sessionBus, "session bus"),
+      _networkStatus(_host, _systemBus) {}
 
 }  // namespace zal

@@ -1,8 +1,8 @@
 #pragma once
 
-#include "platform/linux/absent/absent_network_status.h"
 #include "platform/linux/absent/absent_telephony.h"
 #include "platform/linux/bus/bus_connection.h"
+#include "platform/linux/bus/network/bus_network_status.h"
 #include "platform/linux/bus_module/bus_services.h"
 
 namespace zal {
@@ -19,7 +19,7 @@ class LinuxBusServices : public BusServices {
   BusConnection _systemBus;
   BusConnection _sessionBus;
   AbsentTelephony _telephony;
-  AbsentNetworkStatus _networkStatus;
+  BusNetworkStatus _networkStatus;
 };
 
 }  // namespace zal
