@@ -6,6 +6,6 @@ LinuxBusServices::LinuxBusServices(const BusHost& host)
     : _host(host),
       _systemBus(_host, _host.systemBus, "system bus"),
       _sessionBus(_host, _host.sessionBus, "session bus"),
-      _networkStatus(_host, _systemBus) {}
+      _telephony(_host, _systemBus) {}
 
 }  // namespace zal

@@ -1,8 +1,8 @@
 #pragma once
 
-#include "platform/linux/absent/absent_telephony.h"
+#include "platform/linux/absent/absent_network_status.h"
 #include "platform/linux/bus/bus_connection.h"
-#include "platform/linux/bus/network/bus_network_status.h"
+#include "platform/linux/bus/telephony/bus_telephony.h"
 #include "platform/linux/bus_module/bus_services.h"
 
 namespace zal {
@@ -18,8 +18,8 @@ class LinuxBusServices : public BusServices {
   const BusHost _host;
   BusConnection _systemBus;
   BusConnection _sessionBus;
-  AbsentTelephony _telephony;
-  BusNetworkStatus _networkStatus;
+  BusTelephony _telephony;
+  AbsentNetworkStatus _networkStatus;
 };
 
 }  // namespace zal
