@@ -250,16 +250,15 @@ void BusConnection::_drop(const Handlers* newcomer) {
   _watch.reset();
   _timeout.cancel();
   _daemon.reset();
-  const auto link = std::exchange(_link, nullptr);
+  // Later: a handler of one of its matches may be on the stack.
+  if (auto link = std::exchange(_link, nullptr)) _host.mainLoop.post([link] {});
+  if (bus == nullptr) return;
   const std::weak_ptr<bool> alive = _alive;
-  RunLoop& loop = _host.mainLoop;
-  for (const auto& member : bus != nullptr ? _members() : std::vector<std::weak_ptr<Handlers>>()) {
+  for (const auto& member : _members()) {
     const auto user = member.lock();
     if (user != nullptr && user.get() != newcomer) user->onLost();
-    if (alive.expired()) break;
+    if (alive.expired()) return;
   }
-  // Later, and after what users leave for later: what hangs on it may be on the stack.
-  if (link != nullptr) loop.post([link] {});
 }
 
 void BusConnection::_retryLater() {

@@ -2,8 +2,6 @@
 
 #include "platform/linux/absent/absent_network_status.h"
 #include "platform/linux/bus/bus_connection.h"
-#include "platform/linux/bus/door/named_door.h"
-#include "platform/linux/bus/notifications/signal_notifications.h"
 #include "platform/linux/bus/telephony/bus_telephony.h"
 #include "platform/linux/bus_module/bus_services.h"
 
@@ -15,8 +13,6 @@ class LinuxBusServices : public BusServices {
   explicit LinuxBusServices(const BusHost& host);
   [[nodiscard]] Telephony& telephony() override { return _telephony; }
   [[nodiscard]] NetworkStatus& networkStatus() override { return _networkStatus; }
-  [[nodiscard]] BusNotifications& notifications() override { return _notifications; }
-  [[nodiscard]] BusDoor& door() override { return _door; }
 
  private:
   const BusHost _host;
@@ -24,8 +20,6 @@ class LinuxBusServices : public BusServices {
   BusConnection _sessionBus;
   BusTelephony _telephony;
   AbsentNetworkStatus _networkStatus;
-  SignalNotifications _notifications;
-  NamedDoor _door;
 };
 
 }  // namespace zal

@@ -106,10 +106,10 @@ ProgramOutcome runBounded(const std::vector<std::string>& command, Patience& pat
   return {.output = std::move(output.text), .errors = std::move(errors.text), .trouble = std::move(trouble)};
 }
 
-void searchForAdministratorsToolsToo() {
-  const char* const path = std::getenv("PATH");
-  const std::string usual = path != nullptr ? path : "/usr/local/bin:/usr/bin:/bin";
-  ::setenv("PATH", (usual + ":/usr/local/sbin:/usr/sbin:/sbin").c_str(), 1);
+void searchForToolsIn(const std::string& path) {
+  const char* const own = std::getenv("PATH");
+  const std::string usual = own != nullptr ? own : "/usr/local/bin:/usr/bin:/bin";
+  ::setenv("PATH", path.empty() ? (usual + ":/usr/local/sbin:/usr/sbin:/sbin").c_str() : path.c_str(), 1);
 }
 
 }  // namespace zal::helper

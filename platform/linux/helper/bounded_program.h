@@ -26,8 +26,8 @@ struct ProgramOutcome {
 [[nodiscard]] ProgramOutcome runBounded(const std::vector<std::string>& command, Patience& patience,
                                         const ProgramLimits& limits = {});
 
-/// Behind the search path, once at the start: where administrators' tools lie, which an ordinary
-/// user's path lacks.
-void searchForAdministratorsToolsToo();
+/// Once, at the start: programs are looked for in that search path; when it is empty, in the usual one
+/// and behind it where administrators' tools lie, which an ordinary user's path lacks.
+void searchForToolsIn(const std::string& path);
 
 }  // namespace zal::helper

@@ -19,12 +19,10 @@ std::uint64_t sizeOf(const std::string& path) {
 void copyDeviceCoreDumps(const std::string& root, DumpFiles& files, Patience& patience) {
   const std::string folder = root + "/sys/class/devcoredump";
   std::vector<std::string> sources;
-  std::error_code error;
-  std::filesystem::directory_iterator entry(folder, error);
-  for (; !error && entry != std::filesystem::directory_iterator(); entry.increment(error)) {
-    std::string data = entry->path().string() + "/data";
+  for (const std::string& name : namesIn(folder)) {
     std::error_code none;
-    if (std::filesystem::exists(data, none)) sources.push_back(std::move(data));
+    if (std::filesystem::exists(folder + "/" + name + "/data", none))
+      sources.push_back(folder + "/" + name + "/data");
   }
   std::sort(sources.begin(), sources.end());
   if (sources.empty()) {

@@ -6,6 +6,8 @@
 #include <algorithm>
 #include <array>
 #include <cerrno>
+#include <filesystem>
+#include <system_error>
 
 #include "platform/linux/files/descriptor.h"
 #include "platform/linux/files/escaped_text.h"
@@ -135,10 +137,20 @@ void DumpFiles::missing(const std::string& source, const std::string& reason) {
   _lines.push_back("not had: " + escapedLine(source) + ": " + escapedLine(reason));
 }
 
-void DumpFiles::writeNote(const std::string& name, std::string_view heading) {
-  std::string text(heading);
+void DumpFiles::writeNote(const std::string& name, const std::string& reason, const Patience& patience) {
+  std::string text = "reason: " + escapedLine(reason) + "\n";
+  if (!patience.reason().empty()) text += "cut short: " + patience.reason() + "\n";
   for (const std::string& line : _lines) text += line + "\n";
   (void)_place(name, text);
+}
+
+std::vector<std::string> namesIn(const std::string& directory) {
+  std::vector<std::string> names;
+  std::error_code error;
+  std::filesystem::directory_iterator entry(directory, error);
+  for (; !error && entry != std::filesystem::directory_iterator(); entry.increment(error))
+    names.push_back(entry->path().filename().string());
+  return names;
 }
 
 }  // namespace zal::helper

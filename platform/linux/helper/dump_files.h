@@ -40,8 +40,9 @@ class DumpFiles {
   [[nodiscard]] bool gaveSomething() const { return _gaveSomething; }
   /// Whether a file could not be written; the lines say which.
   [[nodiscard]] bool hasFailed() const { return _hasFailed; }
-  /// The note itself: not a source, so it counts as nothing that was given.
-  void writeNote(const std::string& name, std::string_view heading);
+  /// The note: the reason for the dump, what cut it short if anything did, and the lines. It is no source
+  /// and counts as nothing that was given.
+  void writeNote(const std::string& name, const std::string& reason, const Patience& patience);
 
  private:
   bool _place(const std::string& name, std::string_view content);
@@ -53,5 +54,8 @@ class DumpFiles {
   bool _gaveSomething = false;
   bool _hasFailed = false;
 };
+
+/// What lies in the directory, in no order; empty when it cannot be read.
+[[nodiscard]] std::vector<std::string> namesIn(const std::string& directory);
 
 }  // namespace zal::helper

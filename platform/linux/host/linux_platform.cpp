@@ -63,8 +63,8 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
       _logFacility(_loaded.configuration.log.journal ? static_cast<PlatformLogFacility&>(_logMirror)
                                                      : _logFiles),
       _preferences(preferenceDirectory(environment), _agentLog),
-      _directoryNotifications(_mainLoop.context(),
-                              notificationDirectory(_loaded.configuration.roots.RuntimeRoot), _agentLog),
+      _systemNotifications(_mainLoop.context(),
+                           notificationDirectory(_loaded.configuration.roots.RuntimeRoot), _agentLog),
       _crashReporter(_mainLoop.context(), _agentLog,
                      {.helper = _loaded.configuration.commands.toolDirectory + "/lirra-stackshot",
                       .reportDirectory = _loaded.configuration.roots.DiagnosticReportRoot}),
@@ -82,31 +82,28 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
                .descriptors = _descriptors,
                .systemBus = systemBusAddress(environment),
                .sessionBus = sessionBusAddress(environment),
-               .isSystem = environment.isSystem(),
                .startBasebandDump = [this](std::string_view reason) { _basebandDumps.start(reason); }},
       _bus(_busHost, busModulePath(environment)),
-      _ipcWithBus(_ipc, _bus),
-      _systemNotifications(_directoryNotifications, _bus),
       _networkStatus(_bus),
       _telephony(_bus),
       _pings(_mainLoop.context(), _loaded.configuration.interfaces, _agentLog),
       _userAlerts(_mainLoop.context(), _mainLoop, _clock, _agentLog,
                   alertDirectory(_loaded.configuration.roots.RuntimeRoot)),
       _fileCopier(_queues, _agentLog, _loaded.configuration.archiveCompression),
-      _dumpRecords(_clock, _agentLog, progressDirectory(_loaded.configuration.roots.RuntimeRoot)),
-      _dumpProgress(_dumpRecords, [this](DumpNews news) { _announceDump(std::move(news)); }),
+      _wifiDiagnostics(_agentLog, helperProgram(_loaded.configuration, "lirra-wifidump")),
+      _dumpProgress(_clock, _agentLog, progressDirectory(_loaded.configuration.roots.RuntimeRoot)),
       _processExit([this] {
         _ipc.stopListening();
         _userAlerts.cutOffWaiting();
         _queueingShell.startWhatIsQueued();
         _logFacility.flush();
       }),
-      _hostSignals(_mainLoop, [this] { _announceTermination(); }),
+      _hostSignals(_mainLoop, [this] { _ipc.terminationImminent(); }),
       _services{.configuration = _loaded.configuration,
                 .clock = _clock,
                 .mainLoop = _mainLoop,
                 .queues = _queues,
-                .ipc = _ipcWithBus,
+                .ipc = _ipc,
                 .preferences = _preferences,
                 .systemNotifications = _systemNotifications,
                 .localNotifications = _localNotifications,
@@ -137,16 +134,6 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
   for (const std::string& warning : _loaded.warnings) _agentLog.warning(warning);
   removeTemporaryLeftoversLater(_queues.global(QueuePriority::background), _clock, _agentLog,
                                 temporaryArea(_loaded.configuration.roots, environment));
-}
-
-void LinuxPlatform::_announceTermination() {
-  _ipc.terminationImminent();
-  if (BusServices* const services = _bus.loaded()) services->door().terminationImminent();
-}
-
-void LinuxPlatform::_announceDump(DumpNews news) {
-  if (_bus.loaded() == nullptr) return;
-  _mainLoop.post([this, news = std::move(news)] { _bus.loaded()->door().announce(news); });
 }
 
 LinuxPlatform::~LinuxPlatform() {

@@ -5,15 +5,11 @@
 
 #include "platform/linux/absent/absent_device_support.h"
 #include "platform/linux/absent/absent_radio_coexistence.h"
-#include "platform/linux/absent/absent_wifi_diagnostics.h"
 #include "platform/linux/alerts/runtime_alert_store.h"
 #include "platform/linux/archive/zip_file_copier.h"
 #include "platform/linux/baseband/baseband_dump_starter.h"
-#include "platform/linux/bus_module/announced_dump_progress.h"
 #include "platform/linux/bus_module/bus_module.h"
-#include "platform/linux/bus_module/ipc_with_bus.h"
 #include "platform/linux/bus_module/on_demand_services.h"
-#include "platform/linux/bus_module/two_road_notifications.h"
 #include "platform/linux/config/configuration_loader.h"
 #include "platform/linux/config/toml_preference_store.h"
 #include "platform/linux/crash/linux_crash_reporter.h"
@@ -37,6 +33,7 @@
 #include "platform/linux/process/queueing_shell.h"
 #include "platform/linux/progress/runtime_dump_progress.h"
 #include "platform/linux/property_list/pugixml_property_list_writer.h"
+#include "platform/linux/wifi/linux_wifi_diagnostics.h"
 #include "platform/platform.h"
 
 namespace zal {
@@ -55,9 +52,6 @@ class LinuxPlatform {
   [[nodiscard]] Platform& services() { return _services; }
 
  private:
-  void _announceTermination();
-  void _announceDump(DumpNews news);
-
   LoadedConfiguration _loaded;
   LinuxClock _clock;
   LinuxRunLoop _mainLoop;
@@ -68,7 +62,7 @@ class LinuxPlatform {
   MirroringLogFacility _logMirror;
   PlatformLogFacility& _logFacility;
   TomlPreferenceStore _preferences;
-  RuntimeDirectoryNotifications _directoryNotifications;
+  RuntimeDirectoryNotifications _systemNotifications;
   LocalNotifications _localNotifications;
   LinuxCrashReporter _crashReporter;
   PosixFilePlacement _files;
@@ -81,19 +75,16 @@ class LinuxPlatform {
   BasebandDumpStarter _basebandDumps;
   BusHost _busHost;
   BusModule _bus;
-  IpcWithBus _ipcWithBus;
-  TwoRoadNotifications _systemNotifications;
   OnDemandNetworkStatus _networkStatus;
   OnDemandTelephony _telephony;
   LinuxPingFacility _pings;
   RuntimeAlertStore _userAlerts;
   ZipFileCopier _fileCopier;
   AbsentDeviceSupport _deviceSupport;
-  AbsentWifiDiagnostics _wifiDiagnostics;
+  LinuxWifiDiagnostics _wifiDiagnostics;
   AbsentRadioCoexistence _radioCoexistence;
   PugixmlPropertyListWriter _propertyLists;
-  RuntimeDumpProgress _dumpRecords;
-  AnnouncedDumpProgress _dumpProgress;
+  RuntimeDumpProgress _dumpProgress;
   ImmediateProcessExit _processExit;
   LoopHostSignals _hostSignals;
   Platform _services;

@@ -14,6 +14,8 @@
 
 #include <asio/post.hpp>
 
+#include "platform/linux/process/all_signals_blocked.h"
+
 namespace zal {
 
 namespace {
@@ -25,22 +27,6 @@ constexpr int kIoPriorityClassShift = 13;
 constexpr int kLowestNice = 19;
 
 constexpr std::chrono::nanoseconds kLongestQueueDelay = std::chrono::hours{24 * 365 * 100};
-
-/// New threads inherit the signal mask of their maker.
-class AllSignalsBlocked {
- public:
-  AllSignalsBlocked() {
-    sigset_t all;
-    ::sigfillset(&all);
-    ::pthread_sigmask(SIG_SETMASK, &all, &_before);
-  }
-  ~AllSignalsBlocked() { ::pthread_sigmask(SIG_SETMASK, &_before, nullptr); }
-  AllSignalsBlocked(const AllSignalsBlocked&) = delete;
-  AllSignalsBlocked& operator=(const AllSignalsBlocked&) = delete;
-
- private:
-  sigset_t _before{};
-};
 
 /// Of the calling thread alone: on Linux both are per thread. Children inherit them.
 std::error_code becomeBackgroundThread() {

@@ -35,13 +35,8 @@ const std::vector<ControlTool>& controlTools() {
 }
 
 std::vector<std::string> controlDevices(const std::string& root) {
-  std::vector<std::string> names;
-  std::error_code error;
-  std::filesystem::directory_iterator entry(root + "/dev", error);
-  for (; !error && entry != std::filesystem::directory_iterator(); entry.increment(error)) {
-    std::string name = entry->path().filename().string();
-    if (name.starts_with("cdc-wdm")) names.push_back(std::move(name));
-  }
+  auto names = helper::namesIn(root + "/dev");
+  std::erase_if(names, [](const std::string& name) { return !name.starts_with("cdc-wdm"); });
   std::sort(names.begin(), names.end());
   return names;
 }

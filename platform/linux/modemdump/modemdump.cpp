@@ -2,17 +2,15 @@
 
 #include <sys/resource.h>
 
-#include <charconv>
-#include <cstdlib>
 #include <filesystem>
 #include <iostream>
-#include <map>
 #include <system_error>
 
 #include "platform/linux/baseband/hand_off_marker.h"
 #include "platform/linux/files/escaped_text.h"
 #include "platform/linux/helper/device_core_dumps.h"
 #include "platform/linux/helper/dump_files.h"
+#include "platform/linux/helper/option_words.h"
 #include "platform/linux/helper/patience.h"
 #include "platform/linux/loop/linux_clock.h"
 #include "platform/linux/modemdump/daemon_log.h"
@@ -53,18 +51,9 @@ int fail(int code, const std::string& trouble) {
   return code;
 }
 
-std::vector<std::string> namesIn(const std::string& directory) {
-  std::vector<std::string> names;
-  std::error_code error;
-  std::filesystem::directory_iterator entry(directory, error);
-  for (; !error && entry != std::filesystem::directory_iterator(); entry.increment(error))
-    names.push_back(entry->path().filename().string());
-  return names;
-}
-
 void removeOutdated(const std::string& directory) {
   std::error_code ignored;
-  for (const std::string& name : outdatedNames(namesIn(directory)))
+  for (const std::string& name : outdatedNames(helper::namesIn(directory)))
     std::filesystem::remove(directory + "/" + name, ignored);
 }
 
@@ -83,58 +72,34 @@ void askBus(const Options& options, helper::DumpFiles& files, helper::Patience& 
   writeDaemonLog(bus, daemon, options.root, options.listening, meanwhile, files, patience);
 }
 
-std::string heading(const Options& options, const helper::Patience& patience) {
-  std::string text = "reason: " + escapedLine(options.reason) + "\n";
-  if (!patience.reason().empty()) text += "cut short: " + patience.reason() + "\n";
-  return text;
-}
-
 int writeSet(const Options& options, helper::Patience& patience) {
   if (const auto error = createDirectoriesWithMode0777(options.directory))
     return fail(kCannotWrite, options.directory + ": " + error.message());
   const LinuxClock clock;
   helper::DumpFiles files(options.directory,
-                          newSetPrefix(namesIn(options.directory), clock.wallNow(), clock));
+                          newSetPrefix(helper::namesIn(options.directory), clock.wallNow(), clock));
   askBus(options, files, patience);
   writeControlDevices(options.root, files, patience);
   helper::copyDeviceCoreDumps(options.root, files, patience);
-  files.writeNote("note.txt", heading(options, patience));
+  files.writeNote("note.txt", options.reason, patience);
   removeOutdated(options.directory);
   if (files.hasFailed())
     return fail(kCannotWrite, "a file in " + options.directory + " could not be written");
   return files.gaveSomething() ? kDone : kNothingHad;
 }
 
-std::optional<std::chrono::seconds> seconds(const std::string& word) {
-  int number = 0;
-  const auto [end, error] = std::from_chars(word.data(), word.data() + word.size(), number);
-  if (error != std::errc{} || end != word.data() + word.size() || number < 0) return std::nullopt;
-  return std::chrono::seconds{number};
-}
-
 }  // namespace
 
 std::optional<Options> parseOptions(const std::vector<std::string>& words) {
   Options options;
-  const std::map<std::string, std::string*> texts = {{"--directory", &options.directory},
-                                                     {"--marker", &options.marker},
-                                                     {"--reason", &options.reason},
-                                                     {"--root", &options.root},
-                                                     {"--tools", &options.tools}};
-  const std::map<std::string, std::chrono::seconds*> times = {{"--limit", &options.limit},
-                                                              {"--listening", &options.listening}};
-  for (std::size_t i = 0; i + 1 < words.size(); i += 2) {
-    if (const auto text = texts.find(words[i]); text != texts.end()) {
-      *text->second = words[i + 1];
-    } else if (const auto time = times.find(words[i]); time != times.end()) {
-      const auto length = seconds(words[i + 1]);
-      if (!length) return std::nullopt;
-      *time->second = *length;
-    } else {
-      return std::nullopt;
-    }
-  }
-  if (words.size() % 2 != 0 || options.directory.empty() || options.marker.empty()) return std::nullopt;
+  const bool areKnown = helper::takeOptions(
+      words, {.texts = {{"--directory", &options.directory},
+                        {"--marker", &options.marker},
+                        {"--reason", &options.reason},
+                        {"--root", &options.root},
+                        {"--tools", &options.tools}},
+              .times = {{"--limit", &options.limit}, {"--listening", &options.listening}}});
+  if (!areKnown || options.directory.empty() || options.marker.empty()) return std::nullopt;
   return options;
 }
 
@@ -155,11 +120,7 @@ int run(const std::vector<std::string>& words) {
     std::cerr << "lirra-modemdump: " << escapedLine(options->marker + ": " + error->message()) << std::endl;
   }
   (void)::setpriority(PRIO_PROCESS, 0, kNice);
-  if (options->tools.empty()) {
-    helper::searchForAdministratorsToolsToo();
-  } else {
-    ::setenv("PATH", options->tools.c_str(), 1);
-  }
+  helper::searchForToolsIn(options->tools);
   return writeSet(*options, patience);
 }
 

@@ -1,14 +1,9 @@
 #include <gtest/gtest.h>
 
-#include <thread>
-#include <vector>
-
 #include "platform/linux/absent/absent_device_support.h"
 #include "platform/linux/absent/absent_network_status.h"
 #include "platform/linux/absent/absent_radio_coexistence.h"
 #include "platform/linux/absent/absent_telephony.h"
-#include "platform/linux/absent/absent_wifi_diagnostics.h"
-#include "tests/support/temporary_directory.h"
 
 namespace zal::testing {
 namespace {
@@ -41,19 +36,6 @@ TEST(AbsentDeviceSupportTest, HasNoNameAndNoCallsOverCellular) {
   AbsentDeviceSupport support;
   EXPECT_EQ(support.deviceName(), "");
   EXPECT_FALSE(support.videoCallsOverCellularAvailable());
-}
-
-TEST(AbsentWifiDiagnosticsTest, CompletesInsideTheCallWithAFailureAndLeavesTheDirectoryAlone) {
-  const TemporaryDirectory directory;
-  AbsentWifiDiagnostics diagnostics;
-  std::vector<int> results;
-  const auto thread = std::this_thread::get_id();
-  diagnostics.takeDump(directory.path(), "reason", [&](int result) {
-    results.push_back(result);
-    EXPECT_EQ(std::this_thread::get_id(), thread);
-  });
-  EXPECT_EQ(results, std::vector<int>{-1});
-  EXPECT_EQ(listTree(directory.path()), "");
 }
 
 TEST(AbsentRadioCoexistenceTest, HasNothingToCall) {

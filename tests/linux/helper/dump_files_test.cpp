@@ -33,8 +33,8 @@ TEST_F(DumpFilesTest, ASourceIsAFileAndALine) {
 
 TEST_F(DumpFilesTest, MissingSourceIsALineAloneAndNothingGiven) {
   files.missing("somewhere", "not there");
-  files.writeNote("note.txt", "heading\n");
-  EXPECT_EQ(content("note.txt"), "heading\nnot had: somewhere: not there\n");
+  files.writeNote("note.txt", "a\nreason", patience);
+  EXPECT_EQ(content("note.txt"), "reason: a\\x0areason\nnot had: somewhere: not there\n");
   EXPECT_FALSE(files.gaveSomething());
   EXPECT_FALSE(files.hasFailed());
 }
