@@ -38,6 +38,11 @@ struct IpcSettings {
   std::uint32_t maximumReplyBacklog = 1U << 20U;  ///< unread reply bytes after which a peer is dropped
 };
 
+/// `[bus]`
+struct BusSettings {
+  bool enabled = true;  ///< false: nothing that speaks D-Bus is loaded, and every service of a bus is absent
+};
+
 /// `[log]`
 struct LogSettings {
   std::vector<std::string> categories;       ///< switched on; LIRRA_LOG_CATEGORIES adds to them
@@ -82,6 +87,7 @@ struct Configuration {
   Endpoints endpoints;
   Interfaces interfaces;
   IpcSettings ipc;
+  BusSettings bus;
   LogSettings log;
   CommandSettings commands;
   CollectionSettings collection;

@@ -10,7 +10,7 @@ namespace zal::bench {
 namespace {
 
 constexpr long kDistanceMicroseconds = 5000;  // 200 records a second: every record finds its server asleep
-constexpr double kPatienceSeconds = 5;
+constexpr double kPatienceForOneSeconds = 5;
 
 }  // namespace
 
@@ -27,7 +27,7 @@ std::string measureLatency(LogServer& server, const std::filesystem::path& folde
     sender->send(number);
     while (server.stored() < expected) {
       sched_yield();  // or a server that was woken on this processor would wait for our time slice to end
-      if (watch.seconds() > kPatienceSeconds) return std::string(server.name()) + " lost a record";
+      if (watch.seconds() > kPatienceForOneSeconds) return std::string(server.name()) + " lost a record";
     }
     seconds.push_back(watch.seconds());
   }

@@ -60,7 +60,7 @@ bool eventually(const std::function<bool()>& condition, std::chrono::millisecond
   return true;
 }
 
-AgentSandbox::AgentSandbox() : stateRoot(_directory / "state") {
+AgentSandbox::AgentSandbox() : stateRoot(_directory / "state"), bus("unix:path=" + (_directory / "no-bus")) {
   for (const char* name : {"run", "config", "home", "tmp", "state", "tools"}) {
     std::filesystem::create_directories(_directory / name);
   }
@@ -116,6 +116,8 @@ std::vector<std::string> AgentSandbox::environment() const {
       "TZ=CEST-2",
       "LIRRA_SOCKET=" + socketPath(),
       "LIRRA_CONFIG=" + configurationFile(),
+      "DBUS_SYSTEM_BUS_ADDRESS=" + bus,
+      "DBUS_SESSION_BUS_ADDRESS=" + bus,
   };
   for (const char* name : {"ASAN_OPTIONS", "UBSAN_OPTIONS", "TSAN_OPTIONS", "LSAN_OPTIONS"}) {
     if (const char* value = std::getenv(name)) result.push_back(std::string(name) + "=" + value);

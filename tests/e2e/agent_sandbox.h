@@ -35,6 +35,9 @@ class AgentSandbox {
   /// Where the log and report roots lie; another directory when a test wants another file system.
   std::string stateRoot;
 
+  /// D-Bus address of both buses; by default one where there is none, whatever runs on this machine.
+  std::string bus;
+
   void writeConfiguration() const;
   /// Replaces the stored switches by those that are named.
   void setSwitches(const std::vector<std::string>& switchedOn) const;

@@ -28,6 +28,7 @@ class PrivateBus {
   void kill();
   /// A new daemon at the same address.
   void start();
+  [[nodiscard]] bool isRunning() const { return _daemon != nullptr; }
   /// It neither reads nor answers until goOn().
   void hang() { _daemon->signal(19); }
   void goOn() { _daemon->signal(18); }

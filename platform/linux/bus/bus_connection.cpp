@@ -250,15 +250,16 @@ void BusConnection::_drop(const Handlers* newcomer) {
   _watch.reset();
   _timeout.cancel();
   _daemon.reset();
-  // Later: a handler of one of its matches may be on the stack.
-  if (auto link = std::exchange(_link, nullptr)) _host.mainLoop.post([link] {});
-  if (bus == nullptr) return;
+  const auto link = std::exchange(_link, nullptr);
   const std::weak_ptr<bool> alive = _alive;
-  for (const auto& member : _members()) {
+  RunLoop& loop = _host.mainLoop;
+  for (const auto& member : bus != nullptr ? _members() : std::vector<std::weak_ptr<Handlers>>()) {
     const auto user = member.lock();
     if (user != nullptr && user.get() != newcomer) user->onLost();
-    if (alive.expired()) return;
+    if (alive.expired()) break;
   }
+  // Later, and after what users leave for later: what hangs on it may be on the stack.
+  if (link != nullptr) loop.post([link] {});
 }
 
 void BusConnection::_retryLater() {

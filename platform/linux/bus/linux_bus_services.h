@@ -1,7 +1,9 @@
 #pragma once
 
-#include "platform/linux/absent/absent_network_status.h"
 #include "platform/linux/bus/bus_connection.h"
+#include "platform/linux/bus/door/named_door.h"
+#include "platform/linux/bus/network/bus_network_status.h"
+#include "platform/linux/bus/notifications/signal_notifications.h"
 #include "platform/linux/bus/telephony/bus_telephony.h"
 #include "platform/linux/bus_module/bus_services.h"
 
@@ -13,13 +15,17 @@ class LinuxBusServices : public BusServices {
   explicit LinuxBusServices(const BusHost& host);
   [[nodiscard]] Telephony& telephony() override { return _telephony; }
   [[nodiscard]] NetworkStatus& networkStatus() override { return _networkStatus; }
+  [[nodiscard]] BusNotifications& notifications() override { return _notifications; }
+  [[nodiscard]] BusDoor& door() override { return _door; }
 
  private:
   const BusHost _host;
   BusConnection _systemBus;
   BusConnection _sessionBus;
   BusTelephony _telephony;
-  AbsentNetworkStatus _networkStatus;
+  BusNetworkStatus _networkStatus;
+  SignalNotifications _notifications;
+  NamedDoor _door;
 };
 
 }  // namespace zal

@@ -23,6 +23,7 @@ struct BusHost {
   DescriptorWatcher& descriptors;
   std::string systemBus;   ///< D-Bus address; empty: this host has none
   std::string sessionBus;  ///< of the agent's own user; empty: there is none
+  bool isSystem = false;   ///< an agent of the superuser, which has its name on the system bus
   /// Starts the baseband dump's helper; any thread, returns at once.
   std::function<void(std::string_view reason)> startBasebandDump = [](std::string_view) {};
 };

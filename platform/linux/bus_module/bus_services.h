@@ -2,7 +2,9 @@
 
 #include <memory>
 
+#include "platform/linux/bus_module/bus_door.h"
 #include "platform/linux/bus_module/bus_host.h"
+#include "platform/linux/bus_module/bus_notifications.h"
 #include "platform/network_status.h"
 #include "platform/telephony.h"
 
@@ -15,6 +17,8 @@ class BusServices {
   virtual ~BusServices() = default;
   [[nodiscard]] virtual Telephony& telephony() = 0;
   [[nodiscard]] virtual NetworkStatus& networkStatus() = 0;
+  [[nodiscard]] virtual BusNotifications& notifications() = 0;
+  [[nodiscard]] virtual BusDoor& door() = 0;
 };
 
 /// What the module's one symbol, `lirraMakeBusServices`, is. Never empty; throws nothing but

@@ -212,6 +212,7 @@ constexpr ConfigurationKey kKeys[] = {
      takeCount<&Configuration::ipc, &IpcSettings::maximumPayload, 1024, kLargestBlock>},
     {"ipc", "maximumReplyBacklog",
      takeCount<&Configuration::ipc, &IpcSettings::maximumReplyBacklog, 1024, kLargestBlock>},
+    {"bus", "enabled", takeFlag<&Configuration::bus, &BusSettings::enabled>},
     {"log", "categories", takeCategories},
     {"log", "rotationSize", takeCount<&Configuration::log, &LogSettings::rotationSize, 1024, kLargestBlock>},
     {"log", "maximumOpenFiles", takeCount<&Configuration::log, &LogSettings::maximumOpenFiles, 1, 65536>},

@@ -63,8 +63,8 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
       _logFacility(_loaded.configuration.log.journal ? static_cast<PlatformLogFacility&>(_logMirror)
                                                      : _logFiles),
       _preferences(preferenceDirectory(environment), _agentLog),
-      _systemNotifications(_mainLoop.context(),
-                           notificationDirectory(_loaded.configuration.roots.RuntimeRoot), _agentLog),
+      _directoryNotifications(_mainLoop.context(),
+                              notificationDirectory(_loaded.configuration.roots.RuntimeRoot), _agentLog),
       _crashReporter(_mainLoop.context(), _agentLog,
                      {.helper = _loaded.configuration.commands.toolDirectory + "/lirra-stackshot",
                       .reportDirectory = _loaded.configuration.roots.DiagnosticReportRoot}),
@@ -82,8 +82,11 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
                .descriptors = _descriptors,
                .systemBus = systemBusAddress(environment),
                .sessionBus = sessionBusAddress(environment),
+               .isSystem = environment.isSystem(),
                .startBasebandDump = [this](std::string_view reason) { _basebandDumps.start(reason); }},
       _bus(_busHost, busModulePath(environment)),
+      _ipcWithBus(_ipc, _bus),
+      _systemNotifications(_directoryNotifications, _bus),
       _networkStatus(_bus),
       _telephony(_bus),
       _pings(_mainLoop.context(), _loaded.configuration.interfaces, _agentLog),
@@ -91,19 +94,20 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
                   alertDirectory(_loaded.configuration.roots.RuntimeRoot)),
       _fileCopier(_queues, _agentLog, _loaded.configuration.archiveCompression),
       _wifiDiagnostics(_agentLog, helperProgram(_loaded.configuration, "lirra-wifidump")),
-      _dumpProgress(_clock, _agentLog, progressDirectory(_loaded.configuration.roots.RuntimeRoot)),
+      _dumpRecords(_clock, _agentLog, progressDirectory(_loaded.configuration.roots.RuntimeRoot)),
+      _dumpProgress(_dumpRecords, [this](DumpNews news) { _announceDump(std::move(news)); }),
       _processExit([this] {
         _ipc.stopListening();
         _userAlerts.cutOffWaiting();
         _queueingShell.startWhatIsQueued();
         _logFacility.flush();
       }),
-      _hostSignals(_mainLoop, [this] { _ipc.terminationImminent(); }),
+      _hostSignals(_mainLoop, [this] { _announceTermination(); }),
       _services{.configuration = _loaded.configuration,
                 .clock = _clock,
                 .mainLoop = _mainLoop,
                 .queues = _queues,
-                .ipc = _ipc,
+                .ipc = _ipcWithBus,
                 .preferences = _preferences,
                 .systemNotifications = _systemNotifications,
                 .localNotifications = _localNotifications,
@@ -134,6 +138,16 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
   for (const std::string& warning : _loaded.warnings) _agentLog.warning(warning);
   removeTemporaryLeftoversLater(_queues.global(QueuePriority::background), _clock, _agentLog,
                                 temporaryArea(_loaded.configuration.roots, environment));
+}
+
+void LinuxPlatform::_announceTermination() {
+  _ipc.terminationImminent();
+  if (BusServices* const services = _bus.loaded()) services->door().terminationImminent();
+}
+
+void LinuxPlatform::_announceDump(DumpNews news) {
+  if (_bus.loaded() == nullptr) return;
+  _mainLoop.post([this, news = std::move(news)] { _bus.loaded()->door().announce(news); });
 }
 
 LinuxPlatform::~LinuxPlatform() {

@@ -8,8 +8,11 @@
 #include "platform/linux/alerts/runtime_alert_store.h"
 #include "platform/linux/archive/zip_file_copier.h"
 #include "platform/linux/baseband/baseband_dump_starter.h"
+#include "platform/linux/bus_module/announced_dump_progress.h"
 #include "platform/linux/bus_module/bus_module.h"
+#include "platform/linux/bus_module/ipc_with_bus.h"
 #include "platform/linux/bus_module/on_demand_services.h"
+#include "platform/linux/bus_module/two_road_notifications.h"
 #include "platform/linux/config/configuration_loader.h"
 #include "platform/linux/config/toml_preference_store.h"
 #include "platform/linux/crash/linux_crash_reporter.h"
@@ -52,6 +55,9 @@ class LinuxPlatform {
   [[nodiscard]] Platform& services() { return _services; }
 
  private:
+  void _announceTermination();
+  void _announceDump(DumpNews news);
+
   LoadedConfiguration _loaded;
   LinuxClock _clock;
   LinuxRunLoop _mainLoop;
@@ -62,7 +68,7 @@ class LinuxPlatform {
   MirroringLogFacility _logMirror;
   PlatformLogFacility& _logFacility;
   TomlPreferenceStore _preferences;
-  RuntimeDirectoryNotifications _systemNotifications;
+  RuntimeDirectoryNotifications _directoryNotifications;
   LocalNotifications _localNotifications;
   LinuxCrashReporter _crashReporter;
   PosixFilePlacement _files;
@@ -75,6 +81,8 @@ class LinuxPlatform {
   BasebandDumpStarter _basebandDumps;
   BusHost _busHost;
   BusModule _bus;
+  IpcWithBus _ipcWithBus;
+  TwoRoadNotifications _systemNotifications;
   OnDemandNetworkStatus _networkStatus;
   OnDemandTelephony _telephony;
   LinuxPingFacility _pings;
@@ -84,7 +92,8 @@ class LinuxPlatform {
   LinuxWifiDiagnostics _wifiDiagnostics;
   AbsentRadioCoexistence _radioCoexistence;
   PugixmlPropertyListWriter _propertyLists;
-  RuntimeDumpProgress _dumpProgress;
+  RuntimeDumpProgress _dumpRecords;
+  AnnouncedDumpProgress _dumpProgress;
   ImmediateProcessExit _processExit;
   LoopHostSignals _hostSignals;
   Platform _services;

@@ -15,6 +15,8 @@ namespace {
 
 constexpr std::uint32_t kLost = IN_DELETE_SELF | IN_MOVE_SELF | IN_UNMOUNT;
 constexpr std::uint32_t kChangedInside = IN_CREATE | IN_MOVED_TO | IN_DELETE | IN_MOVED_FROM;
+/// Renames whose second half is still awaited; those of files that left the directory never have one.
+constexpr std::size_t kMostDepartures = 64;
 
 }  // namespace
 
@@ -57,14 +59,15 @@ void DirectoryWatch::_readEvents() {
       inotify_event event;
       std::memcpy(&event, buffer.data() + offset, sizeof event);
       const char* name = buffer.data() + offset + sizeof event;
-      _handle(event.wd, event.mask, event.len == 0 ? std::string_view() : std::string_view(name));
+      _handle(event.wd, event.mask, event.cookie,
+              event.len == 0 ? std::string_view() : std::string_view(name));
       if (alive.expired()) return;
       offset += sizeof event + event.len;
     }
   }
 }
 
-void DirectoryWatch::_handle(int watch, std::uint32_t mask, std::string_view name) {
+void DirectoryWatch::_handle(int watch, std::uint32_t mask, std::uint32_t cookie, std::string_view name) {
   if ((mask & IN_Q_OVERFLOW) != 0) {
     // The end of a watch may be among what was lost.
     _establish();
@@ -72,11 +75,31 @@ void DirectoryWatch::_handle(int watch, std::uint32_t mask, std::string_view nam
     return;
   }
   if (watch == _directoryWatch && (mask & kLost) == 0) {
-    if ((mask & IN_MOVED_TO) != 0) _handlers.onArrival(name);
+    if ((mask & IN_MOVED_FROM) != 0) _noteDeparture(cookie, name);
+    if ((mask & IN_MOVED_TO) != 0) _report(name, _takeDeparture(cookie));
     return;
   }
   // What is left over of watches that were given up says nothing new.
   if (watch == _directoryWatch || watch == _outerWatch) _establish();
+}
+
+void DirectoryWatch::_noteDeparture(std::uint32_t cookie, std::string_view name) {
+  if (_departures.size() == kMostDepartures) _departures.pop_front();
+  _departures.emplace_back(cookie, name);
+}
+
+std::string DirectoryWatch::_takeDeparture(std::uint32_t cookie) {
+  for (auto place = _departures.begin(); place != _departures.end(); ++place) {
+    if (place->first != cookie) continue;
+    std::string name = std::move(place->second);
+    _departures.erase(place);
+    return name;
+  }
+  return "";
+}
+
+void DirectoryWatch::_report(std::string_view name, std::string_view formerName) {
+  _handlers.onRename ? _handlers.onRename(name, formerName) : _handlers.onArrival(name);
 }
 
 void DirectoryWatch::_establish() {
@@ -105,7 +128,7 @@ void DirectoryWatch::_reportExisting() {
   }
   const std::weak_ptr<bool> alive = _alive;
   for (const std::string& name : names) {
-    _handlers.onArrival(name);
+    _report(name, "");
     if (alive.expired()) return;
   }
 }
@@ -113,7 +136,8 @@ void DirectoryWatch::_reportExisting() {
 bool DirectoryWatch::_addWatches() {
   const int descriptor = _inotify.native_handle();
   const std::string parent = std::filesystem::path(_directory).parent_path().string();
-  _directoryWatch = ::inotify_add_watch(descriptor, _directory.c_str(), IN_MOVED_TO | kLost | IN_ONLYDIR);
+  const std::uint32_t renames = _handlers.onRename ? IN_MOVED_FROM | IN_MOVED_TO : IN_MOVED_TO;
+  _directoryWatch = ::inotify_add_watch(descriptor, _directory.c_str(), renames | kLost | IN_ONLYDIR);
   if (_directoryWatch < 0) return false;
   // A parent that is moved takes our directory with it and tells only its own watchers.
   _outerWatch = ::inotify_add_watch(descriptor, parent.c_str(), kLost | IN_ONLYDIR);

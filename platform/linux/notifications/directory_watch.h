@@ -1,11 +1,13 @@
 #pragma once
 
 #include <cstdint>
+#include <deque>
 #include <functional>
 #include <memory>
 #include <string>
 #include <string_view>
 #include <system_error>
+#include <utility>
 
 #include <asio/io_context.hpp>
 #include <asio/posix/stream_descriptor.hpp>
@@ -22,6 +24,9 @@ class DirectoryWatch {
     /// Arrivals may have been missed: the queue overflowed.
     std::function<void()> onOverflow;
     std::function<void(std::string_view problem)> onProblem;  ///< once per outage
+    /// Called in onArrival's place where it is set: with the name that the file had in the directory
+    /// before, empty when it came from elsewhere or came while nobody looked.
+    std::function<void(std::string_view name, std::string_view formerName)> onRename = nullptr;
   };
   /// The directory is made, if need be, by `makeDirectory` and looked at from now on.
   DirectoryWatch(asio::io_context& context, std::string directory,
@@ -33,9 +38,12 @@ class DirectoryWatch {
  private:
   void _await();
   void _readEvents();
-  void _handle(int watch, std::uint32_t mask, std::string_view name);
+  void _handle(int watch, std::uint32_t mask, std::uint32_t cookie, std::string_view name);
   void _establish();
   void _reportExisting();
+  void _noteDeparture(std::uint32_t cookie, std::string_view name);
+  [[nodiscard]] std::string _takeDeparture(std::uint32_t cookie);
+  void _report(std::string_view name, std::string_view formerName);
   bool _addWatches();
   void _watchNearestAncestor();
   void _dropWatches();
@@ -47,6 +55,7 @@ class DirectoryWatch {
   asio::posix::stream_descriptor _inotify;
   int _directoryWatch = -1;
   int _outerWatch = -1;  // the parent, or the nearest directory there is
+  std::deque<std::pair<std::uint32_t, std::string>> _departures;  // the first halves of renames
   bool _wasEstablished = false;
   bool _complained = false;
   std::shared_ptr<bool> _alive = std::make_shared<bool>(true);  // dies first: guards handlers in flight

@@ -1,11 +1,15 @@
 #include "platform/linux/notifications/notification_file.h"
 
+#include <fcntl.h>
 #include <sys/stat.h>
+#include <unistd.h>
 
 #include <algorithm>
 #include <cerrno>
+#include <cstdio>
 #include <filesystem>
 
+#include "platform/linux/files/descriptor.h"
 #include "platform/linux/files/system_error.h"
 #include "platform/linux/files/whole_file.h"
 
@@ -14,6 +18,8 @@ namespace {
 
 constexpr mode_t kDirectoryMode = 0700;
 constexpr std::size_t kLongestName = 200;
+constexpr std::size_t kLongestId = 64;
+constexpr std::string_view kPostPrefix = ".post-";
 
 }  // namespace
 
@@ -35,11 +41,36 @@ std::error_code makeNotificationDirectory(const std::string& directory) {
                                                          : std::make_error_code(std::errc::not_a_directory);
 }
 
-std::error_code postNotification(const std::string& directory, std::string_view name) {
-  if (!isNotificationName(name)) return std::make_error_code(std::errc::invalid_argument);
+bool isPostId(std::string_view id) {
+  return !id.empty() && id.size() <= kLongestId && std::all_of(id.begin(), id.end(), [](char c) {
+    return (c >= '0' && c <= '9') || (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z');
+  });
+}
+
+std::string nameOfPost(std::string_view id) { return std::string(kPostPrefix).append(id); }
+
+std::string_view idOfPost(std::string_view formerName) {
+  if (!formerName.starts_with(kPostPrefix)) return {};
+  formerName.remove_prefix(kPostPrefix.size());
+  return isPostId(formerName) ? formerName : std::string_view();
+}
+
+std::error_code postNotification(const std::string& directory, std::string_view name, std::string_view id) {
+  if (!isNotificationName(name) || !(id.empty() || isPostId(id))) {
+    return std::make_error_code(std::errc::invalid_argument);
+  }
   if (const std::error_code error = makeNotificationDirectory(directory)) return error;
   // A rename of the same name over an older post is an event of its own.
-  return placeWholeFile(directory + "/" + std::string(name), "", ExistingFile::isReplaced);
+  const std::string path = directory + "/" + std::string(name);
+  if (id.empty()) return placeWholeFile(path, "", ExistingFile::isReplaced);
+  // The kernel tells watchers both names of a rename, in one piece with it.
+  const std::string made = directory + "/" + nameOfPost(id);
+  const Descriptor file(::open(made.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW | O_CLOEXEC, 0600));
+  if (!file.isOpen()) return lastSystemError();
+  if (::rename(made.c_str(), path.c_str()) == 0) return {};
+  const std::error_code error = lastSystemError();
+  ::unlink(made.c_str());
+  return error;
 }
 
 }  // namespace zal

@@ -24,12 +24,19 @@ class RuntimeDirectoryNotifications : public SystemNotifications {
   void observe(std::string name, std::function<void()> handler) override;
   void post(std::string_view name) override;
 
+  // For who posts and observes by another road too.
+
+  /// As observe; the handler learns the post's id, which is empty when it has none.
+  void observePosts(std::string name, std::function<void(std::string_view id)> handler);
+  /// As post, with an id that no other post has; empty: without one.
+  void postWithId(std::string_view name, std::string_view id);
+
  private:
   struct Observer {
     std::string name;
-    std::function<void()> handler;
+    std::function<void(std::string_view id)> handler;
   };
-  void _deliver(std::string_view name);
+  void _deliver(std::string_view name, std::string_view id);
   void _deliverToAll();
 
   std::string _directory;

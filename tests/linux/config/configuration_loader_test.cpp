@@ -98,6 +98,8 @@ cellular = "wwp0"
 group = "calls"
 maximumPayload = 2048
 maximumReplyBacklog = 4096
+[bus]
+enabled = false
 [log]
 categories = ["IPC", "Ping"]
 rotationSize = 1024
@@ -156,6 +158,7 @@ closingStageDelay = 0.25
   EXPECT_EQ(c.ipc.group, "calls");
   EXPECT_EQ(c.ipc.maximumPayload, 2048U);
   EXPECT_EQ(c.ipc.maximumReplyBacklog, 4096U);
+  EXPECT_FALSE(c.bus.enabled);
   EXPECT_THAT(c.log.categories, ElementsAre("IPC", "Ping"));
   EXPECT_EQ(c.log.rotationSize, 1024U);
   EXPECT_EQ(c.log.maximumOpenFiles, 2U);

@@ -29,7 +29,9 @@ class LinuxPlatformTest : public ::testing::Test {
     result.homeDirectory = home.path();
     result.variables = {{"LIRRA_CONFIG", home / "config/lirra.toml"},
                         {"LIRRA_SOCKET", home / "agent.socket"},
-                        {"XDG_RUNTIME_DIR", home / "run"}};
+                        {"XDG_RUNTIME_DIR", home / "run"},
+                        {"DBUS_SYSTEM_BUS_ADDRESS", "unix:path=" + (home / "no-bus")},
+                        {"DBUS_SESSION_BUS_ADDRESS", "unix:path=" + (home / "no-bus")}};
     return result;
   }
   LinuxPlatformTest() { configure(""); }

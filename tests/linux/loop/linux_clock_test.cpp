@@ -40,6 +40,14 @@ class LinuxClockTest : public ::testing::Test {
   std::string _before;
 };
 
+TEST_F(LinuxClockTest, TheRoughTimeIsTheSteadyOneOfAMomentAgo) {
+  const LinuxClock clock;
+  const SteadyTime before = clock.steadyNow();
+  const SteadyTime roughly = clock.steadyNowRoughly();
+  EXPECT_LE(roughly, clock.steadyNow());
+  EXPECT_GE(roughly, before - std::chrono::milliseconds(11));
+}
+
 TEST_F(LinuxClockTest, TakesAMomentApartInTheLocalZone) {
   const LinuxClock clock = inZone("CET-1CEST,M3.5.0,M10.5.0/3");
   EXPECT_EQ(text(clock.localTime(WallTime{1714651387251999us})), "2024-05-02 14:03:07.251");

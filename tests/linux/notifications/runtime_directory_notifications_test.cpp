@@ -72,6 +72,38 @@ TEST_F(RuntimeDirectoryNotificationsTest, EachPostOfTheSameNameIsAnEventOfItsOwn
   EXPECT_THAT(delivered, ElementsAre("One", "One", "One"));
 }
 
+TEST_F(RuntimeDirectoryNotificationsTest, ThreePostsAtOnceAreThree) {
+  observe("One");
+  for (int i = 0; i < 3; ++i) notifications.post("One");
+  settle();
+  EXPECT_THAT(delivered, ElementsAre("One", "One", "One"));
+}
+
+TEST_F(RuntimeDirectoryNotificationsTest, EachPostArrivesWithItsOwnIdHoweverFastTheyCome) {
+  std::vector<std::string> ids;
+  notifications.observePosts("One", [&](std::string_view id) { ids.emplace_back(id); });
+  notifications.postWithId("One", "a1");
+  EXPECT_EQ(postNotification(directory, "One"), std::error_code{});
+  notifications.postWithId("One", "B2");
+  settle();
+  EXPECT_THAT(ids, ElementsAre("a1", "", "B2"));
+  EXPECT_EQ(testing::listTree(directory), "Mark\nOne\n");
+}
+
+TEST_F(RuntimeDirectoryNotificationsTest, IdsThatAreNoneAreRefusedAndNotRead) {
+  std::vector<std::string> ids;
+  notifications.observePosts("One", [&](std::string_view id) { ids.emplace_back(id); });
+  for (const std::string id : {"a b", "../a", "a/b", "a-b"}) {
+    EXPECT_EQ(postNotification(directory, "One", id), std::make_error_code(std::errc::invalid_argument));
+  }
+  EXPECT_EQ(postNotification(directory, "One", std::string(65, 'a')),
+            std::make_error_code(std::errc::invalid_argument));
+  testing::writeFile(directory + "/.post-a b", "");
+  std::filesystem::rename(directory + "/.post-a b", directory + "/One");
+  settle();
+  EXPECT_THAT(ids, ElementsAre(""));
+}
+
 TEST_F(RuntimeDirectoryNotificationsTest, LeavesNoTemporaryFile) {
   notifications.post("One");
   settle();

@@ -48,7 +48,12 @@ constexpr const char* kSim = "SimManager";
 constexpr const char* kData = "ConnectionManager";
 constexpr const char* kRadio = "RadioSettings";
 
-enum class Kind { text, yesOrNo, number };
+enum class Kind {
+  text,
+  yesOrNo,
+  yesOrLeftOut,  ///< left out where the question does not arise
+  number,
+};
 
 struct PropertyRow {
   CellularQuery query;
@@ -71,7 +76,7 @@ constexpr std::array kPropertyRows = {
     PropertyRow{CellularQuery::ttyMode, "TextTelephony", "Enabled", Kind::yesOrNo},
     PropertyRow{CellularQuery::isDataAttached, kData, "Attached", Kind::yesOrNo},
     PropertyRow{CellularQuery::isDataEnabled, kData, "Powered", Kind::yesOrNo},
-    PropertyRow{CellularQuery::isDataDisallowed, kData, "Suspended", Kind::yesOrNo},
+    PropertyRow{CellularQuery::isDataDisallowed, kData, "Suspended", Kind::yesOrLeftOut},
     PropertyRow{CellularQuery::internationalDataAccess, kData, "RoamingAllowed", Kind::yesOrNo},
     PropertyRow{CellularQuery::servingCellId, kNetwork, "CellId", Kind::number},
     PropertyRow{CellularQuery::lastKnownSubscriberCountryCode, kSim, "MobileCountryCode", Kind::text},
@@ -86,6 +91,10 @@ Value valueOf(const PropertyRow& row, const OfonoProperties& properties) {
       return textOrNull(text(properties, row.property));
     case Kind::yesOrNo:
       return needed<bool>(properties, row.property);
+    case Kind::yesOrLeftOut: {
+      const auto yes = property<bool>(properties, row.property);
+      return yes ? Value(*yes) : Value();
+    }
     case Kind::number:
       return std::int64_t{needed<std::uint32_t>(properties, row.property)};
   }

@@ -21,8 +21,9 @@ using OfonoInterfaces = std::function<const OfonoProperties*(const std::string& 
 [[nodiscard]] std::optional<CellularSignal> ofonoSignal(const OfonoProperties& networkRegistration);
 
 /// What oFono's properties say to the question. oFono leaves out what it does not know: a text that is
-/// left out has no value, a yes or no or a number failed, for either would claim something. A property
-/// of another type than documented fails. All questions but packetContextCount, which no property answers.
+/// left out has no value, a yes or no or a number failed, for either would claim something. (Whether data
+/// are suspended is left out while they are not attached: that has no value.) A property of another type
+/// than documented fails. All questions but packetContextCount, which no property answers.
 [[nodiscard]] std::optional<CellularAnswer> ofonoAnswer(CellularQuery query,
                                                         const OfonoInterfaces& interfaces);
 
