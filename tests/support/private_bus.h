@@ -28,6 +28,8 @@ class PrivateBus {
   void kill();
   /// A new daemon at the same address.
   void start();
+  /// Other users of this machine too, for as long as the test lasts.
+  void letEverybodyConnect() const;
   [[nodiscard]] bool isRunning() const { return _daemon != nullptr; }
   /// It neither reads nor answers until goOn().
   void hang() { _daemon->signal(19); }

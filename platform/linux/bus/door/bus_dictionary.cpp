@@ -69,8 +69,8 @@ class DictionaryReader {
   }
 
   Value _value() {
-    if (++_values > _limits.values) throw BeyondLimits();
     const auto [type, contents] = _next();
+    if (type != 'v' && ++_values > _limits.values) throw BeyondLimits();
     switch (type) {
       case 'b':
         return _number<bool, bool>();

@@ -11,7 +11,7 @@ namespace zal {
 
 /// What a dictionary that others send may cost.
 struct DictionaryLimits {
-  std::size_t values = 65'536;  ///< those inside others counted
+  std::size_t values = 65'536;  ///< those inside others counted, variants not
   std::size_t bytes = 0;        ///< text and keys
   int depth = 32;               ///< containers in each other, variants too
 };
