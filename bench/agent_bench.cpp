@@ -16,6 +16,7 @@
 #include "bench/ingest/rounds.h"
 #include "bench/ingest/start_up.h"
 #include "bench/servers/agent_server.h"
+#include "bench/stackshot/stackshot_figures.h"
 #include "bench/support/scratch_folder.h"
 #include "bench/support/statistics.h"
 #include "bench/support/table.h"
@@ -174,6 +175,23 @@ bool addDump(Rows& rows, const std::filesystem::path& programs, bool quick) {
   return true;
 }
 
+/// Returned: whether there was a stackshot.
+bool addStackshot(Rows& rows, const std::filesystem::path& programs, bool quick) {
+  const unsigned processes = quick ? 3 : 40;
+  constexpr unsigned kThreadsEach = 4;
+  const std::string figure =
+      "stackshot, " + std::to_string(processes * kThreadsEach) + " threads : eu-stack in a loop";
+  fprintf(stderr, "stackshots of %u processes\n", processes);
+  const StackshotFigures figures = measureStackshot(programs, processes, kThreadsEach, quick ? 1 : 11);
+  if (!figures.missing.empty()) {
+    rows.push_back(skipped(figure, figures.missing));
+    return false;
+  }
+  rows.push_back(plain(figure, figures.ours, figures.peer, duration));
+  if (!figures.peerMissing.empty()) rows.back().peer = figures.peerMissing;
+  return true;
+}
+
 int run(const std::filesystem::path& programs, bool quick) {
   Extent extent;
   if (quick) extent = {1, 5'000, 50, 3, 2, 20'000};
@@ -186,6 +204,7 @@ int run(const std::filesystem::path& programs, bool quick) {
   addMemory(rows, results);
   bool ownPart = addStartUp(rows, programs, extent.startUps);
   ownPart = addDump(rows, programs, quick) && ownPart;
+  ownPart = addStackshot(rows, programs, quick) && ownPart;
   {
     // The idle agent idles on while the lists are measured: its own switches are counted, nobody else's.
     IdleWatch idle(programs);

@@ -64,25 +64,25 @@ class StackshotProgramTest : public ::testing::Test {
 };
 
 TEST_F(StackshotProgramTest, ReportsOneProcessUnderItsNameWithCodeAndMessage) {
-  TargetProcess target([] { zalSleepsInTheTest(); });
-  ASSERT_TRUE(target.becomes('S'));
+  TargetProcess target("alone");
+  ASSERT_TRUE(target.becomes("S"));
   const std::string id = std::to_string(target.id());
   EXPECT_EQ(runProgram({"--pid", id, "--code", "0xFED9E2FF", "--message", "Simulating", "--output",
                         directory / "reports/"}),
             0);
   EXPECT_EQ(err, "");
-  EXPECT_THAT(out, MatchesRegex(directory / "reports/linux_stackshot-....-..-..-......\\.crash\n"));
+  EXPECT_THAT(out, MatchesRegex(directory / "reports/stackshot_targe-....-..-..-......\\.crash\n"));
   EXPECT_THAT(report(),
               AllOf(HasSubstr("Report of process " + id + "\n\n"), HasSubstr("Message:        Simulating\n"),
                     HasSubstr("Code:           0xFED9E2FF\n"), HasSubstr("Threads:        1, 1 stack\n"),
                     HasSubstr(" zalSleepsInTheTest + 0x"), Not(HasSubstr("Incomplete:"))));
   EXPECT_TRUE(target.isFree());
-  EXPECT_TRUE(target.becomes('S'));
+  EXPECT_TRUE(target.becomes("S"));
 }
 
 TEST_F(StackshotProgramTest, AnExceptionIsToldInTheReportOfItsProcess) {
-  TargetProcess target([] { zalSleepsInTheTest(); });
-  ASSERT_TRUE(target.becomes('S'));
+  TargetProcess target("alone");
+  ASSERT_TRUE(target.becomes("S"));
   const std::string id = std::to_string(target.id());
   EXPECT_EQ(runProgram({"--pid", id, "--exception", "broken", "--output", "-"}), 0);
   EXPECT_THAT(out, AllOf(HasSubstr("Report of an exception in process " + id + "\n\n"),
@@ -150,13 +150,13 @@ TEST_F(StackshotProgramTest, WithoutPrivilegeOthersAreListedWithTheReason) {
   std::vector<std::string> trial = nobody;
   trial.insert(trial.end(), {ZAL_STACKSHOT_PATH, "--help"});
   if (run(trial) != 0) GTEST_SKIP() << "nobody may not run the program where it lies: " << err;
-  TargetProcess target([] { zalSleepsInTheTest(); });
-  ASSERT_TRUE(target.becomes('S'));
+  TargetProcess target("alone");
+  ASSERT_TRUE(target.becomes("S"));
   std::vector<std::string> command = nobody;
   command.insert(command.end(), {ZAL_STACKSHOT_PATH, "--pid", std::to_string(target.id()), "--output", "-"});
   EXPECT_EQ(run(command), 0);
   EXPECT_THAT(out, AllOf(HasSubstr("Incomplete:     1 thread (Permission denied)\n"),
-                         HasSubstr(" [linux_stackshot], S (sleeping)"),
+                         HasSubstr(" [stackshot_targe], S (sleeping)"),
                          EndsWith("    no stack: Permission denied\n\n")));
   EXPECT_TRUE(target.isFree());
 }

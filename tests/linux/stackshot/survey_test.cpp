@@ -1,9 +1,6 @@
 #include "platform/linux/stackshot/survey.h"
 
-#include <sched.h>
-#include <sys/prctl.h>
 #include <sys/ptrace.h>
-#include <sys/syscall.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -11,7 +8,6 @@
 #include <gtest/gtest.h>
 
 #include <csignal>
-#include <thread>
 
 #include "platform/linux/stackshot/process_files.h"
 #include "tests/linux/stackshot/target_process.h"
@@ -37,19 +33,6 @@ std::vector<std::string> functionsOf(const ThreadRecord& thread) {
   return result;
 }
 
-void twoThreads() {
-  std::thread other([] { zalSleepsInTheTest(); });
-  zalSleepsDeepInTheTest(3);
-  other.join();
-}
-
-/// Sleeps until the child that it makes has run a program, which it never does.
-void sleepUninterruptibly() {
-  if (::syscall(SYS_clone, CLONE_VFORK | SIGCHLD, nullptr, nullptr, nullptr, nullptr) != 0) return;
-  ::prctl(PR_SET_PDEATHSIG, SIGKILL);
-  zalSleepsInTheTest();
-}
-
 class SurveyTest : public ::testing::Test {
  protected:
   ~SurveyTest() override { ::alarm(0); }
@@ -63,8 +46,8 @@ class SurveyTest : public ::testing::Test {
 };
 
 TEST_F(SurveyTest, ShowsEveryThreadInTheFunctionsThatItIsIn) {
-  TargetProcess target(twoThreads);
-  ASSERT_TRUE(target.becomes('S', 2));
+  TargetProcess target("two");
+  ASSERT_TRUE(target.becomes("SS"));
   const ProcessRecord process = look(target);
   EXPECT_EQ(process.id, target.id());
   EXPECT_EQ(process.parent, ::getpid());
@@ -86,20 +69,11 @@ TEST_F(SurveyTest, ShowsEveryThreadInTheFunctionsThatItIsIn) {
 TEST_F(SurveyTest, WhoWasLookedAtIsTracedByNobodyAndRunsOn) {
   int answers[2];
   ASSERT_EQ(::pipe(answers), 0);
-  static int answerTo = -1;
-  answerTo = answers[1];
-  TargetProcess target([] {
-    struct sigaction answering {};
-    answering.sa_handler = [](int) {
-      if (::write(answerTo, "!", 1) < 0) ::_exit(9);
-    };
-    ::sigaction(SIGUSR1, &answering, nullptr);
-    twoThreads();
-  });
-  ASSERT_TRUE(target.becomes('S', 2));
+  TargetProcess target("two", answers[1]);
+  ASSERT_TRUE(target.becomes("SS"));
   EXPECT_FALSE(look(target).threads.empty());
   EXPECT_TRUE(target.isFree());
-  EXPECT_TRUE(target.becomes('S', 2));
+  EXPECT_TRUE(target.becomes("SS"));
   target.signal(SIGUSR1);
   char answer = 0;
   EXPECT_EQ(::read(answers[0], &answer, 1), 1);
@@ -109,23 +83,23 @@ TEST_F(SurveyTest, WhoWasLookedAtIsTracedByNobodyAndRunsOn) {
 }
 
 TEST_F(SurveyTest, AStoppedProcessIsReadAndStaysStopped) {
-  TargetProcess target(twoThreads);
-  ASSERT_TRUE(target.becomes('S', 2));
+  TargetProcess target("two");
+  ASSERT_TRUE(target.becomes("SS"));
   target.signal(SIGSTOP);
-  ASSERT_TRUE(target.becomes('T', 2));
+  ASSERT_TRUE(target.becomes("TT"));
   const ProcessRecord process = look(target);
   ASSERT_EQ(process.threads.size(), 2U);
   EXPECT_EQ(process.threads[1].state, 'T');
   EXPECT_THAT(functionsOf(process.threads[1]), ::testing::Contains("zalSleepsInTheTest"));
   EXPECT_TRUE(target.isFree());
-  EXPECT_TRUE(target.becomes('T', 2));
+  EXPECT_TRUE(target.becomes("TT"));
   target.signal(SIGCONT);
-  EXPECT_TRUE(target.becomes('S', 2));
+  EXPECT_TRUE(target.becomes("SS"));
 }
 
 TEST_F(SurveyTest, AZombieHasEndedAndItsParentStillLearnsHow) {
   TargetProcess target([] { ::_exit(7); });
-  ASSERT_TRUE(target.becomes('Z'));
+  ASSERT_TRUE(target.becomes("Z"));
   const ProcessRecord process = look(target);
   EXPECT_EQ(process.kind, ProcessKind::ended);
   EXPECT_EQ(process.state, 'Z');
@@ -135,11 +109,8 @@ TEST_F(SurveyTest, AZombieHasEndedAndItsParentStillLearnsHow) {
 }
 
 TEST_F(SurveyTest, AProcessWhoseFirstThreadEndedHasTheStacksOfTheOthers) {
-  TargetProcess target([] {
-    std::thread([] { zalSleepsInTheTest(); }).detach();
-    ::syscall(SYS_exit, 0);  // this thread alone
-  });
-  ASSERT_TRUE(eventually([&] { return target.states() == "ZS"; }));
+  TargetProcess target("headless");
+  ASSERT_TRUE(target.becomes("ZS"));
   const ProcessRecord process = look(target);
   ASSERT_EQ(process.threads.size(), 2U);
   EXPECT_EQ(process.threads[0].trouble, "ended");
@@ -154,8 +125,8 @@ TEST_F(SurveyTest, AVanishedProcessIsNone) {
 }
 
 TEST_F(SurveyTest, AThreadThatSleepsUninterruptiblyHoldsNobodyUp) {
-  TargetProcess target(sleepUninterruptibly);
-  ASSERT_TRUE(target.becomes('D'));
+  TargetProcess target("uninterruptible");
+  ASSERT_TRUE(target.becomes("D"));
   const ProcessRecord process = look(target);
   ASSERT_EQ(process.threads.size(), 1U);
   EXPECT_EQ(process.threads[0].state, 'D');
@@ -164,8 +135,8 @@ TEST_F(SurveyTest, AThreadThatSleepsUninterruptiblyHoldsNobodyUp) {
 }
 
 TEST_F(SurveyTest, AThreadThatDoesNotStopInTimeIsLeftAndLetGoWhenItDoes) {
-  TargetProcess target(sleepUninterruptibly);
-  ASSERT_TRUE(target.becomes('D'));
+  TargetProcess target("uninterruptible");
+  ASSERT_TRUE(target.becomes("D"));
   {
     Tracer tracer;
     EXPECT_EQ(tracer.hold(target.id(), std::chrono::steady_clock::now() + 10ms), std::errc::timed_out);
@@ -174,8 +145,8 @@ TEST_F(SurveyTest, AThreadThatDoesNotStopInTimeIsLeftAndLetGoWhenItDoes) {
       const auto process = stackshot::readProcess(id);
       if (process && process->parent == target.id()) ::kill(id, SIGKILL);
     }
-    TargetProcess other(twoThreads);
-    ASSERT_TRUE(other.becomes('S', 2));
+    TargetProcess other("two");
+    ASSERT_TRUE(other.becomes("SS"));
     ASSERT_TRUE(eventually([&] {
       EXPECT_FALSE(tracer.hold(other.id(), std::chrono::steady_clock::now() + 10s));
       return target.states() == "Z" || target.states().empty();
@@ -185,8 +156,8 @@ TEST_F(SurveyTest, AThreadThatDoesNotStopInTimeIsLeftAndLetGoWhenItDoes) {
 }
 
 TEST_F(SurveyTest, WhoIsTracedAlreadyIsSaidToBe) {
-  TargetProcess target(twoThreads);
-  ASSERT_TRUE(target.becomes('S', 2));
+  TargetProcess target("two");
+  ASSERT_TRUE(target.becomes("SS"));
   ASSERT_EQ(::ptrace(PTRACE_SEIZE, target.id(), nullptr, nullptr), 0);
   // Our own tracing forbids it to others; another process looks.
   TargetProcess looking([&] {
@@ -206,19 +177,16 @@ TEST_F(SurveyTest, DoesNotLookAtItself) {
 }
 
 TEST_F(SurveyTest, AnEndlessStackIsCutAndSaysSo) {
-  TargetProcess target([] { zalSleepsDeepInTheTest(400); });
-  ASSERT_TRUE(target.becomes('S'));
+  TargetProcess target("deep");
+  ASSERT_TRUE(target.becomes("S"));
   const ProcessRecord process = look(target);
   EXPECT_EQ(process.threads.at(0).frames.size(), 256U);
   EXPECT_EQ(process.threads[0].trouble, "more frames");
 }
 
 TEST_F(SurveyTest, OfTooManyThreadsTheFirstOnesAreShownAndAllCounted) {
-  TargetProcess target([] {
-    for (int count = 0; count < 4; ++count) std::thread([] { zalSleepsInTheTest(); }).detach();
-    zalSleepsInTheTest();
-  });
-  ASSERT_TRUE(target.becomes('S', 5));
+  TargetProcess target("five");
+  ASSERT_TRUE(target.becomes("SSSSS"));
   Survey few(timeLeft, {.threads = 3});
   const auto process = few.process(target.id());
   ASSERT_TRUE(process);
@@ -242,8 +210,8 @@ TEST_F(SurveyTest, AThreadOfTheKernelShowsTheKernelsSide) {
 }
 
 TEST_F(SurveyTest, ToldToEndItStopsNobodyAnyMoreAndSaysSo) {
-  TargetProcess target(twoThreads);
-  ASSERT_TRUE(target.becomes('S', 2));
+  TargetProcess target("two");
+  ASSERT_TRUE(target.becomes("SS"));
   TargetProcess looking([&] {
     const TimeLeft own(60s);
     Survey ending(own);
@@ -256,34 +224,34 @@ TEST_F(SurveyTest, ToldToEndItStopsNobodyAnyMoreAndSaysSo) {
 }
 
 TEST_F(SurveyTest, ToldToEndWhileItHangsItEndsAndEverybodyIsLetGo) {
-  TargetProcess target(twoThreads);
-  ASSERT_TRUE(target.becomes('S', 2));
+  TargetProcess target("two");
+  ASSERT_TRUE(target.becomes("SS"));
   TargetProcess hanging([&] {
     const TimeLeft own(60s);
     Tracer tracer;
     if (tracer.hold(target.id(), std::chrono::steady_clock::now() + 10s)) ::_exit(9);
-    zalSleepsInTheTest();
+    while (true) ::pause();
   });
-  ASSERT_TRUE(eventually([&] { return target.states() == "tS"; }));
+  ASSERT_TRUE(target.becomes("tS"));
   hanging.signal(SIGTERM);
   const int status = hanging.end();
   EXPECT_TRUE(WIFEXITED(status) && WEXITSTATUS(status) == 1) << status;
-  EXPECT_TRUE(target.becomes('S', 2));
+  EXPECT_TRUE(target.becomes("SS"));
   EXPECT_TRUE(target.isFree());
 }
 
 TEST_F(SurveyTest, KilledWhileItHoldsSomebodyItLetsThemGo) {
-  TargetProcess target(twoThreads);
-  ASSERT_TRUE(target.becomes('S', 2));
+  TargetProcess target("two");
+  ASSERT_TRUE(target.becomes("SS"));
   TargetProcess holding([&] {
     Tracer tracer;
     if (tracer.hold(target.id(), std::chrono::steady_clock::now() + 10s)) ::_exit(9);
-    zalSleepsInTheTest();
+    while (true) ::pause();
   });
-  ASSERT_TRUE(eventually([&] { return target.states() == "tS"; }));
+  ASSERT_TRUE(target.becomes("tS"));
   holding.signal(SIGKILL);
   holding.end();
-  EXPECT_TRUE(target.becomes('S', 2));
+  EXPECT_TRUE(target.becomes("SS"));
   EXPECT_TRUE(target.isFree());
 }
 

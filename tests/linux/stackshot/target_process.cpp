@@ -10,23 +10,16 @@
 #include "platform/linux/stackshot/process_files.h"
 #include "tests/support/child_program.h"
 
-namespace {
-const volatile bool forEver = true;  // the compiler is not to know
-}
-
-extern "C" [[gnu::noinline]] void zalSleepsInTheTest() {
-  while (forEver) ::pause();
-}
-
-extern "C" [[gnu::noinline]] int zalSleepsDeepInTheTest(int depth) {
-  if (depth == 0) {
-    zalSleepsInTheTest();
-    return 0;
-  }
-  return zalSleepsDeepInTheTest(depth - 1) + depth;
-}
-
 namespace zal::testing {
+
+TargetProcess::TargetProcess(const std::string& word, int output)
+    : TargetProcess([&] {
+        if (output >= 0) ::dup2(output, STDOUT_FILENO);
+        ::execl(ZAL_STACKSHOT_TARGET, ZAL_STACKSHOT_TARGET, word.c_str(), nullptr);
+        ::_exit(127);
+      }) {
+  _name = "stackshot_targe";  // the kernel keeps 15 bytes
+}
 
 TargetProcess::TargetProcess(const std::function<void()>& body) : _id(::fork()) {
   if (_id != 0) return;
@@ -43,12 +36,14 @@ TargetProcess::~TargetProcess() {
 
 void TargetProcess::signal(int number) const { ::kill(_id, number); }
 
-bool TargetProcess::becomes(char state, std::size_t threads) const {
-  return eventually([&] { return states() == std::string(threads, state); });
+bool TargetProcess::becomes(const std::string& wanted) const {
+  return eventually([&] { return states() == wanted; });
 }
 
 std::string TargetProcess::states() const {
   std::string result;
+  const auto process = stackshot::readProcess(_id);
+  if (!process || (!_name.empty() && process->name != _name)) return result;
   for (const pid_t thread : stackshot::threadsOf(_id)) result += stackshot::stateOf(_id, thread);
   return result;
 }

@@ -7,10 +7,12 @@
 
 namespace zal::testing {
 
-/// A process of the test's own that somebody looks at. Killed at the end.
+/// A process of the test's own. Killed at the end.
 class TargetProcess {
  public:
-  /// The body runs in the child, which ends when it returns.
+  /// Runs the target program with that word (target/main.cpp).
+  explicit TargetProcess(const std::string& word, int output = -1);
+  /// The body runs in a child of this process, which ends when it returns.
   explicit TargetProcess(const std::function<void()>& body);
   ~TargetProcess();
   TargetProcess(const TargetProcess&) = delete;
@@ -18,9 +20,9 @@ class TargetProcess {
 
   [[nodiscard]] pid_t id() const { return _id; }
   void signal(int number) const;
-  /// Whether so many threads come to have the kernel's state letter, within some seconds.
-  [[nodiscard]] bool becomes(char state, std::size_t threads = 1) const;
-  /// The states of all its threads: "SS".
+  /// Whether its threads come to have these states, within some seconds: "SS".
+  [[nodiscard]] bool becomes(const std::string& states) const;
+  /// The kernel's letters for all its threads; none before the program runs.
   [[nodiscard]] std::string states() const;
   /// Nobody traces any thread of it.
   [[nodiscard]] bool isFree() const;
@@ -29,11 +31,7 @@ class TargetProcess {
 
  private:
   pid_t _id = -1;
+  std::string _name;  ///< as the kernel knows it when it runs; empty: any
 };
 
 }  // namespace zal::testing
-
-/// Functions with a name of their own on a stack: sleeps until the process ends.
-extern "C" void zalSleepsInTheTest();
-/// The same below so many calls of itself.
-extern "C" int zalSleepsDeepInTheTest(int depth);
