@@ -16,17 +16,18 @@ namespace {
 
 /// The file as the process itself sees it, which may live in a container. Never one that could make us
 /// wait for whoever is at its other end.
-int openInside(const std::string& root, const char* path) {
-  Descriptor file(::open((root + path).c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
+int openInside(StackReader::Module& module, const char* path) {
+  Descriptor file(::open((*module.root + path).c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
   struct stat status {};
   if (!file.isOpen() || ::fstat(file.get(), &status) != 0 || !S_ISREG(status.st_mode)) return -1;
+  module.place = {.device = status.st_dev, .file = status.st_ino};
   return file.release();
 }
 
 int findModule(Dwfl_Module* module, void** userData, const char* name, Dwarf_Addr base, char** fileName,
                Elf** elf) {
   if (name[0] == '/' && *userData != nullptr) {
-    const int file = openInside(*static_cast<const std::string*>(*userData), name);
+    const int file = openInside(*static_cast<StackReader::Module*>(*userData), name);
     if (file >= 0) {
       *fileName = ::strdup(name);
       return file;
@@ -40,8 +41,9 @@ const Dwfl_Callbacks kCallbacks = {.find_elf = findModule,
                                    .section_address = nullptr,
                                    .debuginfo_path = nullptr};
 
-int openModule(Dwfl_Module* module, void** userData, const char* /*name*/, Dwarf_Addr /*base*/, void* root) {
-  *userData = root;
+int openModule(Dwfl_Module* module, void** userData, const char* /*name*/, Dwarf_Addr /*base*/,
+               void* reader) {
+  *userData = static_cast<StackReader*>(reader)->addModule();
   GElf_Addr bias = 0;
   ::dwfl_module_getelf(module, &bias);
   return DWARF_CB_OK;
@@ -57,6 +59,15 @@ std::string readable(const char* symbol) {
   const std::unique_ptr<char, void (*)(void*)> name(abi::__cxa_demangle(symbol, nullptr, nullptr, &status),
                                                     std::free);
   return status == 0 && name ? name.get() : symbol;
+}
+
+Symbol lookUp(Dwfl_Module* module, Dwarf_Addr address) {
+  GElf_Off offset = 0;
+  GElf_Sym symbol{};
+  const char* const function =
+      ::dwfl_module_addrinfo(module, address, &offset, &symbol, nullptr, nullptr, nullptr);
+  if (function == nullptr) return {};
+  return {readable(function), offset};
 }
 
 struct Walk {
@@ -90,8 +101,10 @@ int takeFrame(Dwfl_Frame* state, void* argument) {
 
 }  // namespace
 
-StackReader::StackReader(pid_t process, pid_t thread)
-    : _dwfl(::dwfl_begin(&kCallbacks), ::dwfl_end), _root("/proc/" + std::to_string(process) + "/root") {
+StackReader::StackReader(pid_t process, pid_t thread, SymbolCache& symbols)
+    : _symbols(symbols),
+      _root("/proc/" + std::to_string(process) + "/root"),
+      _dwfl(::dwfl_begin(&kCallbacks), ::dwfl_end) {
   if (!_dwfl) {
     _trouble = lastLibraryError();
     return;
@@ -105,10 +118,12 @@ StackReader::StackReader(pid_t process, pid_t thread)
     _trouble = error > 0 ? std::generic_category().message(error) : lastLibraryError();
     return;
   }
-  ::dwfl_getmodules(_dwfl.get(), openModule, &_root, 0);
+  ::dwfl_getmodules(_dwfl.get(), openModule, this, 0);
 }
 
 StackReader::~StackReader() = default;
+
+StackReader::Module* StackReader::addModule() { return &_modules.emplace_back(Module{&_root, {}}); }
 
 StackReader::Frames StackReader::frames(pid_t thread, std::size_t most,
                                         std::chrono::steady_clock::time_point end) {
@@ -125,17 +140,20 @@ void StackReader::name(Frame& frame) {
   Dwfl_Module* const module = ::dwfl_addrmodule(_dwfl.get(), inside);
   if (module == nullptr) return;
   Dwarf_Addr begin = 0;
+  void** userData = nullptr;
   const char* const moduleName =
-      ::dwfl_module_info(module, nullptr, &begin, nullptr, nullptr, nullptr, nullptr, nullptr);
+      ::dwfl_module_info(module, &userData, &begin, nullptr, nullptr, nullptr, nullptr, nullptr);
   if (moduleName != nullptr) frame.module = moduleName;
   frame.offset = frame.address - begin;
-  GElf_Off offset = 0;
-  GElf_Sym symbol{};
-  const char* const function =
-      ::dwfl_module_addrinfo(module, inside, &offset, &symbol, nullptr, nullptr, nullptr);
-  if (function == nullptr) return;
-  frame.function = readable(function);
-  frame.offset = offset + (frame.address - inside);
+  SymbolPlace place;
+  if (*userData != nullptr) place = static_cast<const Module*>(*userData)->place;
+  place.address = inside - begin;
+  const auto known = place.file != 0 ? _symbols.find(place) : _symbols.end();
+  const Symbol symbol = known != _symbols.end() ? known->second : lookUp(module, inside);
+  if (place.file != 0 && known == _symbols.end()) _symbols.emplace(place, symbol);
+  if (symbol.function.empty()) return;
+  frame.function = symbol.function;
+  frame.offset = symbol.offset + (frame.address - inside);
 }
 
 }  // namespace zal::stackshot

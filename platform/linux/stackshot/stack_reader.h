@@ -3,11 +3,13 @@
 #include <sys/types.h>
 
 #include <chrono>
+#include <deque>
 #include <memory>
 #include <string>
 #include <vector>
 
 #include "platform/linux/stackshot/records.h"
+#include "platform/linux/stackshot/symbol_cache.h"
 
 struct Dwfl;
 
@@ -17,8 +19,8 @@ namespace zal::stackshot {
 /// `name`: a thread need be held only for `frames`. One thread.
 class StackReader {
  public:
-  /// Reads what is mapped in the process that the thread is one of.
-  StackReader(pid_t process, pid_t thread);
+  /// Reads what is mapped in the process that the thread is one of. The cache is borrowed.
+  StackReader(pid_t process, pid_t thread, SymbolCache& symbols);
   ~StackReader();
   StackReader(const StackReader&) = delete;
   StackReader& operator=(const StackReader&) = delete;
@@ -35,9 +37,19 @@ class StackReader {
   /// Fills in functions and modules.
   void name(Frame& frame);
 
+  /// What is mapped from one file, as the library's callbacks see it.
+  struct Module {
+    const std::string* root = nullptr;  ///< the process's root directory
+    SymbolPlace place;                  ///< its device and file; none when it was not opened by its name
+  };
+  /// One more; valid as long as this.
+  [[nodiscard]] Module* addModule();
+
  private:
+  SymbolCache& _symbols;
+  const std::string _root;
+  std::deque<Module> _modules;  // a deque: the library refers to its elements
   const std::unique_ptr<Dwfl, void (*)(Dwfl*)> _dwfl;
-  std::string _root;
   std::string _trouble;
 };
 

@@ -83,7 +83,7 @@ void Survey::_readStacks(ProcessRecord& process) {
   };
   if (process.id == ::getpid()) return forAll("the program that writes this");
   if (_timeLeft.isOver()) return forAll(_timeLeft.whyOver());
-  StackReader reader(process.id, firstLiving(process)->id);
+  StackReader reader(process.id, firstLiving(process)->id, _symbols);
   if (!reader.trouble().empty()) return forAll(reader.trouble());
   const Tracer::TimePoint end = _timeLeft.atMost(_limits.process);
   for (ThreadRecord& thread : process.threads) _readStack(reader, process, thread, end);

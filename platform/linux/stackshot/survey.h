@@ -7,6 +7,7 @@
 #include <optional>
 
 #include "platform/linux/stackshot/records.h"
+#include "platform/linux/stackshot/symbol_cache.h"
 #include "platform/linux/stackshot/time_left.h"
 #include "platform/linux/stackshot/tracer.h"
 
@@ -42,6 +43,7 @@ class Survey {
   const TimeLeft& _timeLeft;
   const SurveyLimits _limits;
   Tracer _tracer;
+  SymbolCache _symbols;
   std::chrono::nanoseconds _longestHold{0};
 };
 
