@@ -244,8 +244,8 @@ TEST_F(ModemdumpOnABusTest, ModemManagerThatHangsIsNotWaitedForLongerThanTwoSeco
 }
 
 TEST_F(ModemdumpOnABusTest, ToldToEndInTheMiddleItSetsTheLevelBackAndTakesTheMarkerWithIt) {
+  playModemManager();
   for (const int signal : {SIGTERM, SIGINT, SIGHUP}) {
-    playModemManager();
     std::filesystem::remove(directory / "levels");
     std::filesystem::remove_all(reports);
     const auto program = start({"--listening", "50"});
@@ -258,8 +258,6 @@ TEST_F(ModemdumpOnABusTest, ToldToEndInTheMiddleItSetsTheLevelBackAndTakesTheMar
     EXPECT_THAT(content("-note.txt"),
                 HasSubstr("cut short: told to end by signal " + std::to_string(signal) + "\n"));
     EXPECT_THAT(listTree(reports), ::testing::Not(HasSubstr(".new")));
-    service.reset();
-    ASSERT_TRUE(eventually([&] { return !bus->hasOwner("org.freedesktop.ModemManager1"); }));
   }
 }
 
