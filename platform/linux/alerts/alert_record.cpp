@@ -19,6 +19,7 @@ constexpr std::size_t kLongestKey = 256;
 constexpr std::size_t kMostInformation = 16;
 
 constexpr std::array<std::string_view, 4> kButtons = {"default", "alternate", "other", "cancel"};
+constexpr std::string_view kFromScreen = "screen";
 constexpr std::array<std::string_view, 4> kStates = {"waiting", "answered", "cut off", "timed out"};
 
 template <std::size_t Count>
@@ -165,6 +166,7 @@ std::string alertRecordText(const AlertRecord& record) {
   if (record.answer) {
     toml::table response{{"button", alertButtonName(record.answer->code)}};
     insertText(response, "text", record.answer->text);
+    if (record.answer->isFromScreen) response.insert("from", kFromScreen);
     table.insert("response", std::move(response));
   }
   return tomlText(table);
@@ -187,7 +189,8 @@ std::optional<AlertRecord> parseAlertRecord(std::string_view source) {
   record.state = static_cast<AlertState>(*state);
   if (const toml::table* response = (*table)["response"].as_table()) {
     const auto code = alertButtonCode(text(*response, "button").value_or(""));
-    if (code) record.answer = AlertAnswer{*code, text(*response, "text")};
+    const bool isFromScreen = text(*response, "from") == kFromScreen;
+    if (code) record.answer = AlertAnswer{*code, text(*response, "text"), isFromScreen};
   }
   return record;
 }

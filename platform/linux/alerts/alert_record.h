@@ -5,6 +5,7 @@
 #include <string_view>
 
 #include "platform/clock.h"
+#include "platform/linux/alerts/alert_answer.h"
 #include "platform/linux/process/process_identity.h"
 #include "platform/user_alerts.h"
 
@@ -15,12 +16,6 @@ enum class AlertState {
   answered,
   cutOff,    ///< the agent ended first
   timedOut,  ///< the alert's own time ran out
-};
-
-/// A person's answer.
-struct AlertAnswer {
-  int code = AlertResponse::kDefaultButton;  ///< as in AlertResponse
-  std::optional<std::string> text;           ///< for the alert's text field; nothing: left as it was
 };
 
 /// One alert as its file tells it.

@@ -11,6 +11,7 @@
 #include "platform/linux/files/escaped_text.h"
 #include "platform/linux/files/whole_file.h"
 #include "platform/linux/notifications/notification_file.h"
+#include "platform/linux/wire/utf8.h"
 
 namespace zal {
 namespace {
@@ -19,6 +20,7 @@ constexpr std::size_t kMostDisposable = 50;
 constexpr std::size_t kMostQuestions = 1000;
 constexpr unsigned kMostTakenNumbers = 1000;  // by others, while this agent looks for a free one
 constexpr double kLongestTimeout = 31'536'000;
+constexpr std::size_t kLongestScreenText = kLargestAlertAnswer;
 
 /// The id in a file's name that ends so; nothing when it does not.
 std::optional<std::string_view> idBefore(std::string_view name, std::string_view ending) {
@@ -96,6 +98,7 @@ void RuntimeAlertStore::_accept(UserAlert alert, Listener listener) {
   } else {
     _disposable.insert(*number);
   }
+  _show(waiting.record, *number);
   _prune();
 }
 
@@ -150,6 +153,24 @@ std::optional<unsigned> RuntimeAlertStore::_place(AlertRecord& record) {
 void RuntimeAlertStore::_announce(const AlertRecord& record) {
   _log.notice("Alert " + record.id + ": " + escapedLine(record.alert.title) + ": " +
               escapedLine(record.alert.message) + " (to answer: lirractl alerts answer " + record.id + ")");
+}
+
+void RuntimeAlertStore::_show(const AlertRecord& record, unsigned number) {
+  if (_screen == nullptr) return;
+  _screen->present(record.id, record.alert,
+                   {.onAnswer =
+                        [this, number, alive = std::weak_ptr<bool>(_alive)](const AlertAnswer& answer) {
+                          if (!alive.expired()) _takeScreenAnswer(number, answer);
+                        },
+                    .onDeclined = [] {}});
+}
+
+void RuntimeAlertStore::_takeScreenAnswer(unsigned number, AlertAnswer answer) {
+  const auto waiting = _waiting.find(number);
+  if (waiting == _waiting.end() || !alertHasButton(waiting->second.record.alert, answer.code)) return;
+  answer.isFromScreen = true;
+  if (answer.text) answer.text = replacedUtf8(cutAtCharacter(*answer.text, kLongestScreenText));
+  _finish(number, AlertState::answered, answer);
 }
 
 void RuntimeAlertStore::_armTimeout(unsigned number, Waiting& waiting) {
@@ -223,6 +244,7 @@ void RuntimeAlertStore::_finish(unsigned number, AlertState state, const std::op
   }
   if (!isNotice(waiting.record.alert)) --_questions;
   _disposable.insert(number);
+  if (_screen != nullptr) _screen->withdraw(waiting.record.id);
   _prune();
 }
 
@@ -230,14 +252,21 @@ void RuntimeAlertStore::_prune() {
   while (_disposable.size() > kMostDisposable) {
     const unsigned oldest = *_disposable.begin();
     _disposable.erase(_disposable.begin());
-    _waiting.erase(oldest);
+    _forget(oldest);
     removeFile(_recordPath(oldest));
     removeFile(_answerPath(oldest));
   }
 }
 
+/// An old notice goes from the screen with its record.
+void RuntimeAlertStore::_forget(unsigned number) {
+  const auto notice = _waiting.extract(number);
+  if (_screen != nullptr && !notice.empty()) _screen->withdraw(notice.mapped().record.id);
+}
+
 void RuntimeAlertStore::cutOffWaiting() {
   _mainThread.check("RuntimeAlertStore");
+  if (_screen != nullptr) _screen->agentEnds();
   _watch.reset();
   for (auto& [number, waiting] : std::exchange(_waiting, {})) {
     AlertRecord record = waiting.record;

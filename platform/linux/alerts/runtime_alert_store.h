@@ -14,6 +14,7 @@
 #include "platform/agent_log.h"
 #include "platform/clock.h"
 #include "platform/linux/alerts/alert_record.h"
+#include "platform/linux/alerts/alert_screen.h"
 #include "platform/linux/notifications/directory_watch.h"
 #include "platform/main_thread_check.h"
 #include "platform/run_loop.h"
@@ -36,11 +37,16 @@ class RuntimeAlertStore : public UserAlerts {
   RuntimeAlertStore(const RuntimeAlertStore&) = delete;
   RuntimeAlertStore& operator=(const RuntimeAlertStore&) = delete;
 
+  /// From now on each alert is on that screen too; answered in one place, it disappears from the other.
+  /// The screen outlives this. Main thread.
+  void showOn(AlertScreen& screen) { _screen = &screen; }
+
   /// Texts of more than 4 KiB are cut. While 1000 questions wait, further ones are dropped with a
   /// warning: somebody asks in a circle.
   void post(UserAlert alert, Listener listener) override;
 
-  /// The process is about to end: the records of all that wait say so, and no listener runs any more.
+  /// The process is about to end: the records of all that wait say so, the screen hears of it, and no
+  /// listener runs any more.
   /// Main thread.
   void cutOffWaiting();
 
@@ -56,6 +62,8 @@ class RuntimeAlertStore : public UserAlerts {
   void _lookAtOldRecord(unsigned number);
   std::optional<unsigned> _place(AlertRecord& record);
   void _announce(const AlertRecord& record);
+  void _show(const AlertRecord& record, unsigned number);
+  void _takeScreenAnswer(unsigned number, AlertAnswer answer);
   void _armTimeout(unsigned number, Waiting& waiting);
   void _takeArrival(std::string_view name);
   void _takeAllAnswers();
@@ -63,6 +71,7 @@ class RuntimeAlertStore : public UserAlerts {
   void _refuseAnswer(std::string_view id, const std::string& path, std::string_view reason);
   void _finish(unsigned number, AlertState state, const std::optional<AlertAnswer>& answer);
   void _prune();
+  void _forget(unsigned number);
   void _rewrite(const AlertRecord& record);
   void _complain(const std::string& problem);
   [[nodiscard]] std::string _recordPath(unsigned number) const;
@@ -73,6 +82,7 @@ class RuntimeAlertStore : public UserAlerts {
   const Clock& _clock;
   AgentLog& _log;
   const std::string _directory;
+  AlertScreen* _screen = nullptr;
   ProcessIdentity _agent;
   std::map<unsigned, Waiting> _waiting;
   std::set<unsigned> _disposable;  // over, or notices
