@@ -66,6 +66,11 @@ struct CommandSettings {
   std::map<std::string, std::string> rows;  ///< row id to the command line that replaces it
 };
 
+/// `[alerts]`
+struct AlertSettings {
+  bool screen = true;  ///< shown to the person where there is a screen, besides the runtime directory
+};
+
 /// `[collection]`: single places that a collection takes logs from; an empty one is skipped.
 struct CollectionSettings {
   std::string cloudSyncLog;  ///< file name below DiagnosticReportRoot/DiagnosticLogs
@@ -91,6 +96,7 @@ struct Configuration {
   LogSettings log;
   CommandSettings commands;
   CollectionSettings collection;
+  AlertSettings alerts;
   ArchiveCompression archiveCompression = ArchiveCompression::fast;
   bool internalInstall = false;   ///< `[device] internalInstall`: the maker's own people use it
   std::string systemVersionFile;  ///< property list; empty: os-release and the kernel answer

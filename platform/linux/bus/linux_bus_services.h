@@ -1,5 +1,6 @@
 #pragma once
 
+#include "platform/linux/bus/alerts/notification_screen.h"
 #include "platform/linux/bus/bus_connection.h"
 #include "platform/linux/bus/door/named_door.h"
 #include "platform/linux/bus/network/bus_network_status.h"
@@ -17,6 +18,7 @@ class LinuxBusServices : public BusServices {
   [[nodiscard]] NetworkStatus& networkStatus() override { return _networkStatus; }
   [[nodiscard]] BusNotifications& notifications() override { return _notifications; }
   [[nodiscard]] BusDoor& door() override { return _door; }
+  [[nodiscard]] AlertScreen& alertScreen() override { return _alertScreen; }
 
  private:
   const BusHost _host;
@@ -26,6 +28,7 @@ class LinuxBusServices : public BusServices {
   BusNetworkStatus _networkStatus;
   SignalNotifications _notifications;
   NamedDoor _door;
+  NotificationScreen _alertScreen{_host, _sessionBus};
 };
 
 }  // namespace zal

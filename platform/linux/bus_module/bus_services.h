@@ -2,6 +2,7 @@
 
 #include <memory>
 
+#include "platform/linux/alerts/alert_screen.h"
 #include "platform/linux/bus_module/bus_door.h"
 #include "platform/linux/bus_module/bus_host.h"
 #include "platform/linux/bus_module/bus_notifications.h"
@@ -19,6 +20,7 @@ class BusServices {
   [[nodiscard]] virtual NetworkStatus& networkStatus() = 0;
   [[nodiscard]] virtual BusNotifications& notifications() = 0;
   [[nodiscard]] virtual BusDoor& door() = 0;
+  [[nodiscard]] virtual AlertScreen& alertScreen() = 0;
 };
 
 /// What the module's one symbol, `lirraMakeBusServices`, is. Never empty; throws nothing but

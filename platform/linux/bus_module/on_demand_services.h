@@ -3,6 +3,7 @@
 #include <memory>
 #include <utility>
 
+#include "platform/linux/alerts/alert_screen.h"
 #include "platform/linux/bus_module/bus_module.h"
 #include "platform/network_status.h"
 #include "platform/telephony.h"
@@ -37,6 +38,31 @@ class OnDemandNetworkStatus : public NetworkStatus {
 
  private:
   BusModule& _module;
+};
+
+/// Notifications on the person's screen. What they cannot ask is declined before anything is loaded.
+class OnDemandAlertScreen : public AlertScreen {
+ public:
+  explicit OnDemandAlertScreen(BusModule& module) : _module(module) {}
+  void present(const std::string& id, const UserAlert& alert, AlertHandlers handlers) override {
+    BusServices* const services = alert.textField ? nullptr : _module.services();
+    if (services == nullptr) {
+      handlers.onDeclined();
+      return;
+    }
+    _used = &services->alertScreen();
+    _used->present(id, alert, std::move(handlers));
+  }
+  void withdraw(const std::string& id) override {
+    if (_used != nullptr) _used->withdraw(id);
+  }
+  void agentEnds() override {
+    if (_used != nullptr) _used->agentEnds();
+  }
+
+ private:
+  BusModule& _module;
+  AlertScreen* _used = nullptr;
 };
 
 }  // namespace zal

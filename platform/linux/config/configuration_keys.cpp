@@ -232,6 +232,7 @@ constexpr ConfigurationKey kKeys[] = {
      takePathOf<&Configuration::collection, &CollectionSettings::pairedDeviceDirectory>},
     {"collection", "pushLogDirectory",
      takePathOf<&Configuration::collection, &CollectionSettings::pushLogDirectory>},
+    {"alerts", "screen", takeFlag<&Configuration::alerts, &AlertSettings::screen>},
     {"archive", "compression", takeCompression},
     {"device", "SystemVersionFile", takePath<&Configuration::systemVersionFile>},
     {"device", "internalInstall", takeInternalInstall},

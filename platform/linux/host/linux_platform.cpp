@@ -46,6 +46,11 @@ BasebandDumpStarter::Places basebandPlaces(const Configuration& configuration) {
           .marker = configuration.roots.TemporaryRoot + "/Telvane.dumping"};
 }
 
+/// Of the session that the agent was started from.
+bool hasDisplay(const HostEnvironment& environment) {
+  return !environment.variable("WAYLAND_DISPLAY").empty() || !environment.variable("DISPLAY").empty();
+}
+
 }  // namespace
 
 LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
@@ -90,6 +95,9 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
       _networkStatus(_bus),
       _telephony(_bus),
       _pings(_mainLoop.context(), _loaded.configuration.interfaces, _agentLog),
+      _notificationScreen(_bus),
+      _dialogs(_mainLoop.context(), _agentLog, {.hasDisplay = hasDisplay(environment)}),
+      _screens({&_notificationScreen, &_dialogs}),
       _userAlerts(_mainLoop.context(), _mainLoop, _clock, _agentLog,
                   alertDirectory(_loaded.configuration.roots.RuntimeRoot)),
       _fileCopier(_queues, _agentLog, _loaded.configuration.archiveCompression),
@@ -132,6 +140,7 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
                 .propertyLists = _propertyLists,
                 .dumpProgress = _dumpProgress} {
   std::signal(SIGPIPE, SIG_IGN);
+  if (_loaded.configuration.alerts.screen) _userAlerts.showOn(_screens);
   makeRootParents(_loaded.configuration.roots);
   // Where standard error goes to the journal, each line is there already.
   _agentLog.setLogFacility(speaksToJournal(environment) ? &_logFiles : &_logFacility);

@@ -5,6 +5,7 @@
 
 #include "platform/linux/absent/absent_device_support.h"
 #include "platform/linux/absent/absent_radio_coexistence.h"
+#include "platform/linux/alerts/alert_screens.h"
 #include "platform/linux/alerts/runtime_alert_store.h"
 #include "platform/linux/archive/zip_file_copier.h"
 #include "platform/linux/baseband/baseband_dump_starter.h"
@@ -16,6 +17,7 @@
 #include "platform/linux/config/configuration_loader.h"
 #include "platform/linux/config/toml_preference_store.h"
 #include "platform/linux/crash/linux_crash_reporter.h"
+#include "platform/linux/dialog/dialog_screen.h"
 #include "platform/linux/files/posix_file_placement.h"
 #include "platform/linux/host/loop_host_signals.h"
 #include "platform/linux/host_identity/linux_device_registry.h"
@@ -86,6 +88,9 @@ class LinuxPlatform {
   OnDemandNetworkStatus _networkStatus;
   OnDemandTelephony _telephony;
   LinuxPingFacility _pings;
+  OnDemandAlertScreen _notificationScreen;
+  DialogScreen _dialogs;
+  AlertScreens _screens;
   RuntimeAlertStore _userAlerts;
   ZipFileCopier _fileCopier;
   AbsentDeviceSupport _deviceSupport;

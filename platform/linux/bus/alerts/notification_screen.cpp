@@ -1,0 +1,291 @@
+#include "platform/linux/bus/alerts/notification_screen.h"
+
+#include <utility>
+
+#include "platform/linux/alerts/alert_record.h"
+#include "platform/linux/bus_module/bus_addresses.h"
+
+namespace zal {
+namespace {
+
+using namespace std::chrono_literals;
+
+constexpr const char* kName = "org.freedesktop.Notifications";
+constexpr const char* kPath = "/org/freedesktop/Notifications";
+constexpr const char* kAgentName = "ZalLoggingAgent";
+constexpr std::chrono::milliseconds kCallLimit = 1000ms;
+/// From an alert to its place on the screen, the connection included.
+constexpr std::chrono::milliseconds kPatience = 3000ms;
+constexpr std::uint32_t kClosedByPerson = 2;
+constexpr std::int32_t kNeverExpires = 0;
+
+}  // namespace
+
+NotificationScreen::NotificationScreen(const BusHost& host, BusConnection& sessionBus)
+    : _host(host), _sessionBus(sessionBus) {}
+
+NotificationScreen::~NotificationScreen() = default;
+
+void NotificationScreen::present(const std::string& id, const UserAlert& alert, AlertHandlers handlers) {
+  if (alert.textField || !mayBeThere(_host.sessionBus)) {
+    handlers.onDeclined();
+    return;
+  }
+  const Place place = _shown.insert_or_assign(id, Shown{alert, std::move(handlers)}).first;
+  place->second.patience = ScopedTimer(_host.mainLoop, _host.mainLoop.callAfter(kPatience, [this, id] {
+    const Place late = _shown.find(id);
+    if (late == _shown.end()) return;
+    _complain("it does not answer");
+    _decline(late);
+  }));
+  if (_user == nullptr) {
+    _user = _sessionBus.addUser(
+        {.onConnected = [this](sdbus::IConnection& bus) { _join(bus); }, .onLost = [this] { _leave(); }});
+  } else if (_sessionBus.connection() != nullptr) {
+    _server && _server->abilities ? _notify(place) : _lookForServer();
+  }
+}
+
+void NotificationScreen::_join(sdbus::IConnection& bus) {
+  _bus = &bus;
+  _daemon = sdbus::createProxy(bus, "org.freedesktop.DBus", "/org/freedesktop/DBus");
+  _lookForServer();
+}
+
+void NotificationScreen::_leave() {
+  _loseServer();
+  _ownerWatch.reset();
+  _daemon.reset();
+  _bus = nullptr;
+}
+
+/// Adding a match waits for the bus: only for one that has answered just now.
+void NotificationScreen::_lookForServer() {
+  if (_daemon == nullptr || _shown.empty()) return;
+  if (_ownerWatch != nullptr) {
+    _askOwner();
+    return;
+  }
+  _daemon->callMethodAsync("GetId")
+      .onInterface("org.freedesktop.DBus")
+      .withTimeout(kCallLimit)
+      .uponReplyInvoke([this](const sdbus::Error* error, const std::string& id) {
+        if (error == nullptr) _takeBus(id);
+      });
+}
+
+void NotificationScreen::_takeBus(const std::string& id) {
+  if (_ownerWatch != nullptr) return;
+  _busId = id;
+  const std::string rule = std::string("type='signal',sender='org.freedesktop.DBus',") +
+                           "member='NameOwnerChanged',arg0='" + kName + "'";
+  _ownerWatch = _bus->addMatch(rule, [this](sdbus::Message& message) {
+    std::string name;
+    std::string before;
+    std::string now;
+    message >> name >> before >> now;
+    if (_server && _server->uniqueName == before) _loseServer();
+    if (!now.empty() && !_shown.empty()) _takeServer(now);
+  });
+  _askOwner();
+}
+
+/// Who has the name, not the name itself, is spoken to: a call to a name could start a server.
+void NotificationScreen::_askOwner() {
+  _daemon->callMethodAsync("GetNameOwner")
+      .onInterface("org.freedesktop.DBus")
+      .withTimeout(kCallLimit)
+      .withArguments(std::string(kName))
+      .uponReplyInvoke([this](const sdbus::Error* error, const std::string& owner) {
+        if (error == nullptr) {
+          _takeServer(owner);
+        } else if (error->getName() == "org.freedesktop.DBus.Error.NameHasNoOwner") {
+          _declineAll(true);
+        }
+      });
+}
+
+void NotificationScreen::_takeServer(const std::string& uniqueName) {
+  if (_server && _server->uniqueName == uniqueName) {
+    _server->abilities ? _notifyAll() : _askCapabilities();
+    return;
+  }
+  // After a reconnection it may be the same one, with our alerts on the screen.
+  const std::string before = std::exchange(_numbersOf, _busId + uniqueName);
+  if (_numbersOf != before) {
+    for (auto& [id, shown] : _shown) shown.number = 0;
+  }
+  _server = Server{uniqueName};
+  _server->proxy = sdbus::createProxy(*_bus, uniqueName, kPath);
+  _server->proxy->uponSignal("ActionInvoked")
+      .onInterface(kName)
+      .call([this](std::uint32_t number, const std::string& key) { _takeAction(number, key); });
+  _server->proxy->uponSignal("NotificationClosed")
+      .onInterface(kName)
+      .call([this](std::uint32_t number, std::uint32_t reason) { _takeClosed(number, reason); });
+  _server->proxy->finishRegistration();
+  _askCapabilities();
+}
+
+void NotificationScreen::_askCapabilities() {
+  if (std::exchange(_server->isAsked, true)) return;
+  _server->proxy->callMethodAsync("GetCapabilities")
+      .onInterface(kName)
+      .withTimeout(kCallLimit)
+      .uponReplyInvoke([this](const sdbus::Error* error, const std::vector<std::string>& capabilities) {
+        _takeCapabilities(error, capabilities);
+      });
+}
+
+void NotificationScreen::_takeCapabilities(const sdbus::Error* error,
+                                           const std::vector<std::string>& capabilities) {
+  _server->isAsked = false;
+  const NotificationAbilities abilities = notificationAbilities(capabilities);
+  if (error == nullptr && abilities.hasActions) {
+    _server->abilities = abilities;
+    _notifyAll();
+    return;
+  }
+  if (error != nullptr) _complain(error->getMessage());
+  _declineAll(false);
+}
+
+void NotificationScreen::_loseServer() {
+  _server.reset();
+  for (auto& [id, shown] : _shown) shown.isAsked = false;
+}
+
+void NotificationScreen::_notifyAll() {
+  for (auto place = _shown.begin(); place != _shown.end(); ++place) _notify(place);
+}
+
+void NotificationScreen::_notify(Place place) {
+  Shown& shown = place->second;
+  if (shown.number != 0 || shown.isAsked) return;
+  shown.isAsked = true;
+  const NotificationText text = notificationText(shown.alert, *_server->abilities);
+  const std::map<std::string, sdbus::Variant> hints{{"urgency", sdbus::Variant(text.urgency)}};
+  try {
+    _server->proxy->callMethodAsync("Notify")
+        .onInterface(kName)
+        .withTimeout(kCallLimit)
+        .withArguments(std::string(kAgentName), std::uint32_t{0}, text.icon, text.summary, text.body,
+                       text.actions, hints, kNeverExpires)
+        .uponReplyInvoke([this, id = place->first](const sdbus::Error* error, std::uint32_t number) {
+          _takeNumber(id, error, number);
+        });
+  } catch (const sdbus::Error&) {  // NOLINT(bugprone-empty-catch)
+    // The bus is gone, which its connection is about to notice; or patience ends.
+  }
+}
+
+void NotificationScreen::_takeNumber(const std::string& id, const sdbus::Error* error, std::uint32_t number) {
+  const Place place = _shown.find(id);
+  if (error != nullptr) {
+    _complain(error->getMessage());
+    if (place != _shown.end()) _decline(place);
+    return;
+  }
+  if (place == _shown.end()) {
+    _close(number);
+    return;
+  }
+  _complained = false;
+  Shown& shown = place->second;
+  shown.number = number;
+  shown.isAsked = false;
+  shown.wasShown = true;
+  shown.patience.cancel();
+}
+
+void NotificationScreen::_close(std::uint32_t number) {
+  if (number == 0 || !_server) return;
+  try {
+    _server->proxy->callMethodAsync("CloseNotification")
+        .onInterface(kName)
+        .withTimeout(kCallLimit)
+        .withArguments(number)
+        .uponReplyInvoke([](const sdbus::Error*) {});
+  } catch (const sdbus::Error&) {  // NOLINT(bugprone-empty-catch)
+    // The bus is gone, and what was shown with it.
+  }
+}
+
+NotificationScreen::Place NotificationScreen::_placeOf(std::uint32_t number) {
+  auto place = _shown.begin();
+  while (place != _shown.end() && (number == 0 || place->second.number != number)) ++place;
+  return place;
+}
+
+void NotificationScreen::_takeAction(std::uint32_t number, const std::string& key) {
+  const Place place = _placeOf(number);
+  const auto button = notificationButton(key);
+  if (place == _shown.end() || !button || !alertHasButton(place->second.alert, *button)) return;
+  _answer(place, *button);
+}
+
+void NotificationScreen::_takeClosed(std::uint32_t number, std::uint32_t reason) {
+  const Place place = _placeOf(number);
+  if (place == _shown.end()) return;
+  if (reason == kClosedByPerson) {
+    _answer(place, AlertResponse::kCancelled);
+  } else {
+    _shown.erase(place);
+    _restLater();
+  }
+}
+
+void NotificationScreen::_answer(Place place, int button) {
+  const auto over = _shown.extract(place);
+  _restLater();
+  over.mapped().handlers.onAnswer(AlertAnswer{button});
+}
+
+void NotificationScreen::_decline(Place place) {
+  const auto over = _shown.extract(place);
+  _restLater();
+  over.mapped().handlers.onDeclined();
+}
+
+void NotificationScreen::_declineAll(bool newOnesAlone) {
+  std::vector<std::string> ids;
+  for (const auto& [id, shown] : _shown) {
+    if (shown.number == 0 && !(newOnesAlone && shown.wasShown)) ids.push_back(id);
+  }
+  for (const std::string& id : ids) {
+    const Place place = _shown.find(id);
+    if (place != _shown.end()) _decline(place);
+  }
+}
+
+void NotificationScreen::withdraw(const std::string& id) {
+  const auto gone = _shown.extract(id);
+  if (gone.empty()) return;
+  _close(gone.mapped().number);
+  _restLater();
+}
+
+void NotificationScreen::agentEnds() {
+  for (const auto& [id, shown] : _shown) {
+    if (!isNotice(shown.alert)) _close(shown.number);
+  }
+  _shown.clear();
+}
+
+/// With nothing on the screen nobody wakes us for other programs' notifications. Later: a proxy cannot go
+/// within its own handler.
+void NotificationScreen::_restLater() {
+  if (!_shown.empty()) return;
+  _host.mainLoop.post([this, alive = std::weak_ptr<bool>(_alive)] {
+    if (alive.expired() || !_shown.empty()) return;
+    _server.reset();
+    _ownerWatch.reset();
+  });
+}
+
+void NotificationScreen::_complain(const std::string& reason) {
+  if (std::exchange(_complained, true)) return;
+  _host.log.warning("The notification server cannot show an alert: " + reason);
+}
+
+}  // namespace zal
