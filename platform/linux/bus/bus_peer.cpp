@@ -33,7 +33,7 @@ BusPeer::BusPeer(sdbus::IConnection& bus, std::string owner, std::string title, 
       _deadline(clock.steadyNow() + kTotalLimit) {}
 
 std::optional<ValueMap> BusPeer::properties(const std::string& path, const std::string& interface) {
-  auto answer = call(BusMethod{path, "org.freedesktop.DBus.Properties", "GetAll"}, kAnswerLimit, interface);
+  auto answer = call(PeerMethod{path, "org.freedesktop.DBus.Properties", "GetAll"}, kAnswerLimit, interface);
   if (!answer || answer->empty()) return std::nullopt;
   const auto* const map = answer->front().as<ValueMap>();
   return map != nullptr ? std::optional(*map) : std::nullopt;

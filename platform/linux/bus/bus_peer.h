@@ -14,7 +14,7 @@
 
 namespace zal {
 
-struct BusMethod {
+struct PeerMethod {
   std::string path;
   std::string interface;
   std::string name;
@@ -34,7 +34,7 @@ class BusPeer {
 
   /// The answer's values; nothing when the daemon refused or did not answer.
   template <class... Arguments>
-  std::optional<ValueList> call(const BusMethod& method, std::chrono::milliseconds limit,
+  std::optional<ValueList> call(const PeerMethod& method, std::chrono::milliseconds limit,
                                 const Arguments&... arguments);
   /// All properties of an interface; nothing when it is not there.
   std::optional<ValueMap> properties(const std::string& path, const std::string& interface);
@@ -56,7 +56,7 @@ class BusPeer {
 };
 
 template <class... Arguments>
-std::optional<ValueList> BusPeer::call(const BusMethod& method, std::chrono::milliseconds limit,
+std::optional<ValueList> BusPeer::call(const PeerMethod& method, std::chrono::milliseconds limit,
                                        const Arguments&... arguments) {
   const auto granted = _limitOf(limit);
   if (!granted) return std::nullopt;
