@@ -98,8 +98,9 @@ struct Configuration {
   CollectionSettings collection;
   AlertSettings alerts;
   ArchiveCompression archiveCompression = ArchiveCompression::fast;
-  bool internalInstall = false;   ///< `[device] internalInstall`: the maker's own people use it
-  std::string systemVersionFile;  ///< property list; empty: os-release and the kernel answer
+  bool internalInstall = false;                ///< `[device] internalInstall`: the maker's own people use it
+  std::optional<bool> videoCallsOverCellular;  ///< `[device]`; nothing: the modem's state says it
+  std::string systemVersionFile;               ///< property list; empty: os-release and the kernel answer
   /// For tests only: the agent's six minutes of idling shortened. `[testing] inactivityLimit`, seconds.
   std::optional<std::chrono::milliseconds> inactivityLimit;
   /// For tests only: the wait between a collection's closing stages. `[testing] closingStageDelay`, seconds.

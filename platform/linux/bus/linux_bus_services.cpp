@@ -10,6 +10,7 @@ LinuxBusServices::LinuxBusServices(const BusHost& host)
       _sessionBus(_host, _host.sessionBus, "session bus"),
       _telephony(_host, _systemBus),
       _networkStatus(_host, _systemBus),
+      _cellularData(_host, _systemBus),
       _notifications(mayBeThere(_host.systemBus) ? _systemBus : _sessionBus),
       _door(_host, _host.isSystem ? _systemBus : _sessionBus, _host.isSystem ? "system bus" : "session bus") {
 }

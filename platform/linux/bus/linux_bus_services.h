@@ -3,6 +3,7 @@
 #include "platform/linux/bus/alerts/notification_screen.h"
 #include "platform/linux/bus/bus_connection.h"
 #include "platform/linux/bus/door/named_door.h"
+#include "platform/linux/bus/network/bus_cellular_data.h"
 #include "platform/linux/bus/network/bus_network_status.h"
 #include "platform/linux/bus/notifications/signal_notifications.h"
 #include "platform/linux/bus/telephony/bus_telephony.h"
@@ -19,6 +20,7 @@ class LinuxBusServices : public BusServices {
   [[nodiscard]] BusNotifications& notifications() override { return _notifications; }
   [[nodiscard]] BusDoor& door() override { return _door; }
   [[nodiscard]] AlertScreen& alertScreen() override { return _alertScreen; }
+  [[nodiscard]] CellularDataStatus& cellularData() override { return _cellularData; }
 
  private:
   const BusHost _host;
@@ -26,6 +28,7 @@ class LinuxBusServices : public BusServices {
   BusConnection _sessionBus;
   BusTelephony _telephony;
   BusNetworkStatus _networkStatus;
+  BusCellularData _cellularData;
   SignalNotifications _notifications;
   NamedDoor _door;
   NotificationScreen _alertScreen{_host, _sessionBus};

@@ -6,6 +6,7 @@
 #include "platform/linux/bus_module/bus_door.h"
 #include "platform/linux/bus_module/bus_host.h"
 #include "platform/linux/bus_module/bus_notifications.h"
+#include "platform/linux/bus_module/cellular_data_status.h"
 #include "platform/network_status.h"
 #include "platform/telephony.h"
 
@@ -21,6 +22,7 @@ class BusServices {
   [[nodiscard]] virtual BusNotifications& notifications() = 0;
   [[nodiscard]] virtual BusDoor& door() = 0;
   [[nodiscard]] virtual AlertScreen& alertScreen() = 0;
+  [[nodiscard]] virtual CellularDataStatus& cellularData() = 0;
 };
 
 /// What the module's one symbol, `lirraMakeBusServices`, is. Never empty; throws nothing but

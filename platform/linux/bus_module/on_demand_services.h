@@ -65,4 +65,16 @@ class OnDemandAlertScreen : public AlertScreen {
   AlertScreen* _used = nullptr;
 };
 
+class OnDemandCellularData : public CellularDataStatus {
+ public:
+  explicit OnDemandCellularData(BusModule& module) : _module(module) {}
+  void ask(Handler handler) override {
+    BusServices* const services = _module.services();
+    services != nullptr ? services->cellularData().ask(std::move(handler)) : handler(CellularData::noService);
+  }
+
+ private:
+  BusModule& _module;
+};
+
 }  // namespace zal

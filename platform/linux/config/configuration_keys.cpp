@@ -119,16 +119,17 @@ std::string takeCompression(const toml::node& value, const std::string& /*home*/
                                       {"fast", ArchiveCompression::fast}, configuration.archiveCompression);
 }
 
-std::string takeFlagInto(const toml::node& value, bool& target) {
+template <class Target>
+std::string takeFlagInto(const toml::node& value, Target& target) {
   const auto flag = value.value_exact<bool>();
   if (!flag) return "wants true or false";
   target = *flag;
   return {};
 }
 
-std::string takeInternalInstall(const toml::node& value, const std::string& /*home*/,
-                                Configuration& configuration) {
-  return takeFlagInto(value, configuration.internalInstall);
+template <auto Field>
+std::string takeFlagOf(const toml::node& value, const std::string& /*home*/, Configuration& configuration) {
+  return takeFlagInto(value, configuration.*Field);
 }
 
 template <auto Section, auto Field>
@@ -235,7 +236,8 @@ constexpr ConfigurationKey kKeys[] = {
     {"alerts", "screen", takeFlag<&Configuration::alerts, &AlertSettings::screen>},
     {"archive", "compression", takeCompression},
     {"device", "SystemVersionFile", takePath<&Configuration::systemVersionFile>},
-    {"device", "internalInstall", takeInternalInstall},
+    {"device", "internalInstall", takeFlagOf<&Configuration::internalInstall>},
+    {"device", "videoCallsOverCellular", takeFlagOf<&Configuration::videoCallsOverCellular>},
     {"testing", "inactivityLimit", takeDuration<&Configuration::inactivityLimit>},
     {"testing", "closingStageDelay", takeDuration<&Configuration::closingStageDelay>},
 };

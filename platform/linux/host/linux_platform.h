@@ -3,7 +3,6 @@
 #include <optional>
 #include <string>
 
-#include "platform/linux/absent/absent_device_support.h"
 #include "platform/linux/absent/absent_radio_coexistence.h"
 #include "platform/linux/alerts/alert_screens.h"
 #include "platform/linux/alerts/runtime_alert_store.h"
@@ -17,6 +16,7 @@
 #include "platform/linux/config/configuration_loader.h"
 #include "platform/linux/config/toml_preference_store.h"
 #include "platform/linux/crash/linux_crash_reporter.h"
+#include "platform/linux/device_support/linux_device_support.h"
 #include "platform/linux/dialog/dialog_screen.h"
 #include "platform/linux/files/posix_file_placement.h"
 #include "platform/linux/host/loop_host_signals.h"
@@ -86,6 +86,7 @@ class LinuxPlatform {
   IpcWithBus _ipcWithBus;
   TwoRoadNotifications _systemNotifications;
   OnDemandNetworkStatus _networkStatus;
+  OnDemandCellularData _cellularData;
   OnDemandTelephony _telephony;
   LinuxPingFacility _pings;
   OnDemandAlertScreen _notificationScreen;
@@ -93,7 +94,7 @@ class LinuxPlatform {
   AlertScreens _screens;
   RuntimeAlertStore _userAlerts;
   ZipFileCopier _fileCopier;
-  AbsentDeviceSupport _deviceSupport;
+  LinuxDeviceSupport _deviceSupport;
   LinuxWifiDiagnostics _wifiDiagnostics;
   AbsentRadioCoexistence _radioCoexistence;
   PugixmlPropertyListWriter _propertyLists;

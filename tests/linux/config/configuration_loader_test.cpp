@@ -123,6 +123,7 @@ compression = "small"
 [device]
 SystemVersionFile = "/r/version.plist"
 internalInstall = true
+videoCallsOverCellular = false
 [testing]
 inactivityLimit = 1.5
 closingStageDelay = 0.25
@@ -176,6 +177,7 @@ closingStageDelay = 0.25
   EXPECT_EQ(c.collection.pushLogDirectory, "/r/push");
   EXPECT_EQ(c.archiveCompression, ArchiveCompression::small);
   EXPECT_TRUE(c.internalInstall);
+  EXPECT_EQ(c.videoCallsOverCellular, false);
   EXPECT_EQ(c.systemVersionFile, "/r/version.plist");
   EXPECT_EQ(c.inactivityLimit, std::chrono::milliseconds{1500});
   EXPECT_EQ(c.closingStageDelay, std::chrono::milliseconds{250});
@@ -196,6 +198,7 @@ TEST_F(ConfigurationLoaderTest, WithoutAWordTheAgentTalksToNobodyAndRunsWhatLinu
   EXPECT_EQ(c.collection.cloudSyncLog, "");
   EXPECT_EQ(c.archiveCompression, Configuration().archiveCompression);
   EXPECT_FALSE(c.internalInstall);
+  EXPECT_EQ(c.videoCallsOverCellular, std::nullopt);
 }
 
 TEST_F(ConfigurationLoaderTest, TextsThatCommandLinesTakeMayBeNothingButNames) {
@@ -249,6 +252,7 @@ surprise = "x"
 compression = "tiny"
 [device]
 internalInstall = "yes"
+videoCallsOverCellular = 1
 )");
   EXPECT_THAT(loaded.warnings,
               ElementsAre(file + ":2: commands.profile wants \"linux\" or \"literal\"",
@@ -259,7 +263,8 @@ internalInstall = "yes"
                           file + ":8: collection.pairedDeviceLog1 must be an absolute path, not \"x\"",
                           file + ":9: unknown key collection.surprise",
                           file + ":11: archive.compression wants \"small\" or \"fast\"",
-                          file + ":13: device.internalInstall wants true or false"));
+                          file + ":13: device.internalInstall wants true or false",
+                          file + ":14: device.videoCallsOverCellular wants true or false"));
   EXPECT_THAT(loaded.configuration.commands.rows, IsEmpty());
 }
 
