@@ -14,8 +14,10 @@ constexpr std::size_t kLongestTitle = 80;
 constexpr std::size_t kLongestButton = 40;
 constexpr std::size_t kLongestMessage = 600;
 constexpr std::size_t kLongestInitialValue = 4096;
-// A telephone's width; a dialog that is wider than the screen has its buttons outside.
-constexpr std::size_t kLineWidth = 44;
+// A telephone's width; a dialog that is wider than the screen has its buttons outside. Where there is no
+// text to type, a picture stands beside the message.
+constexpr std::size_t kPromptWidth = 44;
+constexpr std::size_t kMessageWidth = 36;
 constexpr std::size_t kMostLines = 12;
 
 // Statuses that zenity is told to end with: its own take Cancel, Escape and no display for one.
@@ -39,7 +41,7 @@ std::string message(const UserAlert& alert) {
   if (alert.textField && !alert.textField->title.empty()) {
     text += "\n" + screenLine(alert.textField->title, kLongestTitle);
   }
-  return foldedText(text, kLineWidth, kMostLines);
+  return foldedText(text, alert.textField ? kPromptWidth : kMessageWidth, kMostLines);
 }
 
 /// Each of the characters twice, which is how they are meant as they are.
@@ -76,7 +78,6 @@ std::vector<std::string> zenityMessage(const UserAlert& alert) {
   addLabel(words, "--ok-label=", asks ? mnemonic(alert.defaultButton) : button(alert.defaultButton));
   if (asks) addLabel(words, "--cancel-label=", mnemonic(alert.alternateButton.value_or("")));
   if (alert.otherButton) addLabel(words, "--extra-button=", mnemonic(*alert.otherButton));
-  words.emplace_back("--width=360");
   return words;
 }
 

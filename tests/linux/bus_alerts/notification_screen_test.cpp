@@ -85,6 +85,13 @@ class NotificationScreenTest : public BusFixture {
     }
     return result;
   }
+  std::unique_ptr<NotificationScreen> makeScreen(NotificationScreen::Limits limits) {
+    return std::make_unique<NotificationScreen>(host, connection, limits);
+  }
+  /// For servers and buses that do not answer.
+  void useShortLimits() {
+    screen = makeScreen({.call = std::chrono::milliseconds(200), .patience = std::chrono::milliseconds(400)});
+  }
   void runUntilCalls(std::size_t count) {
     ASSERT_TRUE(runUntil([&] { return calls().size() >= count; }));
     // The answer to the last one.
@@ -96,7 +103,7 @@ class NotificationScreenTest : public BusFixture {
 
   TemporaryDirectory directory;
   BusConnection connection{host, host.sessionBus, "session bus"};
-  std::unique_ptr<NotificationScreen> screen = std::make_unique<NotificationScreen>(host, connection);
+  std::unique_ptr<NotificationScreen> screen = makeScreen({});
   std::optional<MockedService> server;
   std::vector<std::string> told;
 };
@@ -220,6 +227,7 @@ TEST_F(NotificationScreenTest, WithoutABusItIsDeclinedAtOnce) {
 
 TEST_F(NotificationScreenTest, AServerThatHangsHoldsUpNobodyAndItIsSaidOnce) {
   startServer();
+  useShortLimits();
   server->hang();
   const SteadyTime before = clock.steadyNow();
   present("7", question());
@@ -229,6 +237,7 @@ TEST_F(NotificationScreenTest, AServerThatHangsHoldsUpNobodyAndItIsSaidOnce) {
   EXPECT_THAT(told, ElementsAre("7 declined", "8 declined"));
   EXPECT_THAT(log.lines, ElementsAre(StartsWith("warning: The notification server cannot show an alert: ")));
   server->goOn();
+  screen = makeScreen({});
   present("9", question());
   runUntilCalls(1);
   press(1, "default");
@@ -238,6 +247,7 @@ TEST_F(NotificationScreenTest, AServerThatHangsHoldsUpNobodyAndItIsSaidOnce) {
 
 TEST_F(NotificationScreenTest, ABusThatHangsHoldsUpNobody) {
   startServer();
+  useShortLimits();
   present("7", question());
   runUntilCalls(1);
   bus.hang();

@@ -54,10 +54,10 @@ TEST(DialogArgumentsTest, AnAlertWithoutATextFieldIsAQuestionOrANotice) {
   EXPECT_THAT(zenityWords(question()),
               ElementsAre("--question", "--title=Vistel Logging", "--no-markup",
                           "--text=Please describe the problem briefly", "--ok-label=OK",
-                          "--cancel-label=Cancel", "--extra-button=Later__on", "--width=360"));
+                          "--cancel-label=Cancel", "--extra-button=Later__on"));
   EXPECT_THAT(zenityWords(notice()),
               ElementsAre("--info", "--title=Vistel Logging", "--no-markup",
-                          "--text=Please describe the problem briefly", "--ok-label=OK", "--width=360"));
+                          "--text=Please describe the problem briefly", "--ok-label=OK"));
 }
 
 TEST(DialogArgumentsTest, HostileTextsAreNoOptionsNoMarkupAndNoEscapes) {

@@ -7,11 +7,14 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <chrono>
 #include <csignal>
+#include <cstdlib>
 
 #include "platform/linux/alerts/alert_file.h"
 #include "platform/linux/progress/progress_file.h"
 #include "tests/linux/log/listening_journal.h"
+#include "tests/support/child_program.h"
 #include "tests/support/temporary_directory.h"
 
 namespace zal {
@@ -133,6 +136,58 @@ TEST_F(LinuxPlatformTest, TheEndOfTheProcessIsInTheRecordsOfWaitingAlerts) {
   ::waitpid(agent, &status, 0);
   EXPECT_EQ(status, 0);
   EXPECT_THAT(readFile(home / "run/lirra/alerts/1.toml"), ::testing::HasSubstr("state = \"cut off\"\n"));
+}
+
+/// With a display, and a program for dialogs that waits until it is ended.
+class LinuxPlatformDialogTest : public LinuxPlatformTest {
+ protected:
+  LinuxPlatformDialogTest() {
+    const std::string program = home / "bin/zenity";
+    writeFile(program, "#!/bin/sh\necho $$ > '" + dialog + "'\nexec sleep 1000\n");
+    ::chmod(program.c_str(), 0755);
+    ::setenv("PATH", ((home / "bin:") + path).c_str(), 1);
+  }
+  ~LinuxPlatformDialogTest() override { ::setenv("PATH", path.c_str(), 1); }
+  /// Posts a question, and has the agent end when the condition holds.
+  void runAgent(const std::function<bool()>& isDone) const {
+    const pid_t agent = ::fork();
+    if (agent == 0) {
+      HostEnvironment withDisplay = environment();
+      withDisplay.variables["DISPLAY"] = ":7";
+      LinuxPlatform platform(withDisplay);
+      Platform& services = platform.services();
+      UserAlert question;
+      question.textField = UserAlert::TextField{};
+      services.userAlerts.post(question, nullptr);
+      services.mainLoop.callEvery(std::chrono::milliseconds(1), [&] {
+        if (isDone()) services.processExit.exit(0);
+      });
+      services.mainLoop.run();
+      ::_exit(1);
+    }
+    ::waitpid(agent, nullptr, 0);
+  }
+
+  const std::string path = ::getenv("PATH");
+  const std::string dialog = home / "dialog";
+};
+
+TEST_F(LinuxPlatformDialogTest, ADialogGoesWithTheAgent) {
+  runAgent([this] { return readFile(dialog).ends_with('\n'); });
+  const pid_t process = std::stoi(readFile(dialog));
+  // The one who inherits it buries it, sooner or later.
+  EXPECT_TRUE(testing::eventually([&] {
+    const std::string status = readFile("/proc/" + std::to_string(process) + "/status");
+    return status.empty() || status.find("State:\tZ") != std::string::npos;
+  }));
+}
+
+TEST_F(LinuxPlatformDialogTest, WithoutAScreenByConfigurationNoDialogIsOpened) {
+  configure("[alerts]\nscreen = false\n");
+  int turns = 0;
+  runAgent([&] { return ++turns > 20; });
+  EXPECT_EQ(readFile(dialog), "");
+  EXPECT_TRUE(std::filesystem::exists(home / "run/lirra/alerts/1.toml"));
 }
 
 TEST_F(LinuxPlatformTest, ABrokenPipeEndsNothing) {

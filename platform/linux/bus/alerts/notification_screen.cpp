@@ -8,21 +8,16 @@
 namespace zal {
 namespace {
 
-using namespace std::chrono_literals;
-
 constexpr const char* kName = "org.freedesktop.Notifications";
 constexpr const char* kPath = "/org/freedesktop/Notifications";
 constexpr const char* kAgentName = "ZalLoggingAgent";
-constexpr std::chrono::milliseconds kCallLimit = 1000ms;
-/// From an alert to its place on the screen, the connection included.
-constexpr std::chrono::milliseconds kPatience = 3000ms;
 constexpr std::uint32_t kClosedByPerson = 2;
 constexpr std::int32_t kNeverExpires = 0;
 
 }  // namespace
 
-NotificationScreen::NotificationScreen(const BusHost& host, BusConnection& sessionBus)
-    : _host(host), _sessionBus(sessionBus) {}
+NotificationScreen::NotificationScreen(const BusHost& host, BusConnection& sessionBus, Limits limits)
+    : _host(host), _sessionBus(sessionBus), _limits(limits) {}
 
 NotificationScreen::~NotificationScreen() = default;
 
@@ -32,7 +27,7 @@ void NotificationScreen::present(const std::string& id, const UserAlert& alert, 
     return;
   }
   const Place place = _shown.insert_or_assign(id, Shown{alert, std::move(handlers)}).first;
-  place->second.patience = ScopedTimer(_host.mainLoop, _host.mainLoop.callAfter(kPatience, [this, id] {
+  place->second.patience = ScopedTimer(_host.mainLoop, _host.mainLoop.callAfter(_limits.patience, [this, id] {
     const Place late = _shown.find(id);
     if (late == _shown.end()) return;
     _complain("it does not answer");
@@ -68,7 +63,7 @@ void NotificationScreen::_lookForServer() {
   }
   _daemon->callMethodAsync("GetId")
       .onInterface("org.freedesktop.DBus")
-      .withTimeout(kCallLimit)
+      .withTimeout(_limits.call)
       .uponReplyInvoke([this](const sdbus::Error* error, const std::string& id) {
         if (error == nullptr) _takeBus(id);
       });
@@ -94,7 +89,7 @@ void NotificationScreen::_takeBus(const std::string& id) {
 void NotificationScreen::_askOwner() {
   _daemon->callMethodAsync("GetNameOwner")
       .onInterface("org.freedesktop.DBus")
-      .withTimeout(kCallLimit)
+      .withTimeout(_limits.call)
       .withArguments(std::string(kName))
       .uponReplyInvoke([this](const sdbus::Error* error, const std::string& owner) {
         if (error == nullptr) {
@@ -131,7 +126,7 @@ void NotificationScreen::_askCapabilities() {
   if (std::exchange(_server->isAsked, true)) return;
   _server->proxy->callMethodAsync("GetCapabilities")
       .onInterface(kName)
-      .withTimeout(kCallLimit)
+      .withTimeout(_limits.call)
       .uponReplyInvoke([this](const sdbus::Error* error, const std::vector<std::string>& capabilities) {
         _takeCapabilities(error, capabilities);
       });
@@ -168,7 +163,7 @@ void NotificationScreen::_notify(Place place) {
   try {
     _server->proxy->callMethodAsync("Notify")
         .onInterface(kName)
-        .withTimeout(kCallLimit)
+        .withTimeout(_limits.call)
         .withArguments(std::string(kAgentName), std::uint32_t{0}, text.icon, text.summary, text.body,
                        text.actions, hints, kNeverExpires)
         .uponReplyInvoke([this, id = place->first](const sdbus::Error* error, std::uint32_t number) {
@@ -203,7 +198,7 @@ void NotificationScreen::_close(std::uint32_t number) {
   try {
     _server->proxy->callMethodAsync("CloseNotification")
         .onInterface(kName)
-        .withTimeout(kCallLimit)
+        .withTimeout(_limits.call)
         .withArguments(number)
         .uponReplyInvoke([](const sdbus::Error*) {});
   } catch (const sdbus::Error&) {  // NOLINT(bugprone-empty-catch)

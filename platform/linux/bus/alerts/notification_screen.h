@@ -1,5 +1,6 @@
 #pragma once
 
+#include <chrono>
 #include <cstdint>
 #include <map>
 #include <memory>
@@ -21,7 +22,14 @@ namespace zal {
 /// person closes is cancelled; one that the server lets go (it expired) waits on unseen. Main thread only.
 class NotificationScreen : public AlertScreen {
  public:
-  NotificationScreen(const BusHost& host, BusConnection& sessionBus);
+  struct Limits {
+    std::chrono::milliseconds call{1000};  ///< one answer of the server or the bus
+    std::chrono::milliseconds patience{
+        3000};  ///< from an alert to its place on the screen, connecting included
+  };
+  NotificationScreen(const BusHost& host, BusConnection& sessionBus, Limits limits);
+  NotificationScreen(const BusHost& host, BusConnection& sessionBus)
+      : NotificationScreen(host, sessionBus, Limits()) {}
   ~NotificationScreen() override;
   NotificationScreen(const NotificationScreen&) = delete;
   NotificationScreen& operator=(const NotificationScreen&) = delete;
@@ -70,6 +78,7 @@ class NotificationScreen : public AlertScreen {
 
   const BusHost& _host;
   BusConnection& _sessionBus;
+  const Limits _limits;
   std::map<std::string, Shown> _shown;
   std::unique_ptr<sdbus::IProxy> _daemon;
   sdbus::IConnection* _bus = nullptr;
