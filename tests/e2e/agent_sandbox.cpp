@@ -66,7 +66,7 @@ AgentSandbox::AgentSandbox() : stateRoot(_directory / "state"), bus("unix:path="
   }
   writeFile(_directory / "config/version.plist", kSystemVersion);
   const std::filesystem::path programs = std::filesystem::path(ZAL_AGENT_PATH).parent_path();
-  for (const char* name : {"tessel", "secretlist"}) {
+  for (const char* name : {"tessel", "secretlist", "lirra-modemdump", "lirra-wifidump"}) {
     std::filesystem::create_symlink(programs / name, _directory / ("tools/" + std::string(name)));
   }
   writeStackshotTool(_directory / "tools/lirra-stackshot", programs / "lirra-stackshot");
