@@ -9,7 +9,7 @@ namespace zal {
 namespace {
 
 /// Of each of the three.
-constexpr std::chrono::milliseconds kQuestionLimit{200};
+constexpr std::chrono::milliseconds kOfonoSampleLimit{200};
 
 }  // namespace
 
@@ -52,7 +52,7 @@ void OfonoSignalSampler::_ask(Question question) {
 void OfonoSignalSampler::_askForOwner() {
   _bus->callMethodAsync("GetNameOwner")
       .onInterface("org.freedesktop.DBus")
-      .withTimeout(kQuestionLimit)
+      .withTimeout(kOfonoSampleLimit)
       .withArguments(std::string(kOfonoService))
       .uponReplyInvoke([this](const sdbus::Error* error, const std::string& owner) {
         if (error != nullptr) return _answer(std::nullopt);
@@ -65,7 +65,7 @@ void OfonoSignalSampler::_askForModems(const std::string& owner) {
   _manager = sdbus::createProxy(*_connection, owner, "/");
   _manager->callMethodAsync("GetModems")
       .onInterface(ofonoInterface("Manager"))
-      .withTimeout(kQuestionLimit)
+      .withTimeout(kOfonoSampleLimit)
       .uponReplyInvoke([this, owner](const sdbus::Error* error, const OfonoModems& modems) {
         const auto* const modem = error == nullptr ? modemInUse(modems) : nullptr;
         if (modem == nullptr) return _answer(std::nullopt);
@@ -77,7 +77,7 @@ void OfonoSignalSampler::_askForNetwork(const std::string& owner, const std::str
   _network = sdbus::createProxy(*_connection, owner, modem);
   _network->callMethodAsync("GetProperties")
       .onInterface(ofonoInterface("NetworkRegistration"))
-      .withTimeout(kQuestionLimit)
+      .withTimeout(kOfonoSampleLimit)
       .uponReplyInvoke([this](const sdbus::Error* error, const OfonoProperties& network) {
         _answer(error == nullptr ? ofonoSignal(network) : std::nullopt);
       });
