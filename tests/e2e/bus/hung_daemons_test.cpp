@@ -1,0 +1,118 @@
+#include <regex>
+
+#include "tests/e2e/bus/bus_e2e_fixture.h"
+#include "tests/e2e/bus/latency_watch.h"
+#include "tests/e2e/bus/quality_log.h"
+
+namespace zal::testing {
+namespace {
+
+using namespace std::chrono_literals;
+
+constexpr auto kLongestWait = 100ms;
+
+class HungDaemonsE2eTest : public BusE2eFixture {
+ protected:
+  std::size_t linesWith(const std::string& words) const {
+    const auto lines = linesOf(output());
+    return static_cast<std::size_t>(std::count_if(lines.begin(), lines.end(), [&](const std::string& line) {
+      return line.find(words) != std::string::npos;
+    }));
+  }
+  void startAll() {
+    startModem({"csq=20"});
+    startWifi(kSignal);
+  }
+  /// Two more samples: at least one began after the call.
+  void waitForBeats() { waitForPolls(wifi->polls() + 2); }
+
+  /// Runs the step, whose waits are the agent's own only as far as every run of it has them: a busy machine
+  /// holds up a client now and then, a main thread that waits for a daemon does so each time.
+  void expectPrompt(LatencyWatch& watch, const std::string& name, const std::function<void()>& step) {
+    std::chrono::milliseconds longest{};
+    for (int run = 0; run < 3; ++run) {
+      (void)watch.takeLongest();
+      const std::size_t before = watch.answers();
+      step();
+      longest = watch.takeLongest();
+      EXPECT_GT(watch.answers(), before) << name;
+      if (longest <= kLongestWait || HasFatalFailure()) break;
+    }
+    RecordProperty(name + ", longest wait in ms", static_cast<int>(longest.count()));
+    EXPECT_LE(longest, kLongestWait) << name;
+  }
+
+  static constexpr PlayedWifi::Signal kSignal{.strength = 70, .rssi = -58, .rate = 433};
+};
+
+TEST_F(HungDaemonsE2eTest, ADaemonThatHangsAndABusThatDiesHoldUpNobodyAndLeaveASessionWhole) {
+  startAll();
+  start();
+  lirra::Client client = makeClient();
+  client.beginSession("Vistel");
+  client.checkpoint("Vistel", "Connected", 1714651381.5);
+  ASSERT_EQ(client.flush(60'000), LIRRA_OK);
+  waitForPolls(1);
+  LatencyWatch watch(sandbox.socketPath());
+
+  std::size_t hangs = 0;
+  expectPrompt(watch, "a modem daemon that hangs", [&] {
+    ++hangs;
+    modemManager->hang();
+    waitForBeats();
+    modemManager->goOn();
+    ASSERT_TRUE(
+        eventually([&] { return linesWith("The cellular signal is sampled again") == hangs; }, kDeadline));
+  });
+  client.checkpoint("Vistel", "After the daemon hung", 1714651382.5);
+
+  std::size_t deaths = 0;
+  expectPrompt(watch, "a bus that dies", [&] {
+    ++deaths;
+    bus->kill();
+    ASSERT_TRUE(eventually([&] { return linesWith("The system bus is lost: ") == deaths; }, kDeadline));
+    modemManager.reset();
+    wifi.reset();
+    bus->start();
+    startAll();
+    ASSERT_TRUE(eventually([&] { return linesWith("The system bus is back") == deaths; }, kDeadline));
+    modem->set({"csq=8"});
+    ASSERT_TRUE(eventually([&] { return percentage() == 40; }, kDeadline));
+    waitForBeats();
+  });
+  client.checkpoint("Vistel", "After the bus died", 1714651383.5);
+  client.endSession("Vistel");
+  ASSERT_EQ(client.flush(60'000), LIRRA_OK);
+  ASSERT_TRUE(eventually([&] { return !sandbox.sessionFile("Vistel", "Quality Log").empty(); }, kDeadline));
+  // One barrier more: the files of an end are written in one turn of the agent.
+  ASSERT_EQ(client.flush(60'000), LIRRA_OK);
+
+  for (const char* file : {"Log", "Verbose Log"}) {
+    std::vector<std::string> told;
+    for (const std::string& line : linesOf(withoutTimes(sandbox.sessionFile("Vistel", file)))) {
+      if (line.starts_with("[Sender: caller]")) told.push_back(line);
+    }
+    EXPECT_EQ(told,
+              (std::vector<std::string>{
+                  "[Sender: caller] Connected   [TIME]", "[Sender: caller] After the daemon hung   [TIME]",
+                  "[Sender: caller] After the bus died   [TIME]", "[Sender: caller] Begin Session  [TIME]",
+                  "[Sender: caller] End Session  [TIME]"}))
+        << file;
+  }
+  const QualityLog log = readQualityLog(sandbox.sessionFile("Vistel", "Quality Log"));
+  for (const auto& [metric, samples] : log.samples) {
+    ASSERT_TRUE(log.statistics.contains(metric)) << metric;
+    expectSame(log.statistics.at(metric), statisticsOf(samples), metric);
+  }
+  // The last one is of the daemons that came back.
+  ASSERT_TRUE(log.samples.contains("cell-signal-percentage"));
+  EXPECT_EQ(log.samples.at("cell-signal-percentage").back(), 40);
+  EXPECT_EQ(log.samples.at("wifi-signal-strength").back(), kSignal.strength);
+  // One line for each, not one a beat.
+  EXPECT_EQ(linesWith("The system bus is lost"), deaths);
+  EXPECT_EQ(linesWith("Without the cellular signal: "), hangs) << output();
+  EXPECT_EQ(agent->terminate(), 0);
+}
+
+}  // namespace
+}  // namespace zal::testing
