@@ -22,7 +22,7 @@ std::unique_ptr<sdbus::IProxy> daemonOf(sdbus::IConnection& bus) {
   return sdbus::createProxy(bus, "org.freedesktop.DBus", "/org/freedesktop/DBus");
 }
 /// For what the library asks the bus itself, and waits for.
-constexpr std::chrono::milliseconds kQuestionLimit = 200ms;
+constexpr std::chrono::milliseconds kLibraryCallLimit = 200ms;
 
 }  // namespace
 
@@ -104,7 +104,7 @@ void BusConnection::_connect() {
         std::string trouble;
         try {
           link->bus = sdbus::createSessionBusConnectionWithAddress(address);
-          link->bus->setMethodCallTimeout(kQuestionLimit);
+          link->bus->setMethodCallTimeout(kLibraryCallLimit);
           link->match(signals);
         } catch (const sdbus::Error& error) {
           trouble = error.getMessage();

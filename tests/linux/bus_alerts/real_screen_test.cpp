@@ -9,6 +9,7 @@
 #include "platform/linux/alerts/runtime_alert_store.h"
 #include "platform/linux/bus/alerts/notification_screen.h"
 #include "platform/linux/dialog/dialog_screen.h"
+#include "tests/linux/alerts/problem_prompt.h"
 #include "tests/linux/bus/bus_fixture.h"
 #include "tests/linux/bus_alerts/virtual_display.h"
 
@@ -42,16 +43,6 @@ class RealScreenTest : public BusFixture {
         "Logs have been successfully captured and stored in this file: Vistel-Log "
         "(2026-11-20 20-50-00) (no sound <b> & more).zip";
     alert.defaultButton = "OK";
-    return alert;
-  }
-  static UserAlert prompt() {
-    UserAlert alert;
-    alert.title = "Vistel Logging";
-    alert.message = "Please describe the problem briefly";
-    alert.defaultButton = "OK";
-    alert.alternateButton = "Cancel";
-    alert.textField = UserAlert::TextField{};
-    alert.level = 3;
     return alert;
   }
   void post(UserAlert alert) {
@@ -132,7 +123,7 @@ TEST_F(RealScreenTest, AnAnswerInTheDirectoryTakesTheNotificationFromTheScreen) 
 }
 
 TEST_F(RealScreenTest, WhatIsTypedIntoThePromptIsTheAnswer) {
-  post(prompt());
+  post(problemPrompt());
   if (awaitPrompt().empty()) GTEST_SKIP() << "zenity is not installed";
   display->act({"type", "--delay", "5", "kein Ton \xC3\xA4\xC3\xB6 <b> --x"});
   runFor(std::chrono::milliseconds(100));  // the last letter is drawn; the picture alone depends on it
@@ -147,7 +138,7 @@ TEST_F(RealScreenTest, WhatIsTypedIntoThePromptIsTheAnswer) {
 }
 
 TEST_F(RealScreenTest, EscapeCancelsThePrompt) {
-  post(prompt());
+  post(problemPrompt());
   if (awaitPrompt().empty()) GTEST_SKIP() << "zenity is not installed";
   display->act({"key", "Escape"});
   awaitAnswer();
@@ -155,7 +146,7 @@ TEST_F(RealScreenTest, EscapeCancelsThePrompt) {
 }
 
 TEST_F(RealScreenTest, AnAnswerInTheDirectoryTakesThePromptFromTheScreen) {
-  post(prompt());
+  post(problemPrompt());
   if (awaitPrompt().empty()) GTEST_SKIP() << "zenity is not installed";
   EXPECT_EQ(answerAlert(alerts, "1", "default", "by hand"), std::nullopt);
   awaitAnswer();
@@ -179,7 +170,7 @@ TEST_F(RealScreenTest, WithoutAReachableDisplayTheAlertWaitsInTheDirectory) {
   if (!std::filesystem::exists("/usr/bin/zenity")) GTEST_SKIP() << "zenity is not installed";
   display.reset();
   ::setenv("DISPLAY", ":no-such-display", 1);
-  post(prompt());
+  post(problemPrompt());
   EXPECT_TRUE(runUntil([this] { return log.lines.size() == 2; }));
   ::unsetenv("DISPLAY");
   EXPECT_THAT(log.lines[1], ::testing::StartsWith("warning: No dialog can be shown: "));

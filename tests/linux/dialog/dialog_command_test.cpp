@@ -3,25 +3,19 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include "tests/linux/alerts/problem_prompt.h"
+
 namespace zal {
 namespace {
+
+using testing::problemPrompt;
 
 using ::testing::ElementsAre;
 
 using Words = std::vector<std::string>;
 
-UserAlert prompt() {
-  UserAlert alert;
-  alert.title = "Vistel Logging";
-  alert.message = "Please describe the problem briefly";
-  alert.defaultButton = "OK";
-  alert.alternateButton = "Cancel";
-  alert.textField = UserAlert::TextField{};
-  return alert;
-}
-
 UserAlert question() {
-  UserAlert alert = prompt();
+  UserAlert alert = problemPrompt();
   alert.textField.reset();
   alert.otherButton = "Later_on";
   return alert;
@@ -45,7 +39,7 @@ std::string read(const UserAlert& alert, const DialogOutcome& outcome) {
 }
 
 TEST(DialogArgumentsTest, APromptIsAnEntryWithItsTwoButtons) {
-  EXPECT_THAT(zenityWords(prompt()),
+  EXPECT_THAT(zenityWords(problemPrompt()),
               ElementsAre("--entry", "--title=Vistel Logging", "--text=Please describe the problem briefly",
                           "--entry-text=", "--ok-label=OK", "--cancel-label=Cancel", "--width=360"));
 }
@@ -61,7 +55,7 @@ TEST(DialogArgumentsTest, AnAlertWithoutATextFieldIsAQuestionOrANotice) {
 }
 
 TEST(DialogArgumentsTest, HostileTextsAreNoOptionsNoMarkupAndNoEscapes) {
-  UserAlert alert = prompt();
+  UserAlert alert = problemPrompt();
   alert.title = "--help\n<b>T</b>";
   alert.message = "-v \\n <b>&amp;</b> _x";
   alert.textField = UserAlert::TextField{"--name", "--initial \\t _y"};
@@ -76,7 +70,7 @@ TEST(DialogArgumentsTest, HostileTextsAreNoOptionsNoMarkupAndNoEscapes) {
 }
 
 TEST(DialogArgumentsTest, AnEndlessMessageStillFitsOnAScreen) {
-  UserAlert alert = prompt();
+  UserAlert alert = problemPrompt();
   alert.title = std::string(4096, 't');
   alert.message = std::string(4096, 'x');
   const Words words = zenityWords(alert);
@@ -87,7 +81,7 @@ TEST(DialogArgumentsTest, AnEndlessMessageStillFitsOnAScreen) {
 }
 
 TEST(DialogArgumentsTest, TheSecondProgramHasTheSameDialogsUpToTwoButtons) {
-  EXPECT_THAT(*dialogArguments(DialogProgram::kdialog, prompt()),
+  EXPECT_THAT(*dialogArguments(DialogProgram::kdialog, problemPrompt()),
               ElementsAre("--title=Vistel Logging", "--inputbox=<qt>Please describe the problem briefly</qt>",
                           "--", ""));
   UserAlert two = question();
@@ -107,15 +101,15 @@ TEST(DialogEnvironmentTest, OursGoesBeforeWhatTheAgentHas) {
 }
 
 TEST(DialogAnswerTest, TheDefaultButtonBringsTheTextWithoutItsLineEnd) {
-  EXPECT_EQ(read(prompt(), {20, "no sound\n", ""}), "button 0: no sound");
-  EXPECT_EQ(read(prompt(), {20, "\n", "some warning"}), "button 0: ");
-  EXPECT_EQ(read(prompt(), {0, "two\nlines\n", ""}), "button 0: two\nlines");
+  EXPECT_EQ(read(problemPrompt(), {20, "no sound\n", ""}), "button 0: no sound");
+  EXPECT_EQ(read(problemPrompt(), {20, "\n", "some warning"}), "button 0: ");
+  EXPECT_EQ(read(problemPrompt(), {0, "two\nlines\n", ""}), "button 0: two\nlines");
   EXPECT_EQ(read(notice(), {20, "", ""}), "button 0");
 }
 
 TEST(DialogAnswerTest, CancelIsTheAlternateButtonAndEscapeIsNone) {
-  EXPECT_EQ(read(prompt(), {21, "", ""}), "button 1");
-  EXPECT_EQ(read(prompt(), {22, "typed\n", ""}), "button 3");
+  EXPECT_EQ(read(problemPrompt(), {21, "", ""}), "button 1");
+  EXPECT_EQ(read(problemPrompt(), {22, "typed\n", ""}), "button 3");
   EXPECT_EQ(read(notice(), {21, "", ""}), "button 3");
 }
 
@@ -126,20 +120,20 @@ TEST(DialogAnswerTest, AFurtherButtonIsKnownByItsLabel) {
 }
 
 TEST(DialogAnswerTest, AProgramThatWasToldNothingCancelsWithOne) {
-  EXPECT_EQ(read(prompt(), {1, "", "Gtk-Message: harmless\n"}), "button 3");
+  EXPECT_EQ(read(problemPrompt(), {1, "", "Gtk-Message: harmless\n"}), "button 3");
 }
 
 TEST(DialogAnswerTest, NoDisplayIsNoAnswer) {
-  EXPECT_EQ(read(prompt(), {1, "", "\n(zenity:1): Gtk-WARNING **: cannot open display: :9\n"}),
+  EXPECT_EQ(read(problemPrompt(), {1, "", "\n(zenity:1): Gtk-WARNING **: cannot open display: :9\n"}),
             "not seen: (zenity:1): Gtk-WARNING **: cannot open display: :9");
-  EXPECT_EQ(read(prompt(), {1, "", "Could not connect to DISPLAY"}),
+  EXPECT_EQ(read(problemPrompt(), {1, "", "Could not connect to DISPLAY"}),
             "not seen: Could not connect to DISPLAY");
 }
 
 TEST(DialogAnswerTest, AnyOtherEndIsNoAnswerAndHasItsReason) {
-  EXPECT_EQ(read(prompt(), {255, "text", "no such option\n\x1b[1m"}), "not seen: \\x1b[1m");
-  EXPECT_EQ(read(prompt(), {5, "", ""}), "not seen: it ended with status 5");
-  EXPECT_EQ(read(prompt(), {-9, "text", ""}), "not seen: it was ended by signal 9");
+  EXPECT_EQ(read(problemPrompt(), {255, "text", "no such option\n\x1b[1m"}), "not seen: \\x1b[1m");
+  EXPECT_EQ(read(problemPrompt(), {5, "", ""}), "not seen: it ended with status 5");
+  EXPECT_EQ(read(problemPrompt(), {-9, "text", ""}), "not seen: it was ended by signal 9");
 }
 
 }  // namespace

@@ -7,6 +7,7 @@
 #include <gtest/gtest.h>
 
 #include "platform/linux/loop/linux_run_loop.h"
+#include "tests/linux/alerts/problem_prompt.h"
 #include "tests/linux/loop/run_until.h"
 #include "tests/support/child_program.h"
 #include "tests/support/fake_services.h"
@@ -15,27 +16,20 @@
 namespace zal {
 namespace {
 
+using testing::problemPrompt;
+
 using ::testing::ElementsAre;
 using ::testing::IsEmpty;
 
 /// Real child processes; what a dialog's program does is a script of the test's.
 class DialogScreenTest : public ::testing::Test {
  protected:
-  static UserAlert prompt() {
-    UserAlert alert;
-    alert.title = "Title";
-    alert.message = "Message";
-    alert.defaultButton = "OK";
-    alert.alternateButton = "Cancel";
-    alert.textField = UserAlert::TextField{};
-    return alert;
-  }
-  /// What the program does; $D is the test's directory, and it has its process id in $D/ID.
+  /// What the program does; $D is the test's directory.
   void install(const std::string& name, const std::string& script) const {
     testing::writeFile(directory / name, "#!/bin/sh\nD='" + directory.path() + "'\n" + script + "\n");
     ::chmod((directory / name).c_str(), 0755);
   }
-  void present(const std::string& id, const UserAlert& alert = prompt()) {
+  void present(const std::string& id, const UserAlert& alert = problemPrompt()) {
     screen->present(id, alert,
                     {.onAnswer =
                          [this, id](const AlertAnswer& answer) {
@@ -87,13 +81,14 @@ TEST_F(DialogScreenTest, WithoutADisplayNothingIsStartedAndNothingIsSaid) {
 TEST_F(DialogScreenTest, WhatIsTypedIsTheAnswerAndWordsArriveAsTheyAre) {
   install("zenity",
           "printf '<%s>' \"$@\" > $D/words; echo noise >&2; printf 'kein Ton \\303\\244\\n'; exit 20");
-  UserAlert alert = prompt();
+  UserAlert alert = problemPrompt();
   alert.title = "-x; touch $D/owned `touch $D/owned`";
   present("1", alert);
   runUntilTold(1);
   EXPECT_THAT(told, ElementsAre("1 button 0: kein Ton \xC3\xA4"));
   EXPECT_EQ(testing::readFile(directory / "words"),
-            "<--entry><--title=-x; touch $D/owned `touch $D/owned`><--text=Message><--entry-text=>"
+            "<--entry><--title=-x; touch $D/owned `touch $D/owned`><--text=Please describe the problem "
+            "briefly><--entry-text=>"
             "<--ok-label=OK><--cancel-label=Cancel><--width=360>");
   EXPECT_FALSE(std::filesystem::exists(directory / "owned"));
 }
@@ -109,7 +104,7 @@ TEST_F(DialogScreenTest, TheSecondProgramIsForHostsWithoutTheFirst) {
   install("kdialog", "echo \"from $1\"");
   present("1");
   runUntilTold(1);
-  EXPECT_THAT(told, ElementsAre("1 button 0: from --title=Title"));
+  EXPECT_THAT(told, ElementsAre("1 button 0: from --title=Vistel Logging"));
 }
 
 TEST_F(DialogScreenTest, WithoutAnyProgramItIsSaidOnce) {

@@ -8,9 +8,9 @@
 namespace zal {
 namespace {
 
-constexpr const char* kName = "org.freedesktop.Notifications";
-constexpr const char* kPath = "/org/freedesktop/Notifications";
-constexpr const char* kAgentName = "ZalLoggingAgent";
+constexpr const char* kNotificationServer = "org.freedesktop.Notifications";
+constexpr const char* kNotificationPath = "/org/freedesktop/Notifications";
+constexpr const char* kNotifyingProgram = "ZalLoggingAgent";
 constexpr std::uint32_t kClosedByPerson = 2;
 constexpr std::int32_t kNeverExpires = 0;
 
@@ -73,7 +73,7 @@ void NotificationScreen::_takeBus(const std::string& id) {
   if (_ownerWatch != nullptr) return;
   _busId = id;
   const std::string rule = std::string("type='signal',sender='org.freedesktop.DBus',") +
-                           "member='NameOwnerChanged',arg0='" + kName + "'";
+                           "member='NameOwnerChanged',arg0='" + kNotificationServer + "'";
   _ownerWatch = _bus->addMatch(rule, [this](sdbus::Message& message) {
     std::string name;
     std::string before;
@@ -90,7 +90,7 @@ void NotificationScreen::_askOwner() {
   _daemon->callMethodAsync("GetNameOwner")
       .onInterface("org.freedesktop.DBus")
       .withTimeout(_limits.call)
-      .withArguments(std::string(kName))
+      .withArguments(std::string(kNotificationServer))
       .uponReplyInvoke([this](const sdbus::Error* error, const std::string& owner) {
         if (error == nullptr) {
           _takeServer(owner);
@@ -111,12 +111,12 @@ void NotificationScreen::_takeServer(const std::string& uniqueName) {
     for (auto& [id, shown] : _shown) shown.number = 0;
   }
   _server = Server{uniqueName};
-  _server->proxy = sdbus::createProxy(*_bus, uniqueName, kPath);
+  _server->proxy = sdbus::createProxy(*_bus, uniqueName, kNotificationPath);
   _server->proxy->uponSignal("ActionInvoked")
-      .onInterface(kName)
+      .onInterface(kNotificationServer)
       .call([this](std::uint32_t number, const std::string& key) { _takeAction(number, key); });
   _server->proxy->uponSignal("NotificationClosed")
-      .onInterface(kName)
+      .onInterface(kNotificationServer)
       .call([this](std::uint32_t number, std::uint32_t reason) { _takeClosed(number, reason); });
   _server->proxy->finishRegistration();
   _askCapabilities();
@@ -125,7 +125,7 @@ void NotificationScreen::_takeServer(const std::string& uniqueName) {
 void NotificationScreen::_askCapabilities() {
   if (std::exchange(_server->isAsked, true)) return;
   _server->proxy->callMethodAsync("GetCapabilities")
-      .onInterface(kName)
+      .onInterface(kNotificationServer)
       .withTimeout(_limits.call)
       .uponReplyInvoke([this](const sdbus::Error* error, const std::vector<std::string>& capabilities) {
         _takeCapabilities(error, capabilities);
@@ -162,9 +162,9 @@ void NotificationScreen::_notify(Place place) {
   const std::map<std::string, sdbus::Variant> hints{{"urgency", sdbus::Variant(text.urgency)}};
   try {
     _server->proxy->callMethodAsync("Notify")
-        .onInterface(kName)
+        .onInterface(kNotificationServer)
         .withTimeout(_limits.call)
-        .withArguments(std::string(kAgentName), std::uint32_t{0}, text.icon, text.summary, text.body,
+        .withArguments(std::string(kNotifyingProgram), std::uint32_t{0}, text.icon, text.summary, text.body,
                        text.actions, hints, kNeverExpires)
         .uponReplyInvoke([this, id = place->first](const sdbus::Error* error, std::uint32_t number) {
           _takeNumber(id, error, number);
@@ -197,7 +197,7 @@ void NotificationScreen::_close(std::uint32_t number) {
   if (number == 0 || !_server) return;
   try {
     _server->proxy->callMethodAsync("CloseNotification")
-        .onInterface(kName)
+        .onInterface(kNotificationServer)
         .withTimeout(_limits.call)
         .withArguments(number)
         .uponReplyInvoke([](const sdbus::Error*) {});
