@@ -17,6 +17,7 @@
 #include "bench/ingest/start_up.h"
 #include "bench/servers/agent_server.h"
 #include "bench/stackshot/stackshot_figures.h"
+#include "bench/support/figure_lines.h"
 #include "bench/support/scratch_folder.h"
 #include "bench/support/statistics.h"
 #include "bench/support/table.h"
@@ -192,6 +193,29 @@ bool addStackshot(Rows& rows, const std::filesystem::path& programs, bool quick)
   return true;
 }
 
+/// Returned: whether there was something to measure, or a good reason that there was not.
+bool addBus(Rows& rows, const std::filesystem::path& programs, bool quick) {
+  const unsigned seconds = quick ? 6 : 60;  // at least one sample
+  fprintf(stderr, "a modem's state, and a session of %u s that is sampled\n", seconds);
+  FigureLines lines = figureLinesOf(
+      {(programs / "bus_bench").string(), programs.string(), quick ? "2" : "41", std::to_string(seconds)});
+  auto& figures = lines.figures;
+  if (figures.empty()) {
+    rows.push_back(
+        skipped("modem and Wi-Fi on a bus", lines.reason.empty() ? "bus_bench failed" : lines.reason));
+    return !lines.reason.empty();
+  }
+  rows.push_back(
+      plain("snapshot of the modem : mmcli -m any -J", figures["snapshot"], figures["mmcli"], duration));
+  rows.push_back(plain("CPU of a session in an hour, only sampled : without a bus",
+                       figures["bus_cpu_an_hour"], figures["no_bus_cpu_an_hour"], duration));
+  rows.push_back(plain("memory at rest beside a bus (resident) : without one", figures["bus_at_rest"],
+                       figures["no_bus_at_rest"], mebibytes));
+  rows.push_back(plain("memory in a sampled session (resident) : without a bus", figures["bus_in_session"],
+                       figures["no_bus_in_session"], mebibytes));
+  return figures["snapshot"] > 0;
+}
+
 int run(const std::filesystem::path& programs, bool quick) {
   Extent extent;
   if (quick) extent = {1, 5'000, 50, 3, 2, 20'000};
@@ -205,6 +229,7 @@ int run(const std::filesystem::path& programs, bool quick) {
   bool ownPart = addStartUp(rows, programs, extent.startUps);
   ownPart = addDump(rows, programs, quick) && ownPart;
   ownPart = addStackshot(rows, programs, quick) && ownPart;
+  ownPart = addBus(rows, programs, quick) && ownPart;
   {
     // The idle agent idles on while the lists are measured: its own switches are counted, nobody else's.
     IdleWatch idle(programs);
