@@ -6,7 +6,7 @@ import dbus.mainloop.glib
 from gi.repository import GLib
 
 ON = {"Powered": True, "Online": True}
-SIM = {"Present": True, "PinRequired": "pin"}
+MESSAGES = {"ServiceCenterAddress": "+15550001"}
 
 
 def answer(connection, message):
@@ -20,8 +20,8 @@ def answer(connection, message):
     reply = dbus.lowlevel.MethodReturnMessage(message)
     if interface == "org.ofono.Manager":
         reply.append([("/slow_0", ON)], signature="a(oa{sv})")
-    elif interface == "org.ofono.SimManager":
-        reply.append(SIM, signature="a{sv}")
+    elif interface == "org.ofono.MessageManager":
+        reply.append(MESSAGES, signature="a{sv}")
     else:
         reply = dbus.lowlevel.ErrorMessage(message, "org.freedesktop.DBus.Error.UnknownMethod", "no such one")
     connection.send_message(reply)
