@@ -26,14 +26,13 @@ std::string outputOf(const std::vector<std::string>& words,
   return text;
 }
 
-PrivateBus::PrivateBus(const std::string& type) {
+PrivateBus::PrivateBus(const std::string& type, const std::string& policy) {
   std::filesystem::create_directories(servicesDirectory());
   writeFile(_directory.path() + "/bus.conf",
-            "<busconfig><type>" + type + "</type><listen>" + address() + "</listen><auth>EXTERNAL</auth>" +
-                "<servicedir>" + servicesDirectory() +
-                "</servicedir><limit name=\"max_connections_per_user\">1000</limit>" +
-                "<policy context=\"default\"><allow send_destination=\"*\" eavesdrop=\"true\"/>"
-                "<allow eavesdrop=\"true\"/><allow own=\"*\"/><allow user=\"*\"/></policy></busconfig>\n");
+            "<busconfig><type>" + type + "</type><listen>" + address() +
+                "</listen><auth>EXTERNAL</auth><servicedir>" + servicesDirectory() +
+                "</servicedir><limit name=\"max_connections_per_user\">1000</limit>" + policy +
+                "</busconfig>\n");
   start();
 }
 

@@ -17,7 +17,11 @@ class PrivateBus {
   /// `type` as the bus's configuration knows it: "system", "session". Services that the bus may start
   /// have their files in `services`, a directory that may be filled later, until the first one is
   /// asked for.
-  explicit PrivateBus(const std::string& type = "system");
+  /// `policy` is the part of that configuration that says who may do what.
+  explicit PrivateBus(const std::string& type = "system", const std::string& policy = kEverythingAllowed);
+  static constexpr const char* kEverythingAllowed =
+      "<policy context=\"default\"><allow send_destination=\"*\" eavesdrop=\"true\"/>"
+      "<allow eavesdrop=\"true\"/><allow own=\"*\"/><allow user=\"*\"/></policy>";
 
   /// Why there can be none on this machine; empty where there can. For GTEST_SKIP.
   [[nodiscard]] static std::string obstacle();

@@ -21,8 +21,8 @@ constexpr int kMessagesPerTurn = 64;
 std::unique_ptr<sdbus::IProxy> daemonOf(sdbus::IConnection& bus) {
   return sdbus::createProxy(bus, "org.freedesktop.DBus", "/org/freedesktop/DBus");
 }
-/// For what the library asks the bus itself, and waits for.
-constexpr std::chrono::milliseconds kLibraryCallLimit = 200ms;
+/// For what the library asks the bus itself, and waits for, once the main thread has the connection.
+constexpr std::chrono::milliseconds kMainThreadLimit = 200ms;
 
 }  // namespace
 
@@ -35,7 +35,6 @@ struct BusConnection::Link {
   /// Waits for the bus: on a queue thread.
   void match(const std::vector<Signals>& signals) {
     if (signals.empty()) return;
-    bus->setMethodCallTimeout(kAnswerLimit);
     const auto daemon = daemonOf(*bus);
     for (const Signals& wanted : signals) {
       matches.push_back(bus->addMatch(wanted.rule, wanted.onSignal));
@@ -104,8 +103,9 @@ void BusConnection::_connect() {
         std::string trouble;
         try {
           link->bus = sdbus::createSessionBusConnectionWithAddress(address);
-          link->bus->setMethodCallTimeout(kLibraryCallLimit);
+          link->bus->setMethodCallTimeout(kAnswerLimit);
           link->match(signals);
+          link->bus->setMethodCallTimeout(kMainThreadLimit);
         } catch (const sdbus::Error& error) {
           trouble = error.getMessage();
           link = std::make_shared<Link>();

@@ -24,6 +24,8 @@ struct BusHost {
   std::string systemBus;   ///< D-Bus address; empty: this host has none
   std::string sessionBus;  ///< of the agent's own user; empty: there is none
   bool isSystem = false;   ///< an agent of the superuser, which has its name on the system bus
+  /// Brings all that was logged into the files, before a request of the bus is answered.
+  std::function<void()> flush = [] {};
   /// Starts the baseband dump's helper; any thread, returns at once.
   std::function<void(std::string_view reason)> startBasebandDump = [](std::string_view) {};
 };

@@ -88,6 +88,7 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
                .systemBus = systemBusAddress(environment),
                .sessionBus = sessionBusAddress(environment),
                .isSystem = environment.isSystem(),
+               .flush = [this] { _logFiles.flush(); },
                .startBasebandDump = [this](std::string_view reason) { _basebandDumps.start(reason); }},
       _bus(_busHost, busModulePath(environment)),
       _ipcWithBus(_ipc, _bus),

@@ -189,7 +189,9 @@ void NamedDoor::_carryOut(const std::shared_ptr<BusCaller>& caller, ReadDictiona
   }
   const std::uint64_t token = caller->keep(std::move(call));
   const BusRequest request(std::move(dictionary.values), token);
-  _tell(caller->owing(token), &request);
+  const auto peer = caller->owing(token);
+  _tell(peer, &request);
+  _host.flush();
 }
 
 void NamedDoor::_tell(const std::shared_ptr<PeerConnection>& peer, const IpcEvent& event) {
