@@ -102,7 +102,7 @@ void BusConnection::_connect() {
         link->signalWishes = wishes;
         std::string trouble;
         try {
-          link->bus = sdbus::createSessionBusConnectionWithAddress(address);
+          link->bus = openBus(address);
           link->bus->setMethodCallTimeout(kAnswerLimit);
           link->match(signals);
           link->bus->setMethodCallTimeout(kMainThreadLimit);

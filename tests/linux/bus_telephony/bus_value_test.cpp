@@ -49,7 +49,7 @@ TEST_F(BusValueTest, ListsAndStructuresAreLists) {
   EXPECT_EQ(readBack(std::vector<std::uint32_t>{1, 2}, std::vector<std::string>{}),
             (ValueList{ValueList{std::uint64_t{1}, std::uint64_t{2}}, ValueList{}}));
   EXPECT_EQ(readBack(sdbus::Struct<std::uint32_t, bool>{80U, true}),
-            (ValueList{ValueList{std::uint64_t{80}, true}}));
+            ValueList(1, ValueList{std::uint64_t{80}, true}));
 }
 
 TEST_F(BusValueTest, DictionariesAreMapsWithTheirKeysAsText) {
