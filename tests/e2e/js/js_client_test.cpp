@@ -78,7 +78,7 @@ TEST_F(JavaScriptClientTest, SendsEveryRequestWaitsBehindABarrierAndReadsAReply)
   EXPECT_EQ(output(),
             "barrier passed\n"
             "{\"action\":14,\"replyResult\":{\"logPath\":\"/dump.zip\",\"replyAction\":14}}\n");
-  EXPECT_EQ(flushes, 1);
+  EXPECT_GE(flushes, 1);
   const Lines expected{
       R"({"__ipc__event_code__": 0, "beginSessionFlags": 4, "endSessionFlags": -1, "sender": "js", "sessionType": "Vistel"})",
       R"({"__ipc__event_code__": 1, "sender": "js", "sessionType": "Vistel"})",
