@@ -73,6 +73,17 @@ TEST_F(WireMessageTest, KeysAreFoundInWhateverOrderSomebodyAsksForThem) {
   EXPECT_EQ(message.int64(std::string_view("a\0", 2)), 0);
 }
 
+TEST_F(WireMessageTest, AKeyThatStandsTwiceIsTheSameEachTimeItIsAskedFor) {
+  std::string payload = flexMap([](Builder& builder) {
+    builder.Int("a", 1);
+    builder.Double("b", 0.5);
+  });
+  payload[payload.find('b')] = 'a';
+  const auto message = messageOf(payload);
+  ASSERT_TRUE(message.has_value());
+  EXPECT_EQ((message->int64("a") != 0 ? 1 : 0) + (message->real("a") != 0 ? 1 : 0), 1);
+}
+
 TEST_F(WireMessageTest, AMissingValueReadsAsItsDefault) {
   const auto& message = messageWith([](Builder&) {});
   EXPECT_EQ(message.string("x"), std::nullopt);

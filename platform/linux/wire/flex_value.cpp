@@ -144,11 +144,13 @@ FlexValue FlexMap::find(std::string_view key) const {
   return index < size() ? _values[index] : FlexValue();
 }
 
-FlexValue FlexMap::find(std::string_view key, std::size_t& next) const {
-  std::size_t index = next;
+FlexValue FlexMap::find(std::string_view key, std::size_t& at) const {
+  std::size_t index = at;
+  // Where it was last first: a key that stands twice is one and the same each time it is asked for.
+  if (index >= size() || !isKey(_keyAt(index), key)) ++index;
   if (index >= size() || !isKey(_keyAt(index), key)) index = _indexOf(key);
   if (index == size()) return {};
-  next = index + 1;
+  at = index;
   return _values[index];
 }
 

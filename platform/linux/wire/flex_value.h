@@ -72,9 +72,9 @@ class FlexMap {
   [[nodiscard]] std::string_view key(std::size_t index) const;
   [[nodiscard]] FlexValue value(std::size_t index) const { return _values[index]; }
   [[nodiscard]] FlexValue find(std::string_view key) const;  ///< absent: a null value
-  /// The same with a first look at that index, which then becomes the one behind what was found: who asks
-  /// for keys in the order of their bytes finds each at its first look.
-  [[nodiscard]] FlexValue find(std::string_view key, std::size_t& next) const;
+  /// The same with a first look at that index and the one behind it; it becomes that of what was found.
+  /// Who asks for keys in the order of their bytes finds each at once.
+  [[nodiscard]] FlexValue find(std::string_view key, std::size_t& at) const;
 
  private:
   [[nodiscard]] const char* _keyAt(std::size_t index) const;

@@ -30,10 +30,10 @@ class WireMessage final : public Message {
   WireMessage(const FlexMap& map, std::optional<std::uint64_t> replyToken)
       : _map(map), _replyToken(replyToken) {}
 
-  [[nodiscard]] FlexValue _find(std::string_view key) const { return _map.find(key, _nextKey); }
+  [[nodiscard]] FlexValue _find(std::string_view key) const { return _map.find(key, _lastKey); }
 
   FlexMap _map;
-  mutable std::size_t _nextKey = 0;  // the event code's is the first of most messages
+  mutable std::size_t _lastKey = 0;  // the event code's is the first of most messages
   std::optional<std::uint64_t> _replyToken;
   mutable std::forward_list<std::string> _replaced;  // stays put, so that views into it live on
 };
