@@ -30,7 +30,7 @@ namespace zal {
 /// made on the queue thread with the connection and taken back from the bus at once.
 class BusConnection {
  public:
-  /// What of the signals that arrive is for a user: a match rule, as the D-Bus specification has them.
+  /// What of the signals that arrive is for a user: a match rule, as the bus daemon reads them.
   struct Signals {
     std::string rule;
     std::function<void(sdbus::Message& signal)> onSignal;

@@ -8,7 +8,7 @@
 namespace zal {
 
 // Where the buses of this host are, as D-Bus addresses, by the rules that every bus client follows:
-// the D-Bus specification, "Well-known Message Bus Instances".
+// the D-Bus standard, "Well-known Message Bus Instances".
 
 /// $DBUS_SYSTEM_BUS_ADDRESS, else the socket in /run/dbus.
 [[nodiscard]] std::string systemBusAddress(const HostEnvironment& environment);
