@@ -46,6 +46,7 @@ void PrivateBus::kill() {
 }
 
 void PrivateBus::start() {
+  if (!obstacle().empty()) return;  // a fixture's member is made before the fixture can skip
   const std::string printed = _directory.path() + "/address";
   ::unlink(printed.c_str());
   _daemon = std::make_unique<ChildProgram>(
@@ -84,7 +85,7 @@ MockedService::MockedService(const PrivateBus& bus, const std::string& name, std
 
 std::string MockedService::obstacle() {
   static const bool isThere = outputOf({kPython, "-c", "import dbusmock"}).empty();
-  return isThere ? "" : "python3-dbusmock is not installed";
+  return isThere ? "" : "python3 cannot load dbusmock";
 }
 
 void MockedService::kill() { _program.reset(); }

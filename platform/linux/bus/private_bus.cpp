@@ -50,10 +50,6 @@ std::unique_ptr<sdbus::IConnection> openPrivateBus(const std::string& address) {
   }
 }
 
-bool hasOwner(sdbus::IConnection& bus, const std::string& serviceName) {
-  return ownerOf(bus, serviceName).has_value();
-}
-
 std::optional<std::string> ownerOf(sdbus::IConnection& bus, const std::string& serviceName) {
   try {
     std::string owner;

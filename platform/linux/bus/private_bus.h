@@ -17,10 +17,8 @@ inline constexpr std::chrono::milliseconds kAnswerLimit{1000};
 /// A connection of the caller's own, for calls that wait: for queue threads, never the main one. Calls
 /// on it without a limit of their own end after kAnswerLimit. Nothing when the bus cannot be reached.
 [[nodiscard]] std::unique_ptr<sdbus::IConnection> openPrivateBus(const std::string& address);
-/// Whether a service is there now; the question starts none. False when the bus does not answer.
-[[nodiscard]] bool hasOwner(sdbus::IConnection& bus, const std::string& serviceName);
-/// The unique name that has it now, if any. Calls to that one never start a service, not even when it
-/// dies between two of them.
+/// The unique name of a service that is there now, if it is and the bus answers; the question starts none.
+/// Calls to that one never start a service, not even when it dies between two of them.
 [[nodiscard]] std::optional<std::string> ownerOf(sdbus::IConnection& bus, const std::string& serviceName);
 
 }  // namespace zal

@@ -71,7 +71,7 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
       _directoryNotifications(_mainLoop.context(),
                               notificationDirectory(_loaded.configuration.roots.RuntimeRoot), _agentLog),
       _crashReporter(_mainLoop.context(), _agentLog,
-                     {.helper = _loaded.configuration.commands.toolDirectory + "/lirra-stackshot",
+                     {.helper = helperProgram(_loaded.configuration, "lirra-stackshot"),
                       .reportDirectory = _loaded.configuration.roots.DiagnosticReportRoot}),
       _files(environment.homeDirectory, temporaryArea(_loaded.configuration.roots, environment)),
       _shell(_agentLog),
