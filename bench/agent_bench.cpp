@@ -213,6 +213,13 @@ bool addBus(Rows& rows, const std::filesystem::path& programs, bool quick) {
                        figures["no_bus_at_rest"], mebibytes));
   rows.push_back(plain("memory in a sampled session (resident) : without a bus", figures["bus_in_session"],
                        figures["no_bus_in_session"], mebibytes));
+  constexpr double kLongestWait = 0.100;
+  const auto addWait = [&](const char* figure, const std::string& name) {
+    const bool isMet = figures[name + "_barriers"] > 0 && figures[name] <= kLongestWait;
+    rows.push_back({figure, duration(figures[name]), "", "", "100 ms", isMet ? "met" : "MISSED"});
+  };
+  addWait("longest barrier while the modem daemon hangs", "wait_hung");
+  addWait("longest barrier while the bus dies and comes back", "wait_dead");
   return figures["snapshot"] > 0;
 }
 

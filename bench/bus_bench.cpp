@@ -3,11 +3,13 @@
 //
 //     bus_bench PROGRAM_FOLDER ROUNDS SECONDS
 
+#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
 #include <stdexcept>
 #include <string>
 
+#include "bench/bus/longest_wait.h"
 #include "bench/bus/session_cost.h"
 #include "bench/bus/snapshot.h"
 #include "tests/e2e/bus/played_wifi.h"
@@ -27,9 +29,9 @@ int measure(const char* programs, unsigned rounds, double seconds) {
     printf("%s\n", obstacle.c_str());
     return 0;
   }
-  const testing::PrivateBus bus;
+  testing::PrivateBus bus;
   testing::EmulatedModem modem({"csq=20"});
-  const testing::RealModemManager manager(bus, modem);
+  testing::RealModemManager manager(bus, modem);
   const testing::PlayedWifi wifi(bus, {.strength = 70, .rssi = -58, .rate = 433});
   const bench::SnapshotSeconds snapshot = bench::measureSnapshots(bus, rounds);
   printf("snapshot %.9f\nmmcli %.9f\n", snapshot.ours, snapshot.mmcli);
@@ -37,6 +39,12 @@ int measure(const char* programs, unsigned rounds, double seconds) {
   bench::IdleSession withoutBus(programs, "");
   print("bus", sampling.costAfter(seconds));
   print("no_bus", withoutBus.costAfter(seconds));
+  const double stopped = std::min(seconds, 12.0);
+  const bench::LongestWaits waits = bench::measureLongestWaits(programs, bus, manager, stopped);
+  printf("wait_hung %.6f\nwait_hung_barriers %u\n", waits.whileModemDaemonHangs.seconds,
+         waits.whileModemDaemonHangs.barriers);
+  printf("wait_dead %.6f\nwait_dead_barriers %u\n", waits.whileBusIsDead.seconds,
+         waits.whileBusIsDead.barriers);
   // Without one, nothing of this was the cost of a sample.
   return wifi.polls() > 0 ? 0 : 1;
 }

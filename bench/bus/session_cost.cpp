@@ -28,8 +28,7 @@ ChildProcess::Options optionsOf(const std::filesystem::path& programs, const std
 IdleSession::IdleSession(const std::filesystem::path& programs, const std::string& bus)
     : _agent(optionsOf(programs, _folder.path(), bus)),
       _client({.socketPath = AgentServer::socketIn(_folder.path()).string(), .sender = "bench"}) {
-  const std::string socket = AgentServer::socketIn(_folder.path()).string();
-  if (!waitUntil(10, [&] { return UnixSocket(UnixSocket::Kind::stream, socket).connected(); }))
+  if (!waitUntil(10, [&] { return UnixSocket(UnixSocket::Kind::stream, socketPath()).connected(); }))
     throw std::runtime_error("the agent does not start");
   pauseMilliseconds(kSettle);
   _cost.atRest = residentMebibytes(_agent.id());
@@ -40,6 +39,8 @@ IdleSession::IdleSession(const std::filesystem::path& programs, const std::strin
   _cpuBefore = cpuSeconds(_agent.id());
   _since = Stopwatch();
 }
+
+std::string IdleSession::socketPath() const { return AgentServer::socketIn(_folder.path()).string(); }
 
 SessionCost IdleSession::costAfter(double seconds) {
   while (_since.seconds() < seconds) pauseMilliseconds(50);

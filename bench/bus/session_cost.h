@@ -24,6 +24,7 @@ class IdleSession {
 
   /// Waits until the session has lasted so long.
   [[nodiscard]] SessionCost costAfter(double seconds);
+  [[nodiscard]] std::string socketPath() const;
 
  private:
   ScratchFolder _folder;

@@ -66,7 +66,7 @@ std::unique_ptr<BusConnection::User> BusConnection::addUser(Handlers handlers) {
     ++_signalWishes;
     if (_bus != nullptr) _renew();
   }
-  if (sdbus::IConnection* bus = connection()) {
+  if (sdbus::IConnection* bus = (*place)->wantsConnection ? connection() : _bus.get()) {
     try {
       (*place)->onConnected(*bus);
     } catch (const sdbus::Error& error) {

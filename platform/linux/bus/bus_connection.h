@@ -40,6 +40,8 @@ class BusConnection {
     std::function<void()> onLost = [] {};
     /// A user with these that comes when the connection is there already makes everybody lose it once.
     std::vector<Signals> signals = {};
+    /// Without it the user hears of a connection that others want; its own wish comes by connection().
+    bool wantsConnection = true;
   };
   /// A user's membership; no handler of it runs after its end.
   class User;
@@ -50,7 +52,7 @@ class BusConnection {
   BusConnection(const BusConnection&) = delete;
   BusConnection& operator=(const BusConnection&) = delete;
 
-  /// Wants the connection from now on. The handler runs at once when it is there.
+  /// The handler runs at once when the connection is there.
   [[nodiscard]] std::unique_ptr<User> addUser(Handlers handlers);
   /// Nothing while there is none; then one is tried for, unless a try was made a moment ago.
   [[nodiscard]] sdbus::IConnection* connection();

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <gtest/gtest.h>
+#include <unistd.h>
 
 #include <chrono>
 #include <functional>
@@ -14,6 +15,7 @@
 #include "platform/linux/loop/loop_descriptor_watcher.h"
 #include "tests/support/fake_services.h"
 #include "tests/support/private_bus.h"
+#include "tests/support/wait_watch.h"
 
 namespace zal::testing {
 
@@ -29,6 +31,16 @@ class BusFixture : public ::testing::Test {
   /// For what must not happen: runs the loop for that long.
   void runFor(std::chrono::milliseconds time) {
     (void)_run([] { return false; }, time);
+  }
+
+  /// How often the loop's thread was seen waiting for somebody while the work ran its course on it.
+  template <class Work>
+  unsigned strayWaitsDuring(Work work) {
+    const WaitWatch watch(::getpid(), ::gettid());
+    watch.awaitLook();
+    work();
+    watch.awaitLook();
+    return watch.strayWaits();
   }
 
   PrivateBus bus;

@@ -330,15 +330,31 @@ TEST_F(NotificationScreenTest, WithNothingOnTheScreenOtherProgramsNotificationsW
     const std::string text = bus.busctl({"call", "org.freedesktop.DBus", "/org/freedesktop/DBus",
                                          "org.freedesktop.DBus.Debug.Stats", "GetAllMatchRules"});
     std::size_t count = 0;
-    for (std::size_t at = text.find("NotificationClosed"); at != std::string::npos;
-         at = text.find("NotificationClosed", at + 1)) {
-      ++count;
-    }
+    for (std::size_t at = text.find(kName); at != std::string::npos; at = text.find(kName, at + 1)) ++count;
     return count;
   };
   if (rules() == 0) GTEST_SKIP() << "this bus daemon does not tell its match rules";
   screen->withdraw("7");
   EXPECT_TRUE(runUntil([&] { return rules() == 0; }));
+}
+
+TEST_F(NotificationScreenTest, ABusThatHangsHoldsUpTheLoopNeitherWithANewAlertNorWithTheNext) {
+  startServer();
+  useShortLimits();
+  present("7", question());
+  runUntilCalls(1);
+  screen->withdraw("7");
+  runUntilCalls(2);
+  bus.hang();
+  const unsigned strayWaits = strayWaitsDuring([&] {
+    present("8", question());
+    runUntilTold(1);
+    present("9", question());
+    runUntilTold(2);
+  });
+  bus.goOn();
+  EXPECT_EQ(strayWaits, 0U);
+  EXPECT_THAT(told, ElementsAre("8 declined", "9 declined"));
 }
 
 TEST_F(NotificationScreenTest, TheScreenMayGoWithAlertsOnIt) {

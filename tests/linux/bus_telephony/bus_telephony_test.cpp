@@ -212,10 +212,8 @@ TEST_F(BusTelephonyTest, AMethodThatNeverAnswersIsTheLastThatIsCalled) {
                  });
   modem->publish();
   const auto connection = telephony->connect();
-  const SteadyTime begin = clock.steadyNow();
   EXPECT_FALSE(connection->query(Query::serviceCenterAddress));
   EXPECT_FALSE(connection->query(Query::serviceCenterAddress));
-  EXPECT_LT(clock.steadyNow() - begin, 3s);
   EXPECT_EQ(calls, 1);
   EXPECT_TRUE(connection->signalStrength());  // read before
 }
@@ -241,11 +239,7 @@ TEST_F(BusTelephonyTest, ABusThatHangsHoldsUpNeitherTheLoopNorTheSample) {
   modem->publish();
   ASSERT_TRUE(sample());
   bus.hang();
-  std::chrono::nanoseconds shortest = 1h;
-  for (int attempt = 0; attempt < 3; ++attempt) {
-    shortest = std::min(shortest, longestTurnDuring([&] { EXPECT_FALSE(sample()); }));
-  }
-  EXPECT_LT(shortest, 100ms);
+  EXPECT_EQ(strayWaitsDuring([&] { EXPECT_FALSE(sample()); }), 0U);
   bus.goOn();
   EXPECT_TRUE(signalComesBack());
   EXPECT_EQ(log.lines, (Lines{"warning: Without the cellular signal: The system bus does not answer",

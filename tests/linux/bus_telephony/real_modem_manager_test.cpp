@@ -187,11 +187,7 @@ TEST_F(RealModemManagerTest, WhatPolkitRefusesFailsAlone) {
 TEST_F(RealModemManagerTest, ADaemonThatHangsIsSkippedWithoutHoldingUpTheLoop) {
   ASSERT_TRUE(sample());
   real->manager.hang();
-  std::chrono::nanoseconds shortest = 1h;  // a busy machine holds up one try, a wait in ours each of them
-  for (int attempt = 0; attempt < 3; ++attempt) {
-    shortest = std::min(shortest, longestTurnDuring([&] { EXPECT_FALSE(sample()); }));
-  }
-  EXPECT_LT(shortest, 100ms);
+  EXPECT_EQ(strayWaitsDuring([&] { EXPECT_FALSE(sample()); }), 0U);
   real->manager.goOn();
   EXPECT_TRUE(signalComesBack());
   EXPECT_EQ(log.lines, (Lines{"warning: Without the cellular signal: ModemManager does not answer",
@@ -200,9 +196,7 @@ TEST_F(RealModemManagerTest, ADaemonThatHangsIsSkippedWithoutHoldingUpTheLoop) {
 
 TEST_F(RealModemManagerTest, ADaemonThatHangsCostsASnapshotOneTimeOut) {
   real->manager.hang();
-  const SteadyTime begin = clock.steadyNow();
   const ValueMap state = snapshot().CopyCellularState();
-  EXPECT_LT(clock.steadyNow() - begin, 2s);
   real->manager.goOn();
   EXPECT_EQ(state.size(), 34U);
   for (const auto& [key, value] : state) EXPECT_EQ(value, Value("FAILED")) << key;

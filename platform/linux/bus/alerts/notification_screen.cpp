@@ -10,14 +10,31 @@ namespace {
 
 constexpr const char* kNotificationServer = "org.freedesktop.Notifications";
 constexpr const char* kNotificationPath = "/org/freedesktop/Notifications";
+constexpr const char* kOwnerRule =
+    "type='signal',sender='org.freedesktop.DBus',member='NameOwnerChanged',arg0='org.freedesktop."
+    "Notifications'";
+constexpr const char* kServerRule =
+    "type='signal',path='/org/freedesktop/Notifications',interface='org.freedesktop.Notifications'";
 constexpr const char* kNotifyingProgram = "ZalLoggingAgent";
 constexpr std::uint32_t kClosedByPerson = 2;
 constexpr std::int32_t kNeverExpires = 0;
 
+std::string serverRule(const std::string& uniqueName) {
+  return std::string(kServerRule) + ",sender='" + uniqueName + "'";
+}
+
 }  // namespace
 
 NotificationScreen::NotificationScreen(const BusHost& host, BusConnection& sessionBus, Limits limits)
-    : _host(host), _sessionBus(sessionBus), _limits(limits) {}
+    : _host(host), _sessionBus(sessionBus), _limits(limits) {
+  // From the start, for what is to be heard; an alert is what wants the connection.
+  _user = _sessionBus.addUser(
+      {.onConnected = [this](sdbus::IConnection& bus) { _join(bus); },
+       .onLost = [this] { _leave(); },
+       .signals = {{kOwnerRule, [this](sdbus::Message& signal) { _takeOwnerChange(signal); }},
+                   {kServerRule, [this](sdbus::Message& signal) { _takeServerSignal(signal); }}},
+       .wantsConnection = false});
+}
 
 NotificationScreen::~NotificationScreen() = default;
 
@@ -33,10 +50,7 @@ void NotificationScreen::present(const std::string& id, const UserAlert& alert, 
     _complain("it does not answer");
     _decline(late);
   }));
-  if (_user == nullptr) {
-    _user = _sessionBus.addUser(
-        {.onConnected = [this](sdbus::IConnection& bus) { _join(bus); }, .onLost = [this] { _leave(); }});
-  } else if (_sessionBus.connection() != nullptr) {
+  if (_sessionBus.connection() != nullptr) {
     _server && _server->abilities ? _notify(place) : _lookForServer();
   }
 }
@@ -49,15 +63,16 @@ void NotificationScreen::_join(sdbus::IConnection& bus) {
 
 void NotificationScreen::_leave() {
   _loseServer();
-  _ownerWatch.reset();
   _daemon.reset();
+  _isWatching = false;
+  _busId.clear();
   _bus = nullptr;
 }
 
-/// Adding a match waits for the bus: only for one that has answered just now.
 void NotificationScreen::_lookForServer() {
   if (_daemon == nullptr || _shown.empty()) return;
-  if (_ownerWatch != nullptr) {
+  if (!std::exchange(_isWatching, true)) _sessionBus.listen(kOwnerRule);
+  if (!_busId.empty()) {
     _askOwner();
     return;
   }
@@ -65,24 +80,19 @@ void NotificationScreen::_lookForServer() {
       .onInterface("org.freedesktop.DBus")
       .withTimeout(_limits.call)
       .uponReplyInvoke([this](const sdbus::Error* error, const std::string& id) {
-        if (error == nullptr) _takeBus(id);
+        if (error != nullptr) return;
+        _busId = id;
+        _askOwner();
       });
 }
 
-void NotificationScreen::_takeBus(const std::string& id) {
-  if (_ownerWatch != nullptr) return;
-  _busId = id;
-  const std::string rule = std::string("type='signal',sender='org.freedesktop.DBus',") +
-                           "member='NameOwnerChanged',arg0='" + kNotificationServer + "'";
-  _ownerWatch = _bus->addMatch(rule, [this](sdbus::Message& message) {
-    std::string name;
-    std::string before;
-    std::string now;
-    message >> name >> before >> now;
-    if (_server && _server->uniqueName == before) _loseServer();
-    if (!now.empty() && !_shown.empty()) _takeServer(now);
-  });
-  _askOwner();
+void NotificationScreen::_takeOwnerChange(sdbus::Message& signal) {
+  std::string name;
+  std::string before;
+  std::string now;
+  signal >> name >> before >> now;
+  if (_server && _server->uniqueName == before) _loseServer();
+  if (!now.empty() && !_busId.empty() && !_shown.empty()) _takeServer(now);
 }
 
 /// Who has the name, not the name itself, is spoken to: a call to a name could start a server.
@@ -110,16 +120,25 @@ void NotificationScreen::_takeServer(const std::string& uniqueName) {
   if (_numbersOf != before) {
     for (auto& [id, shown] : _shown) shown.number = 0;
   }
+  _forgetServer();
   _server = Server{uniqueName};
   _server->proxy = sdbus::createProxy(*_bus, uniqueName, kNotificationPath);
-  _server->proxy->uponSignal("ActionInvoked")
-      .onInterface(kNotificationServer)
-      .call([this](std::uint32_t number, const std::string& key) { _takeAction(number, key); });
-  _server->proxy->uponSignal("NotificationClosed")
-      .onInterface(kNotificationServer)
-      .call([this](std::uint32_t number, std::uint32_t reason) { _takeClosed(number, reason); });
-  _server->proxy->finishRegistration();
+  _sessionBus.listen(serverRule(uniqueName));
   _askCapabilities();
+}
+
+void NotificationScreen::_takeServerSignal(sdbus::Message& signal) {
+  if (!_server || signal.getSender() != _server->uniqueName) return;
+  std::uint32_t number = 0;
+  if (signal.getMemberName() == "ActionInvoked") {
+    std::string key;
+    signal >> number >> key;
+    _takeAction(number, key);
+  } else if (signal.getMemberName() == "NotificationClosed") {
+    std::uint32_t reason = 0;
+    signal >> number >> reason;
+    _takeClosed(number, reason);
+  }
 }
 
 void NotificationScreen::_askCapabilities() {
@@ -145,8 +164,13 @@ void NotificationScreen::_takeCapabilities(const sdbus::Error* error,
   _declineAll(false);
 }
 
-void NotificationScreen::_loseServer() {
+void NotificationScreen::_forgetServer() {
+  if (_server) _sessionBus.stopListening(serverRule(_server->uniqueName));
   _server.reset();
+}
+
+void NotificationScreen::_loseServer() {
+  _forgetServer();
   for (auto& [id, shown] : _shown) shown.isAsked = false;
 }
 
@@ -273,8 +297,8 @@ void NotificationScreen::_restLater() {
   if (!_shown.empty()) return;
   _host.mainLoop.post([this, alive = std::weak_ptr<bool>(_alive)] {
     if (alive.expired() || !_shown.empty()) return;
-    _server.reset();
-    _ownerWatch.reset();
+    _forgetServer();
+    if (std::exchange(_isWatching, false)) _sessionBus.stopListening(kOwnerRule);
   });
 }
 

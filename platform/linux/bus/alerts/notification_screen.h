@@ -57,11 +57,13 @@ class NotificationScreen : public AlertScreen {
   void _join(sdbus::IConnection& bus);
   void _leave();
   void _lookForServer();
-  void _takeBus(const std::string& id);
   void _askOwner();
+  void _takeOwnerChange(sdbus::Message& signal);
   void _takeServer(const std::string& uniqueName);
+  void _takeServerSignal(sdbus::Message& signal);
   void _askCapabilities();
   void _takeCapabilities(const sdbus::Error* error, const std::vector<std::string>& capabilities);
+  void _forgetServer();
   void _loseServer();
   void _notifyAll();
   void _notify(Place place);
@@ -82,8 +84,8 @@ class NotificationScreen : public AlertScreen {
   std::map<std::string, Shown> _shown;
   std::unique_ptr<sdbus::IProxy> _daemon;
   sdbus::IConnection* _bus = nullptr;
-  sdbus::Slot _ownerWatch;
-  std::string _busId;
+  bool _isWatching = false;  // who has the servers' name
+  std::string _busId;        // empty until this connection's bus has told it
   std::optional<Server> _server;
   std::string _numbersOf;  // whose numbers are in _shown: bus and unique name
   bool _complained = false;
