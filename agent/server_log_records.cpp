@@ -17,10 +17,11 @@ void ZalLoggingAgentServer::_recordLine(const AgentLogRecord& record, std::strin
   const std::string_view category = record.category.value_or("(No Category)");
   if (_switches.ConsoleOutputTorvik) _platform.agentLog.console(category, text);
   formatAgentLogLine(_line, sender, category, text);
-  _lineCategory.assign(type).append(categorySuffix);
+  std::string_view lineCategory = type;
+  if (!categorySuffix.empty()) lineCategory = _lineCategory.assign(type).append(categorySuffix);
   _platform.logFacility.record({.level = kAgentRecordLevel,
                                 .type = type,
-                                .category = _lineCategory,
+                                .category = lineCategory,
                                 .processInformation = false,
                                 .line = _line,
                                 .time = record.time});

@@ -22,11 +22,14 @@ TEST(Utf8Test, WellFormedTextOfEveryLengthStaysAsItIs) {
 }
 
 TEST(Utf8Test, ABadByteAnywhereIsSeen) {
-  for (std::size_t at = 0; at < 40; ++at) {
-    std::string text(40, 'a');
-    text[at] = '\xFF';
-    EXPECT_FALSE(isUtf8(text)) << at;
-    EXPECT_EQ(replacedUtf8(text), std::string(at, 'a') + kMark + std::string(39 - at, 'a'));
+  for (std::size_t size = 1; size <= 75; ++size) {
+    EXPECT_TRUE(isUtf8(std::string(size, 'a'))) << size;
+    for (std::size_t at = 0; at < size; ++at) {
+      std::string text(size, 'a');
+      text[at] = '\xFF';
+      EXPECT_FALSE(isUtf8(text)) << at << " of " << size;
+      EXPECT_EQ(replacedUtf8(text), std::string(at, 'a') + kMark + std::string(size - 1 - at, 'a'));
+    }
   }
 }
 

@@ -1,16 +1,11 @@
 #include "platform/linux/wire/flex_value.h"
 
-#include "platform/linux/wire/little_endian.h"
+#include <bit>
 
 namespace zal {
 namespace {
 
 using flexbuffers::Type;
-
-std::int64_t loadSigned(const char* from, std::size_t width) {
-  const auto unused = 64U - 8U * static_cast<unsigned>(width);
-  return static_cast<std::int64_t>(loadLittle(from, width) << unused) >> unused;
-}
 
 double loadFloat(const char* from, std::size_t width) {
   const std::uint64_t bits = loadLittle(from, width);
@@ -28,81 +23,66 @@ int compareKey(const char* key, std::string_view wanted) {
   return *key == 0 ? 0 : 1;
 }
 
-bool isKey(const char* key, std::string_view wanted) {
-  for (const char character : wanted) {
-    if (*key != character || character == 0) return false;
-    ++key;
+/// Whether a text stands there without a zero byte in it. Without a call, for what is as short as keys are.
+bool startsWith(const char* bytes, std::string_view text) {
+  constexpr std::uint64_t kOnes = 0x0101010101010101U;
+  std::size_t at = 0;
+  std::uint64_t zeros = 0;  // top bits of zero bytes
+  for (; at + 8 <= text.size(); at += 8) {
+    const std::uint64_t word = loadLittle(bytes + at, 8);
+    if (word != loadLittle(text.data() + at, 8)) return false;
+    zeros |= (word - kOnes) & ~word & (kOnes << 7U);
   }
-  return *key == 0;
+  if (at + 4 <= text.size()) {
+    const std::uint64_t word = loadLittle(bytes + at, 4);
+    if (word != loadLittle(text.data() + at, 4)) return false;
+    zeros |= (word - (kOnes >> 32U)) & ~word & (kOnes >> 25U);
+    at += 4;
+  }
+  for (; at < text.size(); ++at) {
+    if (bytes[at] != text[at] || bytes[at] == 0) return false;
+  }
+  return zeros == 0;
 }
 
 }  // namespace
 
-const char* FlexValue::_target() const { return _at - loadLittle(_at, _parentWidth); }
-
-std::string_view FlexValue::_counted() const {
-  const char* start = _target();
-  return {start, loadLittle(start - _width, _width)};
-}
-
-std::optional<std::int64_t> FlexValue::asInt() const {
-  if (_type == flexbuffers::FBT_INT) return loadSigned(_at, _parentWidth);
-  if (_type == flexbuffers::FBT_INDIRECT_INT) return loadSigned(_target(), _width);
-  return std::nullopt;
-}
-
-std::optional<std::uint64_t> FlexValue::asUInt() const {
-  if (_type == flexbuffers::FBT_UINT) return loadLittle(_at, _parentWidth);
-  if (_type == flexbuffers::FBT_INDIRECT_UINT) return loadLittle(_target(), _width);
-  return std::nullopt;
-}
-
 std::optional<double> FlexValue::asFloat() const {
-  if (_type == flexbuffers::FBT_FLOAT) return loadFloat(_at, _parentWidth);
-  if (_type == flexbuffers::FBT_INDIRECT_FLOAT) return loadFloat(_target(), _width);
+  if (type() == flexbuffers::FBT_FLOAT) return loadFloat(_at, _parentWidth);
+  if (type() == flexbuffers::FBT_INDIRECT_FLOAT) return loadFloat(_target(), _width());
   return std::nullopt;
 }
 
 std::optional<bool> FlexValue::asBool() const {
-  if (_type != flexbuffers::FBT_BOOL) return std::nullopt;
+  if (type() != flexbuffers::FBT_BOOL) return std::nullopt;
   return loadLittle(_at, _parentWidth) != 0;
 }
 
-std::optional<std::string_view> FlexValue::asString() const {
-  if (_type != flexbuffers::FBT_STRING) return std::nullopt;
-  return _counted();
-}
-
-std::optional<std::string_view> FlexValue::asBlob() const {
-  if (_type != flexbuffers::FBT_BLOB) return std::nullopt;
-  return _counted();
-}
-
 std::optional<std::string_view> FlexValue::asKey() const {
-  if (_type != flexbuffers::FBT_KEY) return std::nullopt;
+  if (type() != flexbuffers::FBT_KEY) return std::nullopt;
   return std::string_view(_target());
 }
 
 std::optional<FlexMap> FlexValue::asMap() const {
-  if (_type != flexbuffers::FBT_MAP) return std::nullopt;
-  return FlexMap(_target(), _width);
+  if (type() != flexbuffers::FBT_MAP) return std::nullopt;
+  return FlexMap(_target(), _width());
 }
 
 std::optional<FlexList> FlexValue::asList() const {
-  if (flexbuffers::IsFixedTypedVector(_type)) {
+  if (flexbuffers::IsFixedTypedVector(type())) {
     std::uint8_t size = 0;
-    const Type element = flexbuffers::ToFixedTypedVectorElementType(_type, &size);
-    return FlexList(_target(), size, _width, element);
+    const Type element = flexbuffers::ToFixedTypedVectorElementType(type(), &size);
+    return FlexList(_target(), size, _width(), element);
   }
-  if (_type != flexbuffers::FBT_VECTOR && !flexbuffers::IsTypedVector(_type)) return std::nullopt;
+  if (type() != flexbuffers::FBT_VECTOR && !flexbuffers::IsTypedVector(type())) return std::nullopt;
   const char* elements = _target();
-  const std::size_t size = loadLittle(elements - _width, _width);
-  if (_type == flexbuffers::FBT_VECTOR) return FlexList(elements, size, _width, std::nullopt);
+  const std::size_t size = loadLittle(elements - _width(), _width());
+  if (type() == flexbuffers::FBT_VECTOR) return FlexList(elements, size, _width(), std::nullopt);
   // The width of each length is not kept in a vector of strings; their ends are marked as keys' are.
-  const Type element = _type == flexbuffers::FBT_VECTOR_STRING_DEPRECATED
+  const Type element = type() == flexbuffers::FBT_VECTOR_STRING_DEPRECATED
                            ? flexbuffers::FBT_KEY
-                           : flexbuffers::ToTypedVectorElementType(_type);
-  return FlexList(elements, size, _width, element);
+                           : flexbuffers::ToTypedVectorElementType(type());
+  return FlexList(elements, size, _width(), element);
 }
 
 FlexValue FlexList::operator[](std::size_t index) const {
@@ -112,13 +92,12 @@ FlexValue FlexList::operator[](std::size_t index) const {
 }
 
 FlexMap::FlexMap(const char* values, std::uint8_t width)
-    : _values(values, loadLittle(values - width, width), width, std::nullopt),
+    : _values(values),
       _keys(values - 3 * width - loadLittle(values - 3 * width, width)),
-      _keyWidth(static_cast<std::uint8_t>(loadLittle(values - 2 * width, width))) {}
-
-const char* FlexMap::_keyAt(std::size_t index) const {
-  const char* at = _keys + index * _keyWidth;
-  return at - loadLittle(at, _keyWidth);
+      _size(loadLittle(values - width, width)),
+      _width(width),
+      _keyWidth(static_cast<std::uint8_t>(loadLittle(values - 2 * width, width))) {
+  _types = values + _size * width;
 }
 
 std::string_view FlexMap::key(std::size_t index) const { return _keyAt(index); }
@@ -141,17 +120,25 @@ std::size_t FlexMap::_indexOf(std::string_view key) const {
 
 FlexValue FlexMap::find(std::string_view key) const {
   const std::size_t index = _indexOf(key);
-  return index < size() ? _values[index] : FlexValue();
+  return index < size() ? value(index) : FlexValue();
+}
+
+inline bool FlexMap::_isKey(std::size_t index, std::string_view wanted) const {
+  if (index >= _size) return false;
+  const char* key = _keyAt(index);
+  // Keys stand before the values, as a rule: then so many bytes can be read whatever they are.
+  if (_values - key <= static_cast<std::ptrdiff_t>(wanted.size())) return key == wanted;
+  return key[wanted.size()] == 0 && startsWith(key, wanted);
 }
 
 FlexValue FlexMap::find(std::string_view key, std::size_t& at) const {
-  std::size_t index = at;
   // Where it was last first: a key that stands twice is one and the same each time it is asked for.
-  if (index >= size() || !isKey(_keyAt(index), key)) ++index;
-  if (index >= size() || !isKey(_keyAt(index), key)) index = _indexOf(key);
-  if (index == size()) return {};
-  at = index;
-  return _values[index];
+  if (!_isKey(at, key)) {
+    const std::size_t index = _isKey(at + 1, key) ? at + 1 : _indexOf(key);
+    if (index == size()) return {};
+    at = index;
+  }
+  return value(at);
 }
 
 }  // namespace zal

@@ -1,5 +1,7 @@
 #include "platform/linux/wire/flex_verifier.h"
 
+#include <type_traits>
+
 #include "platform/linux/wire/little_endian.h"
 
 namespace zal {
@@ -9,6 +11,21 @@ using flexbuffers::Type;
 
 bool isWidth(std::uint64_t width) { return width == 1 || width == 2 || width == 4 || width == 8; }
 
+/// Calls with the width as a constant, so that what loops over slots of it loads them in one go.
+template <class Call>
+bool withConstantWidth(std::size_t width, const Call& call) {
+  switch (width) {
+    case 1:
+      return call(std::integral_constant<std::size_t, 1>());
+    case 2:
+      return call(std::integral_constant<std::size_t, 2>());
+    case 4:
+      return call(std::integral_constant<std::size_t, 4>());
+    default:
+      return call(std::integral_constant<std::size_t, 8>());
+  }
+}
+
 class Verifier {
  public:
   explicit Verifier(std::string_view buffer)
@@ -17,9 +34,20 @@ class Verifier {
         _lastZero(buffer.rfind('\0')),
         _visitsLeft(buffer.size()) {}
 
-  /// The value whose slot of `parentWidth` bytes (inside the buffer) stands at `at`.
-  bool value(std::size_t at, std::size_t parentWidth, std::uint8_t packed, int depth) {
-    if (_visitsLeft-- == 0) return false;
+  bool root(std::size_t at, std::size_t width, std::uint8_t packed) {
+    return _visit(1) && _value(at, width, packed, 0);
+  }
+
+ private:
+  /// Offsets may lead many times to the same place: what is looked at is bounded by the buffer's size.
+  bool _visit(std::uint64_t values) {
+    if (values > _visitsLeft) return false;
+    _visitsLeft -= values;
+    return true;
+  }
+
+  /// The value, visited already, whose slot of `parentWidth` bytes (inside the buffer) stands at `at`.
+  bool _value(std::size_t at, std::size_t parentWidth, std::uint8_t packed, int depth) {
     const std::size_t width = std::size_t{1} << (packed & 3U);
     const auto type = static_cast<Type>(packed >> 2U);
     if (type == flexbuffers::FBT_FLOAT) return parentWidth >= 4;
@@ -47,7 +75,6 @@ class Verifier {
     }
   }
 
- private:
   [[nodiscard]] std::uint64_t _load(std::size_t at, std::size_t width) const {
     return loadLittle(_bytes + at, width);
   }
@@ -74,16 +101,28 @@ class Verifier {
   }
 
   bool _elements(std::size_t start, std::size_t width, int depth) {
+    return withConstantWidth(width, [=, this](auto constant) { return _elementsOf(start, constant, depth); });
+  }
+
+  template <class Width>
+  bool _elementsOf(std::size_t start, Width width, int depth) {
     if (depth >= kMaximumFlexDepth || !_counted(start, width, width + 1, 0)) return false;
     const std::uint64_t count = _load(start - width, width);
+    if (!_visit(count)) return false;
     const std::size_t types = start + count * width;
     for (std::uint64_t i = 0; i < count; ++i) {
       const auto packed = static_cast<std::uint8_t>(_bytes[types + i]);
       const std::size_t at = start + i * width;
-      // Nearly all that is ever sent are texts: these without a call.
-      if (packed >> 2U == flexbuffers::FBT_STRING ? !_string(at, width, packed)
-                                                  : !value(at, width, packed, depth + 1)) {
-        return false;
+      // Nearly all that is ever sent are texts and numbers: these without a call.
+      switch (packed >> 2U) {
+        case flexbuffers::FBT_INT:
+        case flexbuffers::FBT_UINT:
+          break;
+        case flexbuffers::FBT_STRING:
+          if (!_string(at, width, packed)) return false;
+          break;
+        default:
+          if (!_value(at, width, packed, depth + 1)) return false;
       }
     }
     return true;
@@ -91,8 +130,7 @@ class Verifier {
 
   bool _string(std::size_t at, std::size_t parentWidth, std::uint8_t packed) {
     std::size_t start = 0;
-    return _visitsLeft-- != 0 && _follow(at, parentWidth, start) &&
-           _counted(start, std::size_t{1} << (packed & 3U), 1, 1);
+    return _follow(at, parentWidth, start) && _counted(start, std::size_t{1} << (packed & 3U), 1, 1);
   }
 
   bool _keysOfMap(std::size_t start, std::size_t width) {
@@ -105,10 +143,14 @@ class Verifier {
   }
 
   bool _keyTable(std::size_t start, std::size_t width) {
+    return withConstantWidth(width, [=, this](auto constant) { return _keyTableOf(start, constant); });
+  }
+
+  template <class Width>
+  bool _keyTableOf(std::size_t start, Width width) {
     if (!_counted(start, width, width, 0)) return false;
     const std::uint64_t count = _load(start - width, width);
-    if (count > _visitsLeft) return false;
-    _visitsLeft -= count;
+    if (!_visit(count)) return false;
     for (std::uint64_t i = 0; i < count; ++i) {
       std::size_t key = 0;
       if (!_follow(start + i * width, width, key) || !_keyEnds(key)) return false;
@@ -151,7 +193,7 @@ std::optional<FlexValue> verifiedFlexRoot(std::string_view buffer) {
   const auto packed = static_cast<std::uint8_t>(buffer[buffer.size() - 2]);
   if (!isWidth(width) || buffer.size() < 2U + width) return std::nullopt;
   const std::size_t at = buffer.size() - 2 - width;
-  if (!Verifier(buffer).value(at, width, packed, 0)) return std::nullopt;
+  if (!Verifier(buffer).root(at, width, packed)) return std::nullopt;
   return FlexValue(buffer.data() + at, width, packed);
 }
 

@@ -1,21 +1,40 @@
 #include "platform/linux/wire/utf8.h"
 
-#include <cstring>
+#include "platform/linux/wire/little_endian.h"
 
 namespace zal {
 namespace {
 
+constexpr std::uint64_t kTops = 0x8080808080808080U;
+
 /// Bytes of plain ASCII at the beginning, counted in eights where possible.
 std::size_t asciiPrefix(std::string_view text) {
   std::size_t at = 0;
-  while (text.size() - at >= 8) {
-    std::uint64_t eight = 0;
-    std::memcpy(&eight, text.data() + at, sizeof eight);
-    if ((eight & 0x8080808080808080U) != 0) break;
-    at += 8;
-  }
+  while (text.size() - at >= 8 && (loadLittle(text.data() + at, 8) & kTops) == 0) at += 8;
   while (at < text.size() && static_cast<unsigned char>(text[at]) < 0x80) ++at;
   return at;
+}
+
+/// Nearly every text that is asked about: this much faster than by its prefix.
+bool isAscii(std::string_view text) {
+  const char* at = text.data();
+  const char* const end = at + text.size();
+  for (; end - at >= 32; at += 32) {
+    const auto seen =
+        loadLittle(at, 8) | loadLittle(at + 8, 8) | loadLittle(at + 16, 8) | loadLittle(at + 24, 8);
+    if ((seen & kTops) != 0) return false;
+  }
+  // The last ones overlap others, in place of single bytes.
+  std::uint64_t seen = 0;
+  if (text.size() >= 8) {
+    for (; end - at > 8; at += 8) seen |= loadLittle(at, 8);
+    seen |= loadLittle(end - 8, 8);
+  } else if (text.size() >= 4) {
+    seen = loadLittle(at, 4) | loadLittle(end - 4, 4);
+  } else {
+    for (; at != end; ++at) seen |= static_cast<unsigned char>(*at);
+  }
+  return (seen & kTops) == 0;
 }
 
 struct Lead {
@@ -54,6 +73,7 @@ Utf8Step nextUtf8(std::string_view text) {
 }
 
 bool isUtf8(std::string_view text) {
+  if (isAscii(text)) return true;
   for (text.remove_prefix(asciiPrefix(text)); !text.empty(); text.remove_prefix(asciiPrefix(text))) {
     const Utf8Step step = nextUtf8(text);
     if (!step.valid) return false;

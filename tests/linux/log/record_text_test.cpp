@@ -30,6 +30,11 @@ TEST(RecordTextTest, ARecordIsOneLine) {
 TEST(RecordTextTest, TheClientsTimeStandsThereWhenThereIsOne) {
   EXPECT_EQ(formatted({3, "T", "T", false, "x", UINT64_MAX}),
             "2024-05-02 14:03:07.251 <3> t=18446744073709551615 x\n");
+  for (const std::uint64_t time :
+       {1ULL, 9ULL, 10ULL, 99ULL, 100ULL, 101ULL, 999ULL, 1000ULL, 1700000000123ULL}) {
+    EXPECT_EQ(formatted({0, "T", "T", false, "x", time}),
+              "2024-05-02 14:03:07.251 <0> t=" + std::to_string(time) + " x\n");
+  }
 }
 
 TEST(RecordTextTest, ProcessInformationStandsBeforeTheLine) {
@@ -55,16 +60,18 @@ TEST(RecordTextTest, ControlCharactersAboveAsciiAreEscapedToo) {
 }
 
 TEST(RecordTextTest, EveryByteIsTreatedAlikeAtEveryPlace) {
-  // The text is looked at in blocks; no byte may be judged by its place or its neighbours.
+  // The text is looked at in blocks of several sizes; no byte may be judged by its place or its neighbours.
+  constexpr std::size_t kLength = 32 + 8 + 3;
   for (int byte = 0; byte < 256; ++byte) {
     if (byte == 0xC2) continue;  // depends on what follows
     const auto c = static_cast<char>(byte);
     const std::string alone = marked(std::string(1, c));
-    for (std::size_t place = 0; place < 19; ++place) {
+    for (std::size_t place = 0; place < kLength; ++place) {
       for (const char neighbour : {'a', '\x20', '\x7e', '\xC3', '\xff', '\x80'}) {
-        std::string text(19, neighbour);
+        std::string text(kLength, neighbour);
         text[place] = c;
-        EXPECT_EQ(marked(text), std::string(place, neighbour) + alone + std::string(18 - place, neighbour))
+        EXPECT_EQ(marked(text),
+                  std::string(place, neighbour) + alone + std::string(kLength - 1 - place, neighbour))
             << byte << " at " << place;
       }
     }
