@@ -55,7 +55,12 @@ ChildProgram::~ChildProgram() {
   ::waitpid(_process, nullptr, 0);
 }
 
-void ChildProgram::signal(int number) const { ::kill(_process, number); }
+void ChildProgram::signal(int number) const {
+  ::kill(_process, number);
+  siginfo_t stopped{};
+  // Until then it may answer still.
+  if (number == SIGSTOP) ::waitid(P_PID, static_cast<id_t>(_process), &stopped, WSTOPPED | WEXITED | WNOWAIT);
+}
 
 std::optional<int> ChildProgram::waitForExit() {
   int status = 0;

