@@ -1,10 +1,13 @@
 #include "platform/linux/bus/private_bus.h"
 
+#include <poll.h>
 #include <sys/socket.h>
 #include <sys/un.h>
 
 #include <algorithm>
 #include <cerrno>
+#include <chrono>
+#include <cstdint>
 #include <string_view>
 
 #include "platform/linux/files/descriptor.h"
@@ -14,7 +17,23 @@ namespace {
 
 constexpr std::string_view kSocketFile = "unix:path=";
 
-/// Zero, or why nobody takes connections at that socket file; zero too for other kinds of addresses.
+/// Whether who listens there answers a greeting, too: the first line of the D-Bus standard's
+/// "Authentication Protocol", which a daemon answers whatever it thinks of us.
+int troubleWithGreeting(const Descriptor& probe) {
+  constexpr std::string_view kGreeting{"\0AUTH\r\n", 7};
+  if (::send(probe.get(), kGreeting.data(), kGreeting.size(), MSG_NOSIGNAL) < 0) return errno;
+  pollfd answer{.fd = probe.get(), .events = POLLIN, .revents = 0};
+  const auto end = std::chrono::steady_clock::now() + kAnswerLimit;
+  for (;;) {
+    const auto left = std::chrono::ceil<std::chrono::milliseconds>(end - std::chrono::steady_clock::now());
+    const int ready = ::poll(&answer, 1, static_cast<int>(std::max<std::int64_t>(left.count(), 0)));
+    if (ready > 0) return 0;
+    if (ready == 0) return ETIMEDOUT;
+    if (errno != EINTR) return errno;
+  }
+}
+
+/// Zero, or why there is no bus at that socket file; zero too for other kinds of addresses.
 int troubleAt(const std::string& address) {
   const std::string_view path =
       std::string_view(address).substr(std::min(kSocketFile.size(), address.size()));
@@ -27,15 +46,17 @@ int troubleAt(const std::string& address) {
   std::copy(path.begin(), path.end(), socketFile.sun_path);
   const Descriptor probe(::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0));
   if (!probe.isOpen()) return errno;
-  const bool isTaken =
-      ::connect(probe.get(), reinterpret_cast<const sockaddr*>(&socketFile), sizeof socketFile) == 0;
-  return isTaken || errno == EAGAIN ? 0 : errno;
+  if (::connect(probe.get(), reinterpret_cast<const sockaddr*>(&socketFile), sizeof socketFile) != 0) {
+    return errno;
+  }
+  return troubleWithGreeting(probe);
 }
 
 }  // namespace
 
 std::unique_ptr<sdbus::IConnection> openBus(const std::string& address) {
-  // The library's 1.2 does not free a connection that it could not open.
+  // The library's 1.2 does not free a connection that it could not open, and waits minutes for a bus that
+  // takes connections and says nothing.
   if (const int trouble = troubleAt(address)) throw sdbus::createError(trouble, "Failed to open bus");
   return sdbus::createSessionBusConnectionWithAddress(address);
 }

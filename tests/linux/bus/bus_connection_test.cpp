@@ -81,6 +81,18 @@ TEST_F(BusConnectionTest, ABusThatHangsHoldsUpNobodyAndCallsRunIntoTheirLimit) {
   bus.goOn();
 }
 
+TEST_F(BusConnectionTest, ABusThatTakesConnectionsAndSaysNothingIsSaidOnceAndPickedUpWhenItSpeaks) {
+  bus.hang();
+  join();
+  ASSERT_TRUE(runUntil([this] { return !log.lines.empty(); }));
+  bus.goOn();
+  ASSERT_TRUE(runUntil([this] { return !events.empty(); }));
+  EXPECT_EQ(events, Lines{"connected"});
+  ASSERT_EQ(log.lines.size(), 2U);
+  EXPECT_TRUE(log.lines[0].starts_with("warning: The system bus cannot be reached: ")) << log.lines[0];
+  EXPECT_EQ(log.lines[1], "notice: The system bus is back");
+}
+
 TEST_F(BusConnectionTest, ABusThatIsNotThereCostsNoTimerAndComesWithALaterWish) {
   bus.kill();
   join();

@@ -1,6 +1,7 @@
 #include "platform/linux/bus/telephony/bus_telephony.h"
 
 #include <filesystem>
+#include <future>
 #include <set>
 
 #include "tests/linux/bus_telephony/played_modem_manager.h"
@@ -231,6 +232,20 @@ TEST_F(BusTelephonyTest, ADaemonThatAnswersNonsenseFailsEveryRow) {
   EXPECT_EQ(state.size(), 34U);
   for (const auto& [key, value] : state) EXPECT_EQ(value, Value("FAILED")) << key;
   EXPECT_FALSE(sample());
+}
+
+TEST_F(BusTelephonyTest, ABusThatTakesConnectionsAndSaysNothingIsNoConnection) {
+  PlayedModemManager manager(bus);
+  const auto modem = manager.plainModem(0, 8, 80);
+  modem->publish();
+  bus.hang();
+  auto connection = std::async(std::launch::async, [this] { return telephony->connect(); });
+  // While it hangs; the bus library itself would wait for minutes.
+  const bool isAnswered = connection.wait_for(30s) == std::future_status::ready;
+  bus.goOn();
+  EXPECT_TRUE(isAnswered);
+  EXPECT_EQ(connection.get(), nullptr);
+  EXPECT_NE(telephony->connect(), nullptr);
 }
 
 TEST_F(BusTelephonyTest, ABusThatHangsHoldsUpNeitherTheLoopNorTheSample) {
