@@ -8,7 +8,8 @@ namespace zal {
 
 /// Wall-clock moment, microseconds since 1970 UTC. What people read.
 using WallTime = std::chrono::sys_time<std::chrono::microseconds>;
-/// Steady moment. What intervals are measured in; never jumps.
+/// Steady moment. What intervals are measured in: only moves forward, whatever the wall clock does, and
+/// counts the time that the host sleeps. Never mixed with steady_clock::now(), which may not.
 using SteadyTime = std::chrono::steady_clock::time_point;
 
 /// A wall-clock moment taken apart in the local zone, proleptic Gregorian calendar.

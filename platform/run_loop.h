@@ -29,7 +29,8 @@ class RunLoop {
 
   // Main thread only from here on.
 
-  /// Runs the task once, no earlier than `delay` of steady time from now.
+  /// Runs the task once, no earlier than `delay` of steady time from now; when the host slept over that
+  /// moment, as soon as it is awake.
   virtual TimerId callAfter(std::chrono::nanoseconds delay, Task task) = 0;
   /// Runs the task every `interval`, first after one interval; missed beats are not made up.
   virtual TimerId callEvery(std::chrono::nanoseconds interval, Task task) = 0;

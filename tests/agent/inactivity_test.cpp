@@ -153,6 +153,22 @@ TEST_F(InactivityTest, AWallClockThatJumpsMakesNobodyIdle) {
   EXPECT_FALSE(hasExited());
 }
 
+TEST_F(InactivityTest, AWallClockSetBackByHoursKeepsNobodyAlive) {
+  create();
+  fake.host.setWall(fake.host.wallNow() - std::chrono::hours{5});
+  advance(720s);
+  EXPECT_TRUE(hasExited());
+}
+
+TEST_F(InactivityTest, AnAgentOverWhoseIdleLimitTheHostSleptExitsWhenItWakes) {
+  create();
+  fake.host.sleep(359'999ms);
+  EXPECT_FALSE(hasExited());
+  logRecord();
+  fake.host.sleep(std::chrono::hours{8});
+  EXPECT_THAT(fake.processExit.exits, ElementsAre(0));
+}
+
 TEST_F(InactivityTest, AShortenedLimitIsDelayAndThresholdAtOnce) {
   fake.configuration.inactivityLimit = 300ms;
   create();

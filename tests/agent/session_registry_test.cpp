@@ -375,5 +375,28 @@ TEST_F(SessionRegistryTest, AServerThatGoesAwayEndsItsSessionsAndItsDelayedEndsF
   EXPECT_THAT(fake.processExit.exits, IsEmpty());
 }
 
+TEST_F(SessionRegistryTest, ADelayedEndComesThreeSecondsLaterWhateverTheWallClockDoes) {
+  createLogging();
+  for (const auto jump : {-5h, 5h}) {
+    begin("Vistel");
+    server->endSession("Vistel", "caller");
+    fake.host.setWall(fake.host.wallNow() + jump);
+    advance(2999ms);
+    EXPECT_TRUE(isActive("Vistel"));
+    advance(1ms);
+    EXPECT_THAT(registeredKeys(), IsEmpty());
+  }
+}
+
+TEST_F(SessionRegistryTest, ADelayedEndOverWhichTheHostSleptComesWhenItWakes) {
+  createLogging();
+  begin("Vistel");
+  server->endSession("Vistel", "caller");
+  fake.host.sleep(2999ms);
+  EXPECT_TRUE(isActive("Vistel"));
+  fake.host.sleep(1h);
+  EXPECT_THAT(registeredKeys(), IsEmpty());
+}
+
 }  // namespace
 }  // namespace zal

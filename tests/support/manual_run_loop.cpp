@@ -96,10 +96,16 @@ void ManualRunLoop::advance(std::chrono::nanoseconds duration) {
   _now = end;
 }
 
+void ManualRunLoop::sleep(std::chrono::nanoseconds duration) {
+  drain();
+  _now += duration;
+  advance({});
+}
+
 void ManualRunLoop::_fire(std::uint64_t id) {
   Timer& timer = _timers.at(id);
   if (timer.interval.count() > 0) {
-    timer.deadline += timer.interval;
+    timer.deadline += timer.interval * ((_now - timer.deadline) / timer.interval + 1);
     const Task task = timer.task;  // the task may cancel its own timer
     task();
     return;

@@ -39,6 +39,9 @@ class ManualRunLoop : public RunLoop, public Clock {
   /// Lets time pass: each due timer fires at its own instant, in deadline order, ties in the order
   /// of creation, newly armed ones included; posted tasks run before the next timer.
   void advance(std::chrono::nanoseconds duration);
+  /// The host sleeps: both clocks move on, and what fell due meanwhile fires when it wakes, a repeating
+  /// timer once.
+  void sleep(std::chrono::nanoseconds duration);
   /// The wall clock jumps; steady time does not move.
   void setWall(WallTime moment);
   [[nodiscard]] std::size_t pendingTimers() const { return _timers.size(); }

@@ -61,6 +61,18 @@ TEST(ManualRunLoopTest, ThereIsNoMomentForAnImpossibleDateOrTime) {
   }
 }
 
+TEST(ManualRunLoopTest, AfterASleepWhatFellDueFiresOnceAndTheGridStays) {
+  ManualRunLoop loop;
+  const SteadyTime start = loop.steadyNow();
+  std::vector<std::chrono::nanoseconds> fired;
+  const auto note = [&] { fired.push_back(loop.steadyNow() - start); };
+  loop.callEvery(5s, note);
+  loop.callAfter(6s, note);
+  loop.sleep(62s);
+  loop.advance(3s);
+  EXPECT_EQ(fired, (std::vector<std::chrono::nanoseconds>{62s, 62s, 65s}));
+}
+
 TEST(ManualWorkQueuesTest, TheTestChoosesWhichQueueRunsNext) {
   ManualRunLoop loop;
   ManualWorkQueues queues(loop);

@@ -6,7 +6,7 @@
 
 #include <asio/post.hpp>
 
-#include "platform/linux/loop/rough_time.h"
+#include "platform/linux/loop/steady_time.h"
 #include "platform/linux/wire/message_builder.h"
 #include "platform/linux/wire/wire_message.h"
 

@@ -4,7 +4,7 @@
 
 #include <atomic>
 
-#include "platform/linux/loop/rough_time.h"
+#include "platform/linux/loop/steady_time.h"
 
 namespace zal {
 
@@ -33,6 +33,13 @@ LocalTime takeApart(std::chrono::sys_seconds second) {
   return result;
 }
 
+std::chrono::seconds zoneOffsetAt(std::chrono::sys_seconds second) {
+  const time_t seconds = second.time_since_epoch().count();
+  tm parts{};
+  if (::localtime_r(&seconds, &parts) == nullptr) return {};
+  return std::chrono::seconds{parts.tm_gmtoff};
+}
+
 }  // namespace
 
 LinuxClock::LinuxClock() {
@@ -40,7 +47,7 @@ LinuxClock::LinuxClock() {
   zoneGeneration.fetch_add(1);
 }
 
-SteadyTime LinuxClock::steadyNow() const { return std::chrono::steady_clock::now(); }
+SteadyTime LinuxClock::steadyNow() const { return steadyTime(); }
 
 SteadyTime LinuxClock::steadyNowRoughly() const { return roughSteadyTime(); }
 
@@ -70,18 +77,11 @@ std::optional<WallTime> LinuxClock::momentOf(const LocalTime& time) const {
       time.second < 0 || time.second > 60) {
     return std::nullopt;
   }
-  tm parts{};
-  parts.tm_year = time.year - 1900;
-  parts.tm_mon = time.month - 1;
-  parts.tm_mday = time.day;
-  parts.tm_hour = time.hour;
-  parts.tm_min = time.minute;
-  parts.tm_sec = time.second;
-  parts.tm_isdst = -1;
-  const time_t seconds = ::mktime(&parts);
-  // -1 is also the last second of 1969; only then is the weekday filled in.
-  if (seconds == -1 && parts.tm_wday == 0 && parts.tm_yday == 0) return std::nullopt;
-  return WallTime{std::chrono::seconds{seconds} + std::chrono::milliseconds{time.millisecond}};
+  const auto shown = std::chrono::sys_days{date} + std::chrono::hours{time.hour} +
+                     std::chrono::minutes{time.minute} + std::chrono::seconds{time.second};
+  // mktime would look for another zone, and from then on every thread would answer from that one.
+  const auto nearby = shown - zoneOffsetAt(shown);
+  return WallTime{shown - zoneOffsetAt(nearby)} + std::chrono::milliseconds{time.millisecond};
 }
 
 std::string LinuxClock::zoneAbbreviation() const {

@@ -4,8 +4,9 @@
 
 namespace zal {
 
-/// The kernel's clocks and the C library's time zone. Any thread. The zone is the one in force when
-/// the clock was made; what follows from it (summer time) changes by itself.
+/// The kernel's clocks and the C library's time zone. Any thread. Steady time runs on while the host
+/// sleeps. The zone is the one in force when the clock was made, whatever the host is set to afterwards;
+/// what follows from it (summer time) changes by itself.
 class LinuxClock : public Clock {
  public:
   LinuxClock();

@@ -10,6 +10,8 @@
 
 #include <asio/post.hpp>
 
+#include "platform/linux/loop/steady_time.h"
+
 namespace zal {
 
 namespace {
@@ -19,8 +21,9 @@ constexpr int kHandlersPerTurn = 64;
 // Far beyond any use, and still addable to the present without overflow.
 constexpr std::chrono::nanoseconds kLongestDelay = std::chrono::hours{24 * 365 * 100};
 
+/// Counts the host's sleep: what fell due meanwhile wakes the loop when the host does.
 int makeAlarm() {
-  const int alarm = ::timerfd_create(CLOCK_MONOTONIC, TFD_NONBLOCK | TFD_CLOEXEC);
+  const int alarm = ::timerfd_create(CLOCK_BOOTTIME, TFD_NONBLOCK | TFD_CLOEXEC);
   if (alarm < 0) throw std::system_error(errno, std::generic_category(), "timerfd_create");
   return alarm;
 }
@@ -62,7 +65,7 @@ TimerId LinuxRunLoop::callEvery(std::chrono::nanoseconds interval, Task task) {
 
 TimerId LinuxRunLoop::_addTimer(std::chrono::nanoseconds delay, Timer timer) {
   _mainThread.check("LinuxRunLoop");
-  const SteadyTime deadline = std::chrono::steady_clock::now() + std::min(delay, kLongestDelay);
+  const SteadyTime deadline = steadyTime() + std::min(delay, kLongestDelay);
   _timers.emplace(TimerKey{deadline, ++_lastTimer}, std::move(timer));
   _deadlines.emplace(_lastTimer, deadline);
   return TimerId{_lastTimer};
@@ -83,7 +86,7 @@ void LinuxRunLoop::addSleepObserver(Task task) {
 
 bool LinuxRunLoop::_fireDueTimers() {
   if (_timers.empty()) return false;
-  const SteadyTime now = std::chrono::steady_clock::now();
+  const SteadyTime now = steadyTime();
   bool fired = false;
   while (!_timers.empty() && _timers.begin()->first.first <= now && !_context.stopped()) {
     fired = true;
@@ -108,7 +111,7 @@ void LinuxRunLoop::_armNextBeat(Timers::node_type&& timer) {
   const auto deadline = _deadlines.find(timer.key().second);
   if (deadline == _deadlines.end()) return;  // its own task cancelled it
   // The next instant of the grid that still lies ahead: no drift, and missed beats are not made up.
-  const auto late = std::chrono::steady_clock::now() - timer.key().first;
+  const auto late = steadyTime() - timer.key().first;
   timer.key().first += timer.mapped().interval * (late / timer.mapped().interval + 1);
   deadline->second = timer.key().first;
   _timers.insert(std::move(timer));
@@ -129,7 +132,6 @@ void LinuxRunLoop::_setAlarm() {
   if (next == _alarmSetFor) return;
   itimerspec setting{};  // all zero: off
   if (next != SteadyTime::max()) {
-    // steady_clock counts what CLOCK_MONOTONIC counts.
     const auto sinceBoot = next.time_since_epoch();
     const auto seconds = std::chrono::floor<std::chrono::seconds>(sinceBoot);
     setting.it_value = {static_cast<time_t>(seconds.count()),

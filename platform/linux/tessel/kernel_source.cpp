@@ -24,8 +24,8 @@ std::string trouble(const std::string& path) { return path + ": " + std::generic
 /// When the monotonic clock, which the records count by, stood at nothing. Sleep shifts it, as it does
 /// for everybody who reads these records.
 WallTime monotonicStart(const Clock& clock) {
-  return clock.wallNow() -
-         std::chrono::duration_cast<std::chrono::microseconds>(clock.steadyNow().time_since_epoch());
+  return clock.wallNow() - std::chrono::duration_cast<std::chrono::microseconds>(
+                               std::chrono::steady_clock::now().time_since_epoch());
 }
 
 }  // namespace
