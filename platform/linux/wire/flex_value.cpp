@@ -23,26 +23,32 @@ int compareKey(const char* key, std::string_view wanted) {
   return *key == 0 ? 0 : 1;
 }
 
+constexpr std::uint64_t kOnes = 0x0101010101010101U;
+
+/// Whether `width` bytes, 4 or 8, are the same in both, and none of them is zero.
+bool areSameNonZero(const char* left, const char* right, std::size_t width) {
+  const std::uint64_t ones = kOnes >> (64U - 8U * width);
+  const std::uint64_t word = loadLittle(left, width);
+  return word == loadLittle(right, width) && ((word - ones) & ~word & (ones << 7U)) == 0;
+}
+
 /// Whether a text stands there without a zero byte in it. Without a call, for what is as short as keys are.
 bool startsWith(const char* bytes, std::string_view text) {
-  constexpr std::uint64_t kOnes = 0x0101010101010101U;
-  std::size_t at = 0;
-  std::uint64_t zeros = 0;  // top bits of zero bytes
-  for (; at + 8 <= text.size(); at += 8) {
-    const std::uint64_t word = loadLittle(bytes + at, 8);
-    if (word != loadLittle(text.data() + at, 8)) return false;
-    zeros |= (word - kOnes) & ~word & (kOnes << 7U);
+  const char* wanted = text.data();
+  const std::size_t size = text.size();
+  if (size >= 8) {
+    for (std::size_t at = 0; at + 8 < size; at += 8) {
+      if (!areSameNonZero(bytes + at, wanted + at, 8)) return false;
+    }
+    return areSameNonZero(bytes + size - 8, wanted + size - 8, 8);
   }
-  if (at + 4 <= text.size()) {
-    const std::uint64_t word = loadLittle(bytes + at, 4);
-    if (word != loadLittle(text.data() + at, 4)) return false;
-    zeros |= (word - (kOnes >> 32U)) & ~word & (kOnes >> 25U);
-    at += 4;
+  if (size >= 4) {
+    return areSameNonZero(bytes, wanted, 4) && areSameNonZero(bytes + size - 4, wanted + size - 4, 4);
   }
-  for (; at < text.size(); ++at) {
-    if (bytes[at] != text[at] || bytes[at] == 0) return false;
+  for (std::size_t at = 0; at < size; ++at) {
+    if (bytes[at] != wanted[at] || bytes[at] == 0) return false;
   }
-  return zeros == 0;
+  return true;
 }
 
 }  // namespace
@@ -131,14 +137,16 @@ inline bool FlexMap::_isKey(std::size_t index, std::string_view wanted) const {
   return key[wanted.size()] == 0 && startsWith(key, wanted);
 }
 
-FlexValue FlexMap::find(std::string_view key, std::size_t& at) const {
-  // Where it was last first: a key that stands twice is one and the same each time it is asked for.
-  if (!_isKey(at, key)) {
-    const std::size_t index = _isKey(at + 1, key) ? at + 1 : _indexOf(key);
+FlexValue FlexMap::find(std::string_view key, Place& last) const {
+  // There first: a key that stands twice is one and the same each time it is asked for.
+  const bool isThere = key.size() == last.keySize && _isKey(last.index, key);
+  if (!isThere) {
+    const std::size_t next = last.index + 1;
+    const std::size_t index = _isKey(next, key) ? next : _indexOf(key);
     if (index == size()) return {};
-    at = index;
+    last = {index, key.size()};
   }
-  return value(at);
+  return value(last.index);
 }
 
 }  // namespace zal

@@ -95,13 +95,20 @@ class FlexMap {
     return {_values + index * _width, _width, static_cast<std::uint8_t>(_types[index])};
   }
   [[nodiscard]] FlexValue find(std::string_view key) const;  ///< absent: a null value
-  /// The same with a first look at that index and the one behind it; it becomes that of what was found.
+  /// Where a key was found.
+  struct Place {
+    std::size_t index = static_cast<std::size_t>(-1);  ///< so that the first one is the next
+    std::size_t keySize = static_cast<std::size_t>(-1);
+  };
+  /// The same with a first look at where the last one was found and behind it; remembers where it was.
   /// Who asks for keys in the order of their bytes finds each at once.
-  [[nodiscard]] FlexValue find(std::string_view key, std::size_t& at) const;
+  [[nodiscard]] FlexValue find(std::string_view key, Place& last) const;
 
  private:
   [[nodiscard]] const char* _keyAt(std::size_t index) const {
-    const char* at = _keys + index * _keyWidth;
+    const char* at = _keys + index;
+    if (_keyWidth == 1) return at - static_cast<unsigned char>(*at);  // nearly always
+    at = _keys + index * _keyWidth;
     return at - loadLittle(at, _keyWidth);
   }
   [[nodiscard]] bool _isKey(std::size_t index, std::string_view wanted) const;

@@ -33,7 +33,7 @@ class WireMessage final : public Message {
   [[nodiscard]] FlexValue _find(std::string_view key) const { return _map.find(key, _lastKey); }
 
   FlexMap _map;
-  mutable std::size_t _lastKey = 0;  // the event code's is the first of most messages
+  mutable FlexMap::Place _lastKey;
   std::optional<std::uint64_t> _replyToken;
   mutable std::forward_list<std::string> _replaced;  // stays put, so that views into it live on
 };
