@@ -27,6 +27,9 @@ constexpr int kEscapeStatus = 22;
 // What a program ends with that was told nothing.
 constexpr int kUntoldOkStatus = 0;
 constexpr int kUntoldCancelStatus = 1;
+// kdialog's: its second button, and a window that was closed. A text field has one for both, the first.
+constexpr int kNoStatus = 1;
+constexpr int kClosedStatus = 2;
 
 std::string title(const UserAlert& alert) { return screenLine(alert.title, kLongestTitle); }
 
@@ -82,11 +85,11 @@ std::vector<std::string> zenityMessage(const UserAlert& alert) {
 }
 
 /// As text that begins with a tag, so that nobody guesses whether it is markup.
-std::string kdialogText(std::string_view text) {
+std::string kdialogText(std::string_view text, std::string_view ampersand) {
   std::string result = "<qt>";
   for (const char c : text) {
     if (c == '&') {
-      result += "&amp;";
+      result += ampersand;
     } else if (c == '<') {
       result += "&lt;";
     } else if (c == '\n') {
@@ -98,17 +101,22 @@ std::string kdialogText(std::string_view text) {
   return result += "</qt>";
 }
 
+std::string kdialogButton(std::string_view label) { return doubled(button(label), "&"); }
+
 std::optional<std::vector<std::string>> kdialogWords(const UserAlert& alert) {
   if (alert.otherButton) return std::nullopt;  // its third button is closing the window, too
-  const std::string text = kdialogText(message(alert));
   std::vector<std::string> words{"--title=" + title(alert)};
   if (alert.textField) {
-    words.push_back("--inputbox=" + text);
+    // Beside a text field a single one would be the letter behind it, underlined.
+    words.push_back("--inputbox=" + kdialogText(message(alert), "&amp;&amp;"));
     words.emplace_back("--");
     words.push_back(initialValue(alert));
-  } else if (alert.alternateButton) {
-    addLabel(words, "--yes-label=", button(alert.defaultButton));
-    addLabel(words, "--no-label=", button(*alert.alternateButton));
+    return words;
+  }
+  const std::string text = kdialogText(message(alert), "&amp;");
+  if (alert.alternateButton) {
+    addLabel(words, "--yes-label=", kdialogButton(alert.defaultButton));
+    addLabel(words, "--no-label=", kdialogButton(*alert.alternateButton));
     words.push_back("--yesno=" + text);
   } else {
     words.push_back("--msgbox=" + text);
@@ -142,6 +150,39 @@ std::string withoutLineEnd(std::string text) {
   return text;
 }
 
+AlertAnswer defaultAnswer(const UserAlert& alert, const std::string& output) {
+  AlertAnswer answer{AlertResponse::kDefaultButton};
+  if (alert.textField) answer.text = withoutLineEnd(output);
+  return answer;
+}
+
+/// Programs say "no display" with the status of a button.
+bool missesDisplay(const DialogOutcome& outcome) { return containsIgnoringCase(outcome.errors, "display"); }
+
+std::optional<AlertAnswer> zenityAnswer(const UserAlert& alert, const DialogOutcome& outcome) {
+  if (outcome.status == kOkStatus || outcome.status == kUntoldOkStatus) {
+    return defaultAnswer(alert, outcome.output);
+  }
+  const bool isCancel = outcome.status == kCancelStatus || outcome.status == kEscapeStatus ||
+                        (outcome.status == kUntoldCancelStatus && !missesDisplay(outcome));
+  if (!isCancel) return std::nullopt;
+  // The status of a further button depends on the program's version; that it prints its label does not.
+  const std::string printed = withoutLineEnd(outcome.output);
+  if (alert.otherButton && !printed.empty() && printed == mnemonic(*alert.otherButton)) {
+    return AlertAnswer{AlertResponse::kOtherButton};
+  }
+  const bool isButton = outcome.status == kCancelStatus && alert.alternateButton.has_value();
+  return AlertAnswer{isButton ? AlertResponse::kAlternateButton : AlertResponse::kCancelled};
+}
+
+std::optional<AlertAnswer> kdialogAnswer(const UserAlert& alert, const DialogOutcome& outcome) {
+  if (outcome.status == kUntoldOkStatus) return defaultAnswer(alert, outcome.output);
+  if (outcome.status == kClosedStatus) return AlertAnswer{AlertResponse::kCancelled};
+  if (outcome.status != kNoStatus || missesDisplay(outcome)) return std::nullopt;
+  const bool isButton = alert.alternateButton.has_value() && !alert.textField;
+  return AlertAnswer{isButton ? AlertResponse::kAlternateButton : AlertResponse::kCancelled};
+}
+
 }  // namespace
 
 std::optional<std::vector<std::string>> dialogArguments(DialogProgram program, const UserAlert& alert) {
@@ -166,27 +207,12 @@ std::vector<std::string> dialogEnvironment(std::vector<std::string> variables) {
   return variables;
 }
 
-std::optional<AlertAnswer> dialogAnswer(const UserAlert& alert, const DialogOutcome& outcome,
-                                        std::string& reason) {
-  const std::string printed = withoutLineEnd(outcome.output);
-  if (outcome.status == kOkStatus || outcome.status == kUntoldOkStatus) {
-    AlertAnswer answer{AlertResponse::kDefaultButton};
-    if (alert.textField) answer.text = printed;
-    return answer;
-  }
-  const bool isCancel =
-      outcome.status == kCancelStatus || outcome.status == kEscapeStatus ||
-      (outcome.status == kUntoldCancelStatus && !containsIgnoringCase(outcome.errors, "display"));
-  if (!isCancel) {
-    reason = failure(outcome);
-    return std::nullopt;
-  }
-  // The status of a further button depends on the program's version; that it prints its label does not.
-  if (alert.otherButton && !printed.empty() && printed == mnemonic(*alert.otherButton)) {
-    return AlertAnswer{AlertResponse::kOtherButton};
-  }
-  const bool isButton = outcome.status == kCancelStatus && alert.alternateButton.has_value();
-  return AlertAnswer{isButton ? AlertResponse::kAlternateButton : AlertResponse::kCancelled};
+std::optional<AlertAnswer> dialogAnswer(DialogProgram program, const UserAlert& alert,
+                                        const DialogOutcome& outcome, std::string& reason) {
+  const auto answer =
+      program == DialogProgram::kdialog ? kdialogAnswer(alert, outcome) : zenityAnswer(alert, outcome);
+  if (!answer) reason = failure(outcome);
+  return answer;
 }
 
 }  // namespace zal

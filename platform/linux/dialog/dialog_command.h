@@ -30,9 +30,9 @@ struct DialogOutcome {
                                                                       const UserAlert& alert);
 /// The program's environment: ours, given as "NAME=value", with what makes its answers readable.
 [[nodiscard]] std::vector<std::string> dialogEnvironment(std::vector<std::string> variables);
-/// What the person did; nothing, and the reason in half a sentence, when the dialog was not seen or was
-/// ended by somebody else.
-[[nodiscard]] std::optional<AlertAnswer> dialogAnswer(const UserAlert& alert, const DialogOutcome& outcome,
-                                                      std::string& reason);
+/// What the person did, as that program tells it; nothing, and the reason in half a sentence, when the dialog
+/// was not seen or was ended by somebody else.
+[[nodiscard]] std::optional<AlertAnswer> dialogAnswer(DialogProgram program, const UserAlert& alert,
+                                                      const DialogOutcome& outcome, std::string& reason);
 
 }  // namespace zal

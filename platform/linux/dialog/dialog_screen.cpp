@@ -50,20 +50,21 @@ std::shared_ptr<DialogProcess> DialogScreen::_start(const std::string& id, const
     std::vector<std::string> variables;
     for (char** entry = environ; *entry != nullptr; ++entry) variables.emplace_back(*entry);
     auto process = std::make_shared<DialogProcess>(_context);
-    const int error = process->start(std::move(*words), dialogEnvironment(std::move(variables)),
-                                     [this, id](const DialogOutcome& outcome) { _takeEnd(id, outcome); });
+    const int error =
+        process->start(std::move(*words), dialogEnvironment(std::move(variables)),
+                       [this, id, program](const DialogOutcome& outcome) { _takeEnd(id, program, outcome); });
     if (error == 0) return process;
     if (error != ENOENT) reason = name + ": " + std::generic_category().message(error);
   }
   return nullptr;
 }
 
-void DialogScreen::_takeEnd(const std::string& id, const DialogOutcome& outcome) {
+void DialogScreen::_takeEnd(const std::string& id, DialogProgram program, const DialogOutcome& outcome) {
   const auto over = _shown.extract(id);
   if (over.empty()) return;
   Shown& shown = over.mapped();
   std::string reason;
-  const auto answer = dialogAnswer(shown.alert, outcome, reason);
+  const auto answer = dialogAnswer(program, shown.alert, outcome, reason);
   _openNext();
   if (answer) {
     _complained = false;

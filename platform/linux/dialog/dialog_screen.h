@@ -9,6 +9,7 @@
 
 #include "platform/agent_log.h"
 #include "platform/linux/alerts/alert_screen.h"
+#include "platform/linux/dialog/dialog_command.h"
 #include "platform/linux/dialog/dialog_process.h"
 
 namespace zal {
@@ -50,7 +51,7 @@ class DialogScreen : public AlertScreen {
   void _open(Turn turn);
   [[nodiscard]] std::shared_ptr<DialogProcess> _start(const std::string& id, const UserAlert& alert,
                                                       std::string& reason);
-  void _takeEnd(const std::string& id, const DialogOutcome& outcome);
+  void _takeEnd(const std::string& id, DialogProgram program, const DialogOutcome& outcome);
   void _openNext();
   void _complain(const std::string& reason);
 

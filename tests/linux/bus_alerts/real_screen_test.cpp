@@ -166,6 +166,56 @@ TEST_F(RealScreenTest, WithoutANotificationServerANoticeIsADialog) {
   EXPECT_THAT(told, ElementsAre("0"));
 }
 
+/// Where zenity is not installed.
+class RealSecondDialogTest : public RealScreenTest {
+ protected:
+  void SetUp() override {
+    RealScreenTest::SetUp();
+    if (IsSkipped()) return;
+    if (!std::filesystem::exists("/usr/bin/kdialog")) GTEST_SKIP() << "kdialog is not installed";
+    ::setenv("XDG_RUNTIME_DIR", directory.path().c_str(), 1);
+  }
+  void TearDown() override { ::unsetenv("XDG_RUNTIME_DIR"); }
+  void postAndAwaitDialog(UserAlert alert) {
+    secondStore.showOn(secondDialogs);
+    secondStore.post(std::move(alert), [this](const AlertResponse& response) {
+      const auto* const text = response.textFieldValue.as<std::string>();
+      told.push_back(std::to_string(response.code) + (text != nullptr ? " " + *text : ""));
+    });
+    const std::string window = awaitWindow("kdialog");
+    display->act({"windowfocus", "--sync", window, "mousemove", "--window", window, "5", "5"});
+  }
+
+  DialogScreen secondDialogs{loop.context(), log, {.hasDisplay = true, .zenity = "no-zenity-here"}};
+  RuntimeAlertStore secondStore{loop.context(), loop, clock, log, alerts};
+};
+
+TEST_F(RealSecondDialogTest, WhatIsTypedIntoThePromptIsTheAnswer) {
+  UserAlert prompt = problemPrompt();
+  prompt.message = "-v \\n <b> & brief";
+  postAndAwaitDialog(prompt);
+  display->act({"type", "--delay", "5", "kein Ton \xC3\xA4 <b> --x"});
+  runFor(std::chrono::milliseconds(100));  // as above
+  photograph("second-prompt.png");
+  display->act({"key", "Return"});
+  awaitAnswer();
+  EXPECT_THAT(told, ElementsAre("0 kein Ton \xC3\xA4 <b> --x"));
+}
+
+TEST_F(RealSecondDialogTest, AQuestionsSecondButtonAndEscapeAreTwoAnswers) {
+  UserAlert alert = completion();
+  alert.alternateButton = "Not & now";
+  postAndAwaitDialog(alert);
+  photograph("second-dialog.png");
+  display->act({"key", "Tab", "key", "Return"});
+  EXPECT_TRUE(runUntil([this] { return told.size() == 1; }));
+  awaitNoWindow("kdialog");
+  postAndAwaitDialog(alert);
+  display->act({"key", "Escape"});
+  EXPECT_TRUE(runUntil([this] { return told.size() == 2; }));
+  EXPECT_THAT(told, ElementsAre("1", "3"));
+}
+
 TEST_F(RealScreenTest, WithoutAReachableDisplayTheAlertWaitsInTheDirectory) {
   if (!std::filesystem::exists("/usr/bin/zenity")) GTEST_SKIP() << "zenity is not installed";
   display.reset();

@@ -31,9 +31,10 @@ UserAlert notice() {
 Words zenityWords(const UserAlert& alert) { return *dialogArguments(DialogProgram::zenity, alert); }
 
 /// "button N", "button N: TEXT", or "not seen: REASON".
-std::string read(const UserAlert& alert, const DialogOutcome& outcome) {
+std::string read(const UserAlert& alert, const DialogOutcome& outcome,
+                 DialogProgram program = DialogProgram::zenity) {
   std::string reason;
-  const auto answer = dialogAnswer(alert, outcome, reason);
+  const auto answer = dialogAnswer(program, alert, outcome, reason);
   if (!answer) return "not seen: " + reason;
   return "button " + std::to_string(answer->code) + (answer->text ? ": " + *answer->text : "");
 }
@@ -65,7 +66,7 @@ TEST(DialogArgumentsTest, HostileTextsAreNoOptionsNoMarkupAndNoEscapes) {
                   "--entry-text=--initial \\t _y", "--ok-label=OK", "--cancel-label=Cancel", "--width=360"));
   EXPECT_THAT(*dialogArguments(DialogProgram::kdialog, alert),
               ElementsAre("--title=--help <b>T</b>",
-                          "--inputbox=<qt>-v \\\\n &lt;b>&amp;amp;&lt;/b> _x<br>--name</qt>", "--",
+                          "--inputbox=<qt>-v \\\\n &lt;b>&amp;&amp;amp;&lt;/b> _x<br>--name</qt>", "--",
                           "--initial \\t _y"));
 }
 
@@ -92,6 +93,16 @@ TEST(DialogArgumentsTest, TheSecondProgramHasTheSameDialogsUpToTwoButtons) {
   EXPECT_THAT(*dialogArguments(DialogProgram::kdialog, notice()),
               ElementsAre("--title=Vistel Logging", "--msgbox=<qt>Please describe the problem briefly</qt>"));
   EXPECT_EQ(dialogArguments(DialogProgram::kdialog, question()), std::nullopt);
+}
+
+TEST(DialogArgumentsTest, AnAmpersandIsNoShortcutInTheSecondProgram) {
+  UserAlert two = question();
+  two.otherButton.reset();
+  two.message = "a & b";
+  two.defaultButton = "Fish & Chips";
+  EXPECT_THAT(*dialogArguments(DialogProgram::kdialog, two),
+              ElementsAre("--title=Vistel Logging", "--yes-label=Fish && Chips", "--no-label=Cancel",
+                          "--yesno=<qt>a &amp; b</qt>"));
 }
 
 TEST(DialogEnvironmentTest, OursGoesBeforeWhatTheAgentHas) {
@@ -121,6 +132,22 @@ TEST(DialogAnswerTest, AFurtherButtonIsKnownByItsLabel) {
 
 TEST(DialogAnswerTest, AProgramThatWasToldNothingCancelsWithOne) {
   EXPECT_EQ(read(problemPrompt(), {1, "", "Gtk-Message: harmless\n"}), "button 3");
+}
+
+TEST(DialogAnswerTest, TheSecondProgramTellsItsSecondButtonFromAClosedWindowButBesideAText) {
+  constexpr auto kKdialog = DialogProgram::kdialog;
+  UserAlert two = question();
+  two.otherButton.reset();
+  EXPECT_EQ(read(two, {0, "", ""}, kKdialog), "button 0");
+  EXPECT_EQ(read(two, {1, "", ""}, kKdialog), "button 1");
+  EXPECT_EQ(read(two, {2, "", ""}, kKdialog), "button 3");
+  EXPECT_EQ(read(notice(), {2, "", ""}, kKdialog), "button 3");
+  EXPECT_EQ(read(problemPrompt(), {0, "no sound\n", ""}, kKdialog), "button 0: no sound");
+  EXPECT_EQ(read(problemPrompt(), {1, "", ""}, kKdialog), "button 3");
+  EXPECT_EQ(read(problemPrompt(), {-6, "", "could not connect to display :9\n"}, kKdialog),
+            "not seen: could not connect to display :9");
+  EXPECT_EQ(read(two, {1, "", "qt.qpa.xcb: could not connect to display :9\n"}, kKdialog),
+            "not seen: qt.qpa.xcb: could not connect to display :9");
 }
 
 TEST(DialogAnswerTest, NoDisplayIsNoAnswer) {
