@@ -3,9 +3,9 @@
 #include <algorithm>
 #include <memory>
 
-#include "cli/json_text.h"
 #include "cli/printable_text.h"
 #include "cli/tool_context.h"
+#include "platform/json_text.h"
 
 namespace zal {
 namespace {

@@ -2,7 +2,7 @@
 
 #include <chrono>
 
-#include "cli/json_text.h"
+#include "platform/json_text.h"
 #include "platform/value.h"
 
 namespace zal {

@@ -4,9 +4,9 @@
 #include <utility>
 
 #include "cli/delivery.h"
-#include "cli/json_text.h"
 #include "cli/printable_text.h"
 #include "cli/table_text.h"
+#include "platform/json_text.h"
 
 namespace zal {
 namespace {

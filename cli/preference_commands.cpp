@@ -3,8 +3,8 @@
 #include <array>
 #include <memory>
 
-#include "cli/json_text.h"
 #include "cli/tool_context.h"
+#include "platform/json_text.h"
 
 namespace zal {
 namespace {

@@ -2,7 +2,7 @@
 
 #include <cstdio>
 
-#include "cli/utf8_walk.h"
+#include "platform/utf8_walk.h"
 
 namespace zal {
 namespace {

@@ -4,7 +4,7 @@
 
 #include "cli/printable_text.h"
 #include "cli/table_text.h"
-#include "cli/utf8_walk.h"
+#include "platform/utf8_walk.h"
 
 namespace zal {
 namespace {

@@ -2,12 +2,12 @@
 
 #include <memory>
 
-#include "cli/json_text.h"
 #include "cli/printable_text.h"
 #include "cli/session_logs.h"
 #include "cli/session_tree.h"
 #include "cli/table_text.h"
 #include "cli/tool_context.h"
+#include "platform/json_text.h"
 
 namespace zal {
 namespace {

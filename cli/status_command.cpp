@@ -4,9 +4,9 @@
 #include <cstdio>
 
 #include "cli/delivery.h"
-#include "cli/json_text.h"
 #include "cli/printable_text.h"
 #include "cli/tool_context.h"
+#include "platform/json_text.h"
 
 namespace zal {
 namespace {

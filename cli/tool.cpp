@@ -2,9 +2,9 @@
 
 #include <exception>
 
-#include "cli/json_text.h"
 #include "cli/printable_text.h"
 #include "cli/tool_context.h"
+#include "platform/json_text.h"
 
 namespace zal {
 namespace {

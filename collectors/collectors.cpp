@@ -5,9 +5,9 @@
 namespace zal {
 
 Collectors::Collectors(Platform& platform)
-    : commands(platform.shell),
+    : commands(platform.shell, &witnesses),
       table(platform.configuration, platform.agentLog),
-      files(platform.files, platform.agentLog, platform.configuration.roots),
+      files(platform.files, platform.agentLog, platform.configuration.roots, &witnesses),
       pings(platform.queues, platform.pings, platform.agentLog),
       cellular(platform.telephony, platform.propertyLists, platform.agentLog),
       network({.configuration = platform.configuration,

@@ -4,6 +4,7 @@
 #include "collectors/command_runner.h"
 #include "collectors/command_table.h"
 #include "collectors/file_collector.h"
+#include "collectors/gathering_witness.h"
 #include "collectors/log_collectors.h"
 #include "collectors/network_diagnostics.h"
 #include "collectors/ping_runner.h"
@@ -22,6 +23,7 @@ class Collectors {
   Collectors(const Collectors&) = delete;
   Collectors& operator=(const Collectors&) = delete;
 
+  GatheringWitnesses witnesses;
   CommandRunner commands;
   CommandTable table;
   FileCollector files;

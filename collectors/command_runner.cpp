@@ -1,5 +1,6 @@
 #include "collectors/command_runner.h"
 
+#include "collectors/gathering_witness.h"
 #include "platform/system_shell.h"
 
 namespace zal {
@@ -25,12 +26,14 @@ std::string redirected(std::string_view commandLine, std::string_view directory,
 
 void CommandRunner::RunCommandInBackground(std::string_view commandLine, std::string_view directory,
                                            std::string_view fileName) {
+  if (_witnesses != nullptr) _witnesses->command(commandLine, directory, fileName, std::nullopt);
   _shell.PerformSystemInBackground(redirected(commandLine, directory, fileName) + " &");
 }
 
 void CommandRunner::RunCommandAndWait(std::string_view commandLine, std::string_view directory,
                                       std::string_view fileName) {
-  _shell.PerformSystem(redirected(commandLine, directory, fileName));
+  const int status = _shell.PerformSystem(redirected(commandLine, directory, fileName));
+  if (_witnesses != nullptr) _witnesses->command(commandLine, directory, fileName, status);
 }
 
 }  // namespace zal

@@ -5,6 +5,7 @@
 
 namespace zal {
 
+class GatheringWitnesses;
 class SystemShell;
 
 /// Runs the command lines of the collectors, each with its output and errors in one file of a
@@ -12,7 +13,9 @@ class SystemShell;
 /// says is seen in its output file alone. Any thread; keeps no state.
 class CommandRunner {
  public:
-  explicit CommandRunner(SystemShell& shell) : _shell(shell) {}
+  /// Both are borrowed; without witnesses nobody hears of it.
+  explicit CommandRunner(SystemShell& shell, const GatheringWitnesses* witnesses = nullptr)
+      : _shell(shell), _witnesses(witnesses) {}
 
   /// Returns at once; the command goes on by itself, even when this process ends. The directory
   /// must exist; the file is created or truncated.
@@ -23,6 +26,7 @@ class CommandRunner {
 
  private:
   SystemShell& _shell;
+  const GatheringWitnesses* const _witnesses;
 };
 
 }  // namespace zal

@@ -4,6 +4,7 @@
 #include "collectors/directory_listing.h"
 #include "collectors/file_collector.h"
 #include "collectors/file_url.h"
+#include "collectors/gathering_witness.h"
 #include "platform/agent_log.h"
 #include "platform/file_placement.h"
 
@@ -35,7 +36,9 @@ bool containsAny(const std::string& name, const std::vector<std::string>& fragme
 // The slot belongs to the whole run and a copy that succeeds leaves it alone: readers of these logs
 // know that nothing after the first failure line can be relied on.
 void FileCollector::_copy(const std::string& source, const std::string& target, std::error_code& errorSlot) {
-  if (const std::error_code error = _files.copy(source, target)) errorSlot = error;
+  const std::error_code error = _files.copy(source, target);
+  _tell(source, std::filesystem::path(target).parent_path().string(), error);
+  if (error) errorSlot = error;
   if (!errorSlot) return;
   _log.warning("Failed to copy from " + fileUrl(source) + " to " + fileUrl(target) +
                " with error: " + errorSlot.message());
@@ -44,7 +47,7 @@ void FileCollector::_copy(const std::string& source, const std::string& target, 
 void FileCollector::CopyDirectoryContents(const std::string& sourceDirectory, const std::string& directory) {
   const std::string source = _resolved(sourceDirectory);
   const auto names = listDirectory(source, HiddenEntries::skipped);
-  if (!names) return;
+  if (!names) return _tell(source, directory, SourceOutcome::absent);
   std::error_code errorSlot;
   for (const auto& name : *names) {
     if (isCopied(name)) _copy(inside(source, name), inside(directory, name), errorSlot);

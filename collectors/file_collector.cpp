@@ -3,6 +3,7 @@
 #include <filesystem>
 
 #include "collectors/directory_listing.h"
+#include "collectors/gathering_witness.h"
 #include "platform/file_placement.h"
 #include "platform/open_directories.h"
 #include "platform/standard_path.h"
@@ -28,13 +29,31 @@ std::string FileCollector::_resolved(const std::string& path) const {
   return resolveAndStandardize(path, _files.homeDirectory());
 }
 
+void FileCollector::_tell(const std::string& source, const std::string& directory,
+                          SourceOutcome outcome) const {
+  if (_witnesses != nullptr) _witnesses->source(source, directory, outcome);
+}
+
+void FileCollector::_tell(const std::string& source, const std::string& directory,
+                          const std::error_code& error) const {
+  if (_witnesses == nullptr) return;
+  const bool isThere = !error || error == std::errc::file_exists;
+  _witnesses->source(source, directory, isThere ? SourceOutcome::taken : SourceOutcome::failed,
+                     isThere ? "" : error.message());
+}
+
 bool FileCollector::LinkFileIntoDirectory(const std::string& source, const std::string& directory,
                                           const std::string& suffix) {
   const std::string resolved = _resolved(source);
   const std::string target = directory + "/" + nameOf(resolved) + suffix;
-  if (!fileExists(resolved)) return false;
+  if (!fileExists(resolved)) {
+    _tell(resolved, directory, SourceOutcome::absent);
+    return false;
+  }
   makeParent(target);
-  return !_files.link(resolved, target);
+  const std::error_code error = _files.link(resolved, target);
+  _tell(resolved, directory, error);
+  return !error;
 }
 
 bool FileCollector::_linkEntry(const std::string& sourceDirectory, const std::string& name,
@@ -46,10 +65,13 @@ bool FileCollector::LinkDirectoryEntriesWithPrefix(const std::string& sourceDire
                                                    const std::string& prefix, const std::string& directory) {
   bool result = true;
   const auto names = listDirectory(_resolved(sourceDirectory), HiddenEntries::listed);
-  if (!names) return result;
-  for (const auto& name : *names) {
-    if (name.starts_with(prefix)) result = _linkEntry(sourceDirectory, name, directory) && result;
+  bool anyMatched = false;
+  for (const auto& name : names.value_or(std::vector<std::string>())) {
+    if (!name.starts_with(prefix)) continue;
+    anyMatched = true;
+    result = _linkEntry(sourceDirectory, name, directory) && result;
   }
+  if (!anyMatched) _tell(sourceDirectory + "/" + prefix + "*", directory, SourceOutcome::absent);
   return result;
 }
 
@@ -70,9 +92,16 @@ bool FileCollector::MoveFileIntoDirectory(const std::string& source, const std::
   const std::string name = nameOf(resolved);
   const std::string wanted = directory + "/" + name + suffix;
   const auto target = _files.uniqueSavePath(wanted);
-  if (name.empty() || !fileExists(resolved)) return false;  // "/" has no name to go under
+  if (name.empty() || !fileExists(resolved)) {  // "/" has no name to go under
+    _tell(resolved, directory, SourceOutcome::absent);
+    return false;
+  }
   makeParent(target.value_or(wanted));
-  if (target) return !_files.move(resolved, *target);
+  if (target) {
+    const std::error_code error = _files.move(resolved, *target);
+    _tell(resolved, directory, error);
+    return !error;
+  }
   // Without a free name it goes all the same: what was asked for is that it no longer lies there.
   std::error_code ignored;
   std::filesystem::remove(resolved, ignored);

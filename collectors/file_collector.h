@@ -10,6 +10,8 @@ namespace zal {
 
 class AgentLog;
 class FilePlacement;
+class GatheringWitnesses;
+enum class SourceOutcome;
 
 /// Brings files into a dump or session directory. Single files are hard-linked, so that they cost no
 /// space and still grow with their writer (copied where they lie on another file system); whole
@@ -17,9 +19,10 @@ class FilePlacement;
 /// keeps no state; may wait for a disk.
 class FileCollector {
  public:
-  /// The services and the roots are borrowed.
-  FileCollector(FilePlacement& files, AgentLog& log, const DirectoryRoots& roots)
-      : _files(files), _log(log), _roots(roots) {}
+  /// The services and the roots are borrowed, and so are the witnesses, if there are any.
+  FileCollector(FilePlacement& files, AgentLog& log, const DirectoryRoots& roots,
+                const GatheringWitnesses* witnesses = nullptr)
+      : _files(files), _log(log), _roots(roots), _witnesses(witnesses) {}
 
   /// Links the file, symbolic links followed, under its own name plus the suffix; missing parents
   /// are made with mode 0777. Returned: whether it was placed. A missing source makes nothing; a
@@ -51,10 +54,14 @@ class FileCollector {
   [[nodiscard]] std::string _resolved(const std::string& path) const;
   bool _linkEntry(const std::string& sourceDirectory, const std::string& name, const std::string& directory);
   void _copy(const std::string& source, const std::string& target, std::error_code& errorSlot);
+  void _tell(const std::string& source, const std::string& directory, SourceOutcome outcome) const;
+  /// A name that is taken already counts as no failure: what lies there is the same source, or came first.
+  void _tell(const std::string& source, const std::string& directory, const std::error_code& error) const;
 
   FilePlacement& _files;
   AgentLog& _log;
   const DirectoryRoots& _roots;
+  const GatheringWitnesses* const _witnesses;
 };
 
 }  // namespace zal

@@ -9,6 +9,8 @@
 #include "dump/archive_gaps.h"
 #include "dump/latest_link.h"
 #include "dump/log_compressor.h"
+#include "dump/manifest.h"
+#include "dump/planned_steps.h"
 #include "platform/platform.h"
 #include "platform/standard_path.h"
 
@@ -42,13 +44,13 @@ void linkThermalLog(const Services& services, const ClosingWork& work) {
 
 void takeStackshot(const Services& services, const ClosingWork& work) {
   if (!services.platform.crashReporter.stackshot("ZalLogging Log Dump", kStackshotCode)) {
-    work.progress->missing("Stackshot", "the host's crash service made none");
+    work.record->stepGives(PartState::failed, "the host's crash service made none");
   }
 }
 
 void takeBasebandSnapshot(const Services& services, const ClosingWork& work) {
   if (!services.collectors.cellular.DumpBasebandState(work.reason, work.service)) {
-    work.progress->missing("Baseband snapshot", "the telephony service cannot be reached");
+    work.record->stepGives(PartState::missing, "the telephony service cannot be reached");
   }
 }
 
@@ -78,8 +80,8 @@ void linkFullPacketCapture(const Services& services, const ClosingWork& work) {
 
 void tellGaps(const Services& services, const ClosingWork& work) {
   tellRunningCommands(work.destination, services.platform.processes, services.platform.agentLog,
-                      *work.progress);
-  tellMissingPrograms(work.destination, *work.progress);
+                      *work.record);
+  tellMissingPrograms(work.destination, *work.record);
 }
 
 constexpr CollectionFlags kAlways = 0;
@@ -125,7 +127,7 @@ class ClosingRun : public std::enable_shared_from_this<ClosingRun> {
   void _runSteps(const Step (&steps)[count]) {
     for (const Step& step : steps) {
       if (!step.isWanted(_work.flags)) continue;
-      _work.progress->step(_nextStep++);
+      _work.record->step(_nextStep++);
       step.run(_services, _work);
     }
   }
@@ -158,7 +160,11 @@ class ClosingRun : public std::enable_shared_from_this<ClosingRun> {
     CompressDirectory(_services.compressor, log, _work.destination, std::nullopt,
                       [self = shared_from_this()](const std::optional<std::string>& archive) {
                         self->_finish(archive.value());
-                      });
+                      },
+                      {std::string(kManifestName), [record = _work.record, &clock = _services.platform.clock](
+                                                       const ArchiveContent& content) {
+                         return manifestText(record->account(), content, clock.wallNow());
+                       }});
   }
 
   void _finish(const std::string& archive) {
@@ -168,9 +174,9 @@ class ClosingRun : public std::enable_shared_from_this<ClosingRun> {
         _work.service, archive, platform.agentLog);
     std::error_code error;
     if (std::filesystem::exists(archive, error)) {
-      _work.progress->done(archive);
+      _work.record->done(archive);
     } else {
-      _work.progress->failed("no archive was made; the log says why");
+      _work.record->failed("no archive was made; the log says why");
     }
     if (_work.completion) _work.completion();
   }
@@ -186,16 +192,16 @@ void ClosingStages::run(ClosingWork work) {
   std::make_shared<ClosingRun>(_services, std::move(work))->firstStage();
 }
 
-std::vector<std::string> ClosingStages::stepNames(CollectionFlags flags) {
-  std::vector<std::string> names;
+std::vector<PlannedStep> ClosingStages::plan(CollectionFlags flags) {
+  std::vector<PlannedStep> planned;
   const auto add = [&](const auto& steps) {
     for (const Step& step : steps) {
-      if (step.isWanted(flags)) names.emplace_back(step.name);
+      planned.push_back({std::string(step.name), step.isWanted(flags), flagsNotSet(step.anyOf)});
     }
   };
   add(kFirstStage);
   add(kSecondStage);
-  return names;
+  return planned;
 }
 
 }  // namespace zal

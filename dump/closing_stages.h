@@ -6,8 +6,8 @@
 #include <string>
 
 #include "dump/collection_flags.h"
+#include "dump/collection_record.h"
 #include "platform/clock.h"
-#include "platform/dump_progress.h"
 
 namespace zal {
 
@@ -29,9 +29,9 @@ struct ClosingWork {
   std::optional<std::string> reason;
   CollectionFlags flags = 0;
   WallTime startTime{};
-  std::shared_ptr<DumpProgress> progress;  ///< never empty
-  std::size_t firstStep = 1;               ///< of these stages in the progress plan
-  std::function<void()> completion;        ///< may be empty
+  std::shared_ptr<CollectionRecord> record;  ///< never empty
+  std::size_t firstStep = 1;                 ///< of these stages among the wanted ones
+  std::function<void()> completion;          ///< may be empty
 };
 
 /// The end of every collection: logs that other daemons write in answer to it, the waits for them,
@@ -48,8 +48,8 @@ class ClosingStages {
   /// The first stage, on the calling thread; the second follows by timer on the standard queue. The
   /// completion runs once, on the main thread, archive or not; never while a baseband dump goes on.
   void run(ClosingWork work);
-  /// The names of their steps in the progress plan, for these flags.
-  [[nodiscard]] static std::vector<std::string> stepNames(CollectionFlags flags);
+  /// Their steps with these flags, those that are skipped too.
+  [[nodiscard]] static std::vector<PlannedStep> plan(CollectionFlags flags);
 
  private:
   Services _services;

@@ -7,7 +7,6 @@
 
 #include "collectors/file_url.h"
 #include "platform/agent_log.h"
-#include "platform/file_copier.h"
 #include "platform/file_placement.h"
 #include "platform/work_queue.h"
 
@@ -75,7 +74,7 @@ _LirraLogCompressor* _LirraLogCompressor::sharedInstance() {
 
 void _LirraLogCompressor::compressDirectory(const std::optional<std::string>& directory,
                                             const std::optional<std::string>& archive,
-                                            std::function<void()> completion) {
+                                            std::function<void()> completion, ArchiveEnding ending) {
   if (!directory || !archive) {
     if (completion) completion();
     return;
@@ -87,6 +86,7 @@ void _LirraLogCompressor::compressDirectory(const std::optional<std::string>& di
        completion = std::move(completion)](FileCopierJob& finished) mutable {
         _settle(finished, temporary, archivePath, std::move(completion));
       });
+  job->endWith(std::move(ending));
   {
     const std::scoped_lock lock(_lock);
     _archivers.push_back(job);
@@ -129,7 +129,7 @@ std::size_t _LirraLogCompressor::runningJobs() const {
 
 bool CompressDirectory(_LirraLogCompressor& compressor, AgentLog& log,
                        const std::optional<std::string>& directory, const std::optional<std::string>& archive,
-                       ArchiveCompletion completion) {
+                       ArchiveCompletion completion, ArchiveEnding ending) {
   log.notice("Compressing " + locationText(directory) + " into " + locationText(archive));
   if (!directory) {
     if (completion) completion(std::nullopt);
@@ -137,10 +137,13 @@ bool CompressDirectory(_LirraLogCompressor& compressor, AgentLog& log,
   }
   const std::string target = archive ? *archive : withoutEndSlashes(*directory) + ".zip";
   log.notice("Starting zip of " + fileUrl(*directory) + " => " + fileUrl(target));
-  compressor.compressDirectory(*directory, target, [&log, target, completion = std::move(completion)] {
-    log.notice("Done zipping log to path: " + fileUrl(target));
-    if (completion) completion(target);
-  });
+  compressor.compressDirectory(
+      *directory, target,
+      [&log, target, completion = std::move(completion)] {
+        log.notice("Done zipping log to path: " + fileUrl(target));
+        if (completion) completion(target);
+      },
+      std::move(ending));
   return true;
 }
 

@@ -7,11 +7,11 @@
 #include <optional>
 #include <string>
 
+#include "platform/file_copier.h"
+
 namespace zal {
 
 class AgentLog;
-class FileCopier;
-class FileCopierJob;
 class FilePlacement;
 class WorkQueues;
 
@@ -41,7 +41,8 @@ class _LirraLogCompressor {
   /// deleted. An archive that exists at the path stays, and the fresh one stays in the temporary
   /// area. How the job went is not looked at: the copier sees to it that nothing gathered is lost.
   void compressDirectory(const std::optional<std::string>& directory,
-                         const std::optional<std::string>& archive, std::function<void()> completion);
+                         const std::optional<std::string>& archive, std::function<void()> completion,
+                         ArchiveEnding ending = {});
 
   [[nodiscard]] std::size_t runningJobs() const;
 
@@ -58,10 +59,11 @@ class _LirraLogCompressor {
 /// Receives where the archive lies; nothing when there was no directory.
 using ArchiveCompletion = std::function<void(const std::optional<std::string>& archive)>;
 
-/// Compresses a directory into the archive, by default a sibling with ".zip" appended. Returned:
-/// whether a directory was given; without one the completion is told so at once.
+/// Compresses a directory into the archive, by default a sibling with ".zip" appended, with the ending
+/// as its last entry where there is one. Returned: whether a directory was given; without one the
+/// completion is told so at once.
 bool CompressDirectory(_LirraLogCompressor& compressor, AgentLog& log,
                        const std::optional<std::string>& directory, const std::optional<std::string>& archive,
-                       ArchiveCompletion completion);
+                       ArchiveCompletion completion, ArchiveEnding ending = {});
 
 }  // namespace zal

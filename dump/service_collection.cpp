@@ -6,6 +6,7 @@
 #include "collectors/collectors.h"
 #include "collectors/directory_listing.h"
 #include "collectors/rotated_log_sets.h"
+#include "dump/planned_steps.h"
 #include "platform/open_directories.h"
 #include "platform/platform.h"
 #include "platform/standard_path.h"
@@ -21,7 +22,7 @@ struct Context {
   Platform& platform;
   Collectors& collectors;
   const CollectionRequest& request;
-  DumpProgress& progress;
+  CollectionRecord& record;
   const SignalWait& wait;
   std::function<void()> dumpCoexistence;
 
@@ -60,7 +61,7 @@ void collectMedia(const Context& at) {
 }
 
 void collectWifi(const Context& at) {
-  takeWifiDump(at.platform, at.request.service, at.request.reason, at.wait, at.progress);
+  takeWifiDump(at.platform, at.request.service, at.request.reason, at.wait, at.record);
   at.files().LinkDirectoryEntriesWithPrefix(at.roots().SystemReportRoot, "setkey", at.request.destination);
 }
 
@@ -68,9 +69,14 @@ void collectLocation(const Context& at) {
   const std::string directory = at.make("Location");
   const std::string source =
       resolveAndStandardize(at.roots().LocationCacheDir, at.platform.files.homeDirectory());
+  const GatheringWitnesses& witnesses = at.collectors.witnesses;
   const auto names = listDirectory(source, HiddenEntries::listed);
-  if (!names) return;
-  for (const std::string& name : *names) at.platform.files.copy(source + "/" + name, directory + "/" + name);
+  if (!names) return witnesses.source(source, directory, SourceOutcome::absent);
+  for (const std::string& name : *names) {
+    const std::error_code error = at.platform.files.copy(source + "/" + name, directory + "/" + name);
+    witnesses.source(source + "/" + name, directory, error ? SourceOutcome::failed : SourceOutcome::taken,
+                     error ? error.message() : "");
+  }
 }
 
 void collectCloudSync(const Context& at) {
@@ -89,7 +95,9 @@ void collectVideoCalls(const Context& at) {
 void collectProximity(const Context& at) {
   at.files().LinkFileIntoDirectory(at.roots().MobileLogRoot + "/nearwaved-latest.log", at.make("Nearwave"),
                                    "");
-  at.collectors.logs.CollectBluetoothLogs(at.make("Bluetooth"));
+  const std::string bluetooth = at.make("Bluetooth");
+  at.record.keepForThisStep(bluetooth);  // half of it comes later
+  at.collectors.logs.CollectBluetoothLogs(bluetooth);
 }
 
 void collectHandover(const Context& at) {
@@ -117,7 +125,9 @@ void collectPrediction(const Context& at) {
 
 void collectNetwork(const Context& at) {
   const bool includePing = (at.request.flags & kCollectPings) != 0;
-  at.collectors.network.ForceNetworkDump(at.make("Network"), includePing);
+  const std::string directory = at.make("Network");
+  at.record.keepForThisStep(directory);  // it goes on by itself
+  at.collectors.network.ForceNetworkDump(directory, includePing);
 }
 
 void collectRegistration(const Context& at) {
@@ -177,20 +187,16 @@ void makeClosingDirectories(const Context& at) {
   if ((at.request.flags & (kCollectPushLogs | kCollectNetwork)) != 0) at.make("TCPDump");
 }
 
-std::vector<std::string> ownStepNames(const CollectionRequest& request) {
-  std::vector<std::string> names;
-  for (const Step& step : kSteps) {
-    if (step.isWanted(request)) names.emplace_back(step.name);
-  }
-  return names;
-}
-
 }  // namespace
 
-std::vector<std::string> ServiceCollection::stepNames(const CollectionRequest& request) {
-  std::vector<std::string> names = ownStepNames(request);
-  for (std::string& name : ClosingStages::stepNames(request.flags)) names.push_back(std::move(name));
-  return names;
+std::vector<PlannedStep> ServiceCollection::plan(const CollectionRequest& request) {
+  std::vector<PlannedStep> planned;
+  for (const Step& step : kSteps) {
+    planned.push_back({std::string(step.name), step.isWanted(request),
+                       step.flag == 0 ? "it belongs to video calls" : flagsNotSet(step.flag)});
+  }
+  for (PlannedStep& step : ClosingStages::plan(request.flags)) planned.push_back(std::move(step));
+  return planned;
 }
 
 void ServiceCollection::CollectServiceLogs(const CollectionRequest& request,
@@ -199,14 +205,17 @@ void ServiceCollection::CollectServiceLogs(const CollectionRequest& request,
   const WallTime startTime = platform.clock.wallNow();
   platform.agentLog.notice("Copying logs for service " + printable(request.service) + " into path " +
                            request.destination);
-  const auto progress = platform.dumpProgress.begin(
-      {.service = request.service, .directory = request.destination, .steps = stepNames(request)});
-  const Context at{platform,  _services.collectors, request,
-                   *progress, _services.wait,       [this] { _dumpCoexistence(); }};
+  const auto record = beginRecord(platform, _services.collectors.witnesses,
+                                  {.service = request.service,
+                                   .directory = request.destination,
+                                   .flags = request.flags,
+                                   .steps = plan(request)});
+  const Context at{platform, _services.collectors, request,
+                   *record,  _services.wait,       [this] { _dumpCoexistence(); }};
   std::size_t number = 0;
   for (const Step& step : kSteps) {
     if (!step.isWanted(request)) continue;
-    progress->step(++number);
+    record->step(++number);
     step.run(at);
   }
   makeClosingDirectories(at);
@@ -222,7 +231,7 @@ void ServiceCollection::CollectServiceLogs(const CollectionRequest& request,
                    .reason = request.reason,
                    .flags = request.flags,
                    .startTime = startTime,
-                   .progress = progress,
+                   .record = record,
                    .firstStep = number + 1,
                    .completion = std::move(completion)};
   _services.collectors.network.StopCaptures();

@@ -30,8 +30,8 @@ class ServiceCollection {
   /// Whether the destination may be written to is the caller's affair.
   void CollectServiceLogs(const CollectionRequest& request, std::function<void()> completion = {});
 
-  /// The names of all steps of such a request in the progress plan, the closing ones included.
-  [[nodiscard]] static std::vector<std::string> stepNames(const CollectionRequest& request);
+  /// All steps of such a request, the closing ones and those that are skipped too.
+  [[nodiscard]] static std::vector<PlannedStep> plan(const CollectionRequest& request);
 
  private:
   void _dumpCoexistence();

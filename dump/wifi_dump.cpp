@@ -2,14 +2,13 @@
 
 #include <memory>
 
+#include "dump/collection_record.h"
 #include "platform/open_directories.h"
 #include "platform/platform.h"
 #include "platform/standard_path.h"
 
 namespace zal {
 namespace {
-
-constexpr std::string_view kWhat = "Wi-Fi diagnostics";
 
 /// Held by the completion too, which may come when nobody waits any more.
 struct Outcome {
@@ -24,7 +23,7 @@ bool waitInSteadyTime(std::binary_semaphore& signal, std::chrono::seconds limit)
 }
 
 void takeWifiDump(Platform& platform, const std::string& service, const std::optional<std::string>& reason,
-                  const SignalWait& wait, DumpProgress& progress) {
+                  const SignalWait& wait, CollectionRecord& record) {
   const std::string directory = resolveAndStandardize(platform.configuration.roots.SystemReportRoot + "/WiFi",
                                                       platform.files.homeDirectory());
   createDirectoriesWithMode0777(directory);
@@ -37,9 +36,9 @@ void takeWifiDump(Platform& platform, const std::string& service, const std::opt
                                     });
   if (!wait(outcome->signal, kWifiDiagnosticsLimit)) {
     platform.agentLog.warning("Timed out while waiting for wifi logs dump to complete");
-    progress.missing(kWhat, "not complete in time");
+    record.stepGives(PartState::failed, "not complete in time");
   } else if (outcome->result != 0) {
-    progress.missing(kWhat, "the service answered " + std::to_string(outcome->result));
+    record.stepGives(PartState::failed, "the service answered " + std::to_string(outcome->result));
   }
 }
 

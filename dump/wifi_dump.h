@@ -8,7 +8,7 @@
 
 namespace zal {
 
-class DumpProgress;
+class CollectionRecord;
 struct Platform;
 
 /// The Wi-Fi diagnostics dump gets this long, and its caller waits for it.
@@ -21,6 +21,6 @@ bool waitInSteadyTime(std::binary_semaphore& signal, std::chrono::seconds limit)
 /// Has the host's Wi-Fi diagnostics fill SystemReportRoot/WiFi and waits for it on the calling
 /// thread. A dump that completes later is only logged.
 void takeWifiDump(Platform& platform, const std::string& service, const std::optional<std::string>& reason,
-                  const SignalWait& wait, DumpProgress& progress);
+                  const SignalWait& wait, CollectionRecord& record);
 
 }  // namespace zal

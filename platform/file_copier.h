@@ -1,8 +1,10 @@
 #pragma once
 
+#include <cstdint>
 #include <functional>
 #include <memory>
 #include <string>
+#include <vector>
 
 #include "platform/work_queue.h"
 
@@ -13,11 +15,33 @@ enum class CopierOperation : int {
   compressIntoZip = 0,  ///< a zip archive of the tree, with the input directory as its top level
 };
 
+/// An entry of an archive that is no directory, as it came to lie there.
+struct ArchivedFile {
+  std::string name;  ///< below the top level, in UTF-8
+  std::uint64_t bytes = 0;
+  std::string sha256;  ///< 64 hexadecimal digits; of a symbolic link's target, where it is one
+  bool isCut = false;  ///< it became shorter, or unreadable, while it was read
+};
+
+struct ArchiveContent {
+  std::vector<ArchivedFile> files;   ///< in the archive's order
+  std::vector<std::string> remarks;  ///< what was left out or cut, one line each
+};
+
+/// A text that an archive says about itself: its last entry, below the top level. When that name is
+/// taken there, the entry's gets "-2" appended, "-3" …
+struct ArchiveEnding {
+  std::string name;
+  std::function<std::string(const ArchiveContent&)> text;  ///< empty: there is none
+};
+
 /// One job of the file copier. It must be kept alive until its completion has run.
 class FileCopierJob {
  public:
   virtual ~FileCopierJob() = default;
   [[nodiscard]] virtual const std::string& identifier() const = 0;
+  /// Before start. The text is asked for once, on the job's own thread, when all else is written.
+  virtual void endWith(ArchiveEnding ending) = 0;
   /// Returns at once. Call it once.
   virtual void start() = 0;
 };

@@ -34,6 +34,12 @@ bool makeOwnArchive(const std::string& directory, const std::string& output, Arc
   ZipFileCopier copier(queues, log, compression);
   const auto job = copier.makeJob(directory, output, directory, CopierOperation::compressIntoZip,
                                   queues.main(), [&loop](FileCopierJob& /*job*/) { loop.stop(); });
+  // As every dump's archive has it: with the hash of each file.
+  job->endWith({"Manifest.json", [](const ArchiveContent& content) {
+                  std::string rows;
+                  for (const ArchivedFile& file : content.files) rows += file.name + ' ' + file.sha256 + '\n';
+                  return rows;
+                }});
   job->start();
   loop.run();
   return std::filesystem::exists(output);

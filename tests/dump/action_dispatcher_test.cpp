@@ -5,6 +5,7 @@
 #include <filesystem>
 #include <limits>
 
+#include "dump/planned_steps.h"
 #include "tests/dump/action_fixture.h"
 
 namespace zal {
@@ -67,11 +68,11 @@ TEST_F(ActionDispatcherTest, VideoCallLogsAreCollectedIntoAReceiversDirectoryWit
   EXPECT_THAT(fake.dumpProgress.plans, SizeIs(1));
   EXPECT_EQ(plan().service, "Vistel");
   EXPECT_EQ(plan().directory, receiverDirectory(root));
-  EXPECT_EQ(plan().steps, ServiceCollection::stepNames({.service = "Vistel",
-                                                        .destination = "",
-                                                        .reason = std::nullopt,
-                                                        .background = false,
-                                                        .flags = 0x5F}));
+  EXPECT_EQ(plan().steps, wantedNames(ServiceCollection::plan({.service = "Vistel",
+                                                               .destination = "",
+                                                               .reason = std::nullopt,
+                                                               .background = false,
+                                                               .flags = 0x5F})));
   EXPECT_THAT(plan().steps, Not(Contains("Stackshot")));
 }
 
@@ -190,11 +191,11 @@ TEST_F(ActionDispatcherTest, MessagingLogsAreCollectedWithTheReasonBesideTheRegi
   ASSERT_THAT(fake.dumpProgress.plans, SizeIs(1));
   EXPECT_EQ(plan().service, "Quillet");
   EXPECT_EQ(plan().directory, receiverDirectory(root));
-  EXPECT_EQ(plan().steps, ServiceCollection::stepNames({.service = "Quillet",
-                                                        .destination = "",
-                                                        .reason = std::nullopt,
-                                                        .background = false,
-                                                        .flags = 0x5F}));
+  EXPECT_EQ(plan().steps, wantedNames(ServiceCollection::plan({.service = "Quillet",
+                                                               .destination = "",
+                                                               .reason = std::nullopt,
+                                                               .background = false,
+                                                               .flags = 0x5F})));
   finish();
   EXPECT_THAT(fake.telephony.basebandDumps, ElementsAre("no delivery"));
   EXPECT_THAT(fake.fileCopier.started, SizeIs(1));

@@ -1,5 +1,6 @@
 #include "dump/closing_stages.h"
 
+#include "dump/planned_steps.h"
 #include "tests/dump/collection_fixture.h"
 
 namespace zal {
@@ -23,7 +24,6 @@ class ClosingStagesTest : public testing::CollectionFixture {
 
   [[nodiscard]] ClosingWork work(CollectionFlags flags, const std::string& directory = "dump") {
     const std::string top = host.home / directory;
-    DumpPlan plan{.service = "Vistel", .directory = top, .steps = ClosingStages::stepNames(flags)};
     return {.service = "Vistel",
             .destination = top,
             .pushLogs = top + "/Push Logs",
@@ -36,7 +36,9 @@ class ClosingStagesTest : public testing::CollectionFixture {
             .reason = {},
             .flags = flags,
             .startTime = host.host.wallNow(),
-            .progress = host.dumpProgress.begin(std::move(plan)),
+            .record = beginRecord(
+                host.platform, collectors.witnesses,
+                {.service = "Vistel", .directory = top, .flags = flags, .steps = ClosingStages::plan(flags)}),
             .firstStep = 1,
             .completion = [this] { ++completions; }};
   }
@@ -324,7 +326,7 @@ TEST_F(ClosingStagesTest, EveryCombinationOfFlagsRunsExactlyItsPlan) {
     advance(8s);
     std::size_t number = 0;
     Lines expected{"BEGIN Vistel " + (host.home / "dump")};
-    for (const std::string& name : ClosingStages::stepNames(flags)) {
+    for (const std::string& name : wantedNames(ClosingStages::plan(flags))) {
       expected.push_back("STEP " + std::to_string(++number) + " " + name);
     }
     host.dumpProgress.lines.pop_back();
@@ -332,13 +334,30 @@ TEST_F(ClosingStagesTest, EveryCombinationOfFlagsRunsExactlyItsPlan) {
   }
 }
 
+TEST_F(ClosingStagesTest, ArchiveEndsWithAManifestOfAllStepsAndFiles) {
+  host.fileCopier.content.files = {{"Power/log.txt", 3, "ab12", false}};
+  run(0);
+  advance(8s);
+  ASSERT_EQ(host.fileCopier.endings.size(), 1U);
+  const std::string& manifest = host.fileCopier.endings[0];
+  for (const char* row :
+       {R"({"step": "Stackshot", "state": "skipped", "why": ["flag 0x20 is not set"]})",
+        R"({"step": "Thermal log", "state": "missing", "began": "2024-05-02T)",
+        R"({"step": "Waiting for slow writers", "state": "done", "began": "2024-05-02T)",
+        R"("milliseconds": 8000)", R"({"file": "Power/log.txt", "bytes": 3, "sha256": "ab12"})"}) {
+    EXPECT_NE(manifest.find(row), std::string::npos) << row << " in " << manifest;
+  }
+}
+
 TEST_F(ClosingStagesTest, FirstStepOfAPlanThatBeganEarlierIsCountedOn) {
   ClosingWork later = work(0);
-  later.progress =
-      host.dumpProgress.begin({.service = "Vistel", .directory = "d", .steps = {"a", "b", "c", "d"}});
+  std::vector<PlannedStep> steps = ClosingStages::plan(0);
+  steps.insert(steps.begin(), {.name = "an earlier step", .isWanted = true, .whyNot = ""});
+  later.record = beginRecord(host.platform, collectors.witnesses,
+                             {.service = "Vistel", .directory = "d", .flags = 0, .steps = steps});
   later.firstStep = 2;
   closing.run(std::move(later));
-  EXPECT_EQ(host.dumpProgress.lines.back(), "STEP 4 d");
+  EXPECT_EQ(host.dumpProgress.lines.back(), "STEP 4 Waiting for slow writers");
 }
 
 }  // namespace

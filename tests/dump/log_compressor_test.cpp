@@ -173,6 +173,7 @@ TEST_F(LogCompressorTest, RequestsFromSeveralThreadsAreAllCarriedOut) {
     struct Job : FileCopierJob {
       Job(WorkQueue& on, Completion done) : queue(on), completion(std::move(done)) {}
       [[nodiscard]] const std::string& identifier() const override { return name; }
+      void endWith(ArchiveEnding /*ending*/) override {}
       void start() override {
         queue.async([this] { completion(*this); });
       }

@@ -2,6 +2,7 @@
 
 #include <sys/stat.h>
 
+#include "dump/planned_steps.h"
 #include "tests/dump/collection_fixture.h"
 #include "tests/dump/prepared_host.h"
 
@@ -314,7 +315,7 @@ TEST_F(ServiceCollectionTest, PlanOfEverythingNamesEachStepInTheOrderOfTheRun) {
                     "Snapshots",
                     "Packet captures",
                     "Archive"};
-  EXPECT_EQ(ServiceCollection::stepNames(request("Vistel", kEveryStep)), names);
+  EXPECT_EQ(wantedNames(ServiceCollection::plan(request("Vistel", kEveryStep))), names);
   prepareHost(host);
   collect("Vistel", kEveryStep);
   advance(8s);
@@ -336,7 +337,7 @@ TEST_F(ServiceCollectionTest, EachFlagAloneRunsExactlyItsPlan) {
     advance(8s);
     std::size_t number = 0;
     Lines expected{"BEGIN Quillet " + (host.home / "dump")};
-    for (const std::string& name : ServiceCollection::stepNames(request("Quillet", flags))) {
+    for (const std::string& name : wantedNames(ServiceCollection::plan(request("Quillet", flags)))) {
       expected.push_back("STEP " + std::to_string(++number) + " " + name);
     }
     EXPECT_EQ(host.dumpProgress.lines, expected) << flags;

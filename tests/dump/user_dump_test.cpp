@@ -2,6 +2,7 @@
 
 #include <gmock/gmock.h>
 
+#include "dump/planned_steps.h"
 #include "tests/dump/action_fixture.h"
 
 namespace zal {
@@ -142,11 +143,11 @@ TEST_F(UserDumpTest, TheTimeIsThatOfTheRequestNotOfTheAnswer) {
 
 TEST_F(UserDumpTest, FlagsAre32BitsOfWhateverIsSent) {
   dump({{"displayFlags", std::int64_t{4}}, {"collectionFlags", std::int64_t{0x1'0000'0008}}});
-  EXPECT_EQ(fake.dumpProgress.plans.at(0).steps, ServiceCollection::stepNames({.service = "Vistel",
-                                                                               .destination = "",
-                                                                               .reason = std::nullopt,
-                                                                               .background = false,
-                                                                               .flags = 0x8}));
+  EXPECT_EQ(fake.dumpProgress.plans.at(0).steps, wantedNames(ServiceCollection::plan({.service = "Vistel",
+                                                                                      .destination = "",
+                                                                                      .reason = std::nullopt,
+                                                                                      .background = false,
+                                                                                      .flags = 0x8})));
 }
 
 TEST_F(UserDumpTest, OnlyAReportFlagFilesAReport) {

@@ -47,6 +47,8 @@ class FakeFileCopier : public FileCopier {
     bool operator==(const Request&) const = default;
   };
   std::vector<Request> started;
+  ArchiveContent content;            ///< what the jobs say that they have archived
+  std::vector<std::string> endings;  ///< the texts that archives ended with
   bool writesArchives = true;
   bool holdsBack = false;
   std::vector<std::function<void()>> heldBack;
@@ -65,10 +67,12 @@ class FakeFileCopier : public FileCopier {
     Job(FakeFileCopier& owner, Request request, WorkQueue& queue, Completion completion)
         : _owner(owner), _request(std::move(request)), _queue(queue), _completion(std::move(completion)) {}
     [[nodiscard]] const std::string& identifier() const override { return _request.identifier; }
+    void endWith(ArchiveEnding ending) override { _ending = std::move(ending); }
     void start() override {
       _owner.started.push_back(_request);
       if (_owner.writesArchives && std::filesystem::is_directory(_request.input)) {
         std::ofstream(_request.output) << "archive of " << _request.input;
+        if (_ending.text) _owner.endings.push_back(_ending.text(_owner.content));
       }
       const auto complete = [this, weak = weak_from_this()] {
         // As the real one: whoever let go of the job hears nothing.
@@ -86,6 +90,7 @@ class FakeFileCopier : public FileCopier {
     Request _request;
     WorkQueue& _queue;
     Completion _completion;
+    ArchiveEnding _ending;
   };
 };
 

@@ -45,10 +45,21 @@ class ChunkPipeline::Worker {
     char* const input = task.method == ZipMethod::stored ? slot.output.get() : _input.get();
     result.read = readChunk(task, input, result.error);
     result.crc = ::crc32_gzip_refl(0, reinterpret_cast<const unsigned char*>(input), result.read);
+    // While the bytes are at hand; when it is not this chunk's turn, packing it is a better use of the time.
+    const bool hashFirst = task.hash && task.hash->isTurn(task.offset);
+    if (hashFirst) task.hash->add(task.offset, input, result.read, task.size);
     if (task.method == ZipMethod::stored) {
       result.size = result.read;
-      return;
+    } else {
+      _pack(slot, input);
     }
+    if (task.hash && !hashFirst) task.hash->add(task.offset, input, result.read, task.size);
+  }
+
+ private:
+  void _pack(Slot& slot, const char* input) {
+    const ChunkTask& task = slot.task;
+    ChunkResult& result = slot.result;
     result.endsStream = task.last;
     if (_isEmptyChunk(task, result.read)) {
       std::memcpy(slot.output.get(), _emptyChunk.data(), _emptyChunk.size());
@@ -68,8 +79,6 @@ class ChunkPipeline::Worker {
       result.size = storeChunk(input, result.read, task.last, slot.output.get());
     }
   }
-
- private:
   /// Whether it is one of the chunks of zeros that sparse files are full of. They are compressed once.
   bool _isEmptyChunk(const ChunkTask& task, std::size_t read) {
     const char* const input = _input.get();
@@ -124,7 +133,9 @@ const ChunkResult& ChunkPipeline::oldest() {
 }
 
 void ChunkPipeline::dropOldest() {
-  _slots[_dropped % _slots.size()].task.file.reset();
+  ChunkTask& task = _slots[_dropped % _slots.size()].task;
+  task.file.reset();
+  task.hash.reset();
   ++_dropped;
 }
 

@@ -11,6 +11,7 @@
 
 #include "platform/configuration.h"
 #include "platform/linux/archive/chunk_compressor.h"
+#include "platform/linux/archive/file_hash.h"
 #include "platform/linux/archive/worker_threads.h"
 #include "platform/linux/archive/zip_container.h"
 #include "platform/linux/files/descriptor.h"
@@ -24,6 +25,7 @@ struct ChunkTask {
   std::size_t size = 0;                    ///< 1 to kChunkSize
   bool first = true, last = true;          ///< of its file
   ZipMethod method = ZipMethod::deflated;  ///< a file of one chunk is stored all the same if that is shorter
+  std::shared_ptr<FileHash> hash;          ///< of its file; empty: nobody asks for it
 };
 
 /// What became of it.

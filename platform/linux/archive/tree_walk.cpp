@@ -30,7 +30,8 @@ const char* kindOf(mode_t mode) {
 
 }  // namespace
 
-TreeWalk::TreeWalk(const std::string& directory, Line leftOut) : _leftOut(std::move(leftOut)) {
+TreeWalk::TreeWalk(const std::string& directory, Line leftOut, Line renamed)
+    : _leftOut(std::move(leftOut)), _renamed(std::move(renamed)) {
   Descriptor opened(::open(directory.c_str(), kOpenDirectory));
   if (!opened.isOpen()) throw std::system_error(lastSystemError());
   const std::string name = std::filesystem::path(directory).filename().string();
@@ -106,7 +107,7 @@ FoundEntry TreeWalk::_enter(Descriptor opened, const std::string& path, const st
   }
   for (std::size_t i = 0; i < directory.entries.size(); ++i) {
     if (directory.entries[i] == directory.names[i]) continue;
-    _leftOut("A name in \"" + path + "\" is no UTF-8; in the archive it is \"" + directory.entries[i] + '"');
+    _renamed("A name in \"" + path + "\" is no UTF-8; in the archive it is \"" + directory.entries[i] + '"');
   }
   directory.opened = std::move(opened);
   _open.push_back(std::move(directory));

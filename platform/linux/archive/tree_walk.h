@@ -24,12 +24,13 @@ struct FoundEntry {
 
 /// Everything in a directory, itself first, directories before their content, names in the order of
 /// their bytes. Reads one directory at a time. Symbolic links are found, never followed. What is no
-/// file, directory or link, and what cannot be read, is left out with a line.
+/// file, directory or link, and what cannot be read, is left out with a line; so is told what goes by another
+/// name in an archive.
 class TreeWalk {
  public:
   using Line = std::function<void(const std::string&)>;
   /// Throws std::system_error when the directory cannot be read, is none, or is a link.
-  TreeWalk(const std::string& directory, Line leftOut);
+  TreeWalk(const std::string& directory, Line leftOut, Line renamed);
   /// The next one, nothing at the end. Throws std::system_error when this process, not the file, is at
   /// fault: without descriptors or memory nothing can be said about what is there.
   [[nodiscard]] std::optional<FoundEntry> next();
@@ -48,7 +49,7 @@ class TreeWalk {
   void _leaveOut(const std::string& path, const std::string& reason) const;
   void _leaveOutForError(const std::string& path) const;
 
-  const Line _leftOut;
+  const Line _leftOut, _renamed;
   std::vector<Directory> _open;  // from the outermost to the one being read
   std::optional<FoundEntry> _first;
 };

@@ -8,9 +8,11 @@
 #include <filesystem>
 #include <memory>
 #include <optional>
+#include <set>
 #include <system_error>
 #include <utility>
 
+#include <sys/mman.h>
 #include <unistd.h>
 
 #include "platform/linux/archive/archive_output.h"
@@ -18,6 +20,8 @@
 #include "platform/linux/archive/tree_walk.h"
 #include "platform/linux/archive/zip_container.h"
 #include "platform/linux/files/file_copy.h"
+#include "platform/linux/files/system_error.h"
+#include "platform/linux/files/whole_file.h"
 
 namespace zal {
 namespace {
@@ -26,14 +30,35 @@ namespace {
 constexpr std::size_t kMostWaiting = 256;
 /// Places of a large file that are tried before it is decided whether to compress it.
 constexpr std::uint64_t kTrialPlaces = 4;
+/// Lines about what was left out that the ending gets to know.
+constexpr std::size_t kMostRemarks = 1000;
+
+/// The text as a file that lies nowhere.
+FoundEntry textEntry(const std::string& name, std::string_view text) {
+  FoundEntry found;
+  found.path = found.entry.name = name;
+  found.file = Descriptor(::memfd_create("archive-ending", MFD_CLOEXEC));
+  if (!found.file.isOpen()) throw std::system_error(lastSystemError());
+  if (const std::error_code error = writeWhole(found.file.get(), text)) throw std::system_error(error);
+  if (::fstat(found.file.get(), &found.entry.status) != 0) throw std::system_error(lastSystemError());
+  found.entry.status.st_mode = S_IFREG | S_IRUSR | S_IWUSR | S_IRGRP | S_IROTH;
+  return found;
+}
 
 /// The walk gives entries, their files go through the pipeline as chunks, and what comes out goes into
 /// the container, all in one order.
 class ArchiveWriter {
  public:
   using Line = std::function<void(const std::string&)>;
-  ArchiveWriter(ArchiveOutput& output, ArchiveCompression compression, const Line& line)
-      : _output(output), _line(line), _container(output), _pipeline(compression) {}
+  ArchiveWriter(ArchiveOutput& output, ArchiveCompression compression, const ArchiveEnding& ending,
+                const Line& line)
+      : _output(output), _ending(ending), _line(line), _container(output), _pipeline(compression) {}
+
+  /// A line for what is left out or cut.
+  void remark(const std::string& line) {
+    _line(line);
+    if (_ending.text && _content.remarks.size() < kMostRemarks) _content.remarks.push_back(line);
+  }
 
   std::uint64_t write(TreeWalk& walk) {
     while (std::optional<FoundEntry> found = walk.next()) {
@@ -43,6 +68,11 @@ class ArchiveWriter {
       _add(std::move(*found));
     }
     while (!_waiting.empty()) _writeOldest();
+    if (_ending.text) {
+      const std::string text = _ending.text(_content);
+      _add(textEntry(_top + _freeName(), text));
+      while (!_waiting.empty()) _writeOldest();
+    }
     _container.finish();
     return _container.entries();
   }
@@ -54,10 +84,13 @@ class ArchiveWriter {
     std::string path, link;
     std::uint64_t size = 0;
     std::uint64_t chunks = 0;
+    std::shared_ptr<FileHash> hash;
   };
 
   void _add(FoundEntry found) {
-    Waiting waiting{std::move(found.entry), std::move(found.path), std::move(found.link)};
+    if (_top.empty()) _top = found.entry.name;
+    _noteName(std::string_view(found.entry.name).substr(_top.size()));
+    Waiting waiting{std::move(found.entry), std::move(found.path), std::move(found.link), 0, 0, nullptr};
     if (!found.file.isOpen()) {
       _waiting.push_back(std::move(waiting));
       return;
@@ -65,7 +98,10 @@ class ArchiveWriter {
     waiting.size = static_cast<std::uint64_t>(waiting.entry.status.st_size);
     waiting.chunks = (waiting.size + kChunkSize - 1) / kChunkSize;
     const auto file = std::make_shared<const Descriptor>(std::move(found.file));
-    ChunkTask task{file};
+    if (_ending.text && waiting.chunks > 0) waiting.hash = std::make_shared<FileHash>();
+    ChunkTask task;
+    task.file = file;
+    task.hash = waiting.hash;
     task.method =
         waiting.chunks > 1 && !_shrinks(*file, waiting.size) ? ZipMethod::stored : ZipMethod::deflated;
     const std::uint64_t size = waiting.size;
@@ -98,6 +134,7 @@ class ArchiveWriter {
       _container.beginEntry(oldest.entry, ZipMethod::stored, 0);
       if (!oldest.link.empty()) _container.write(oldest.link.data(), oldest.link.size());
       _container.endEntry(oldest.link.size(), _crcOf(oldest.link));
+      if (!oldest.entry.name.ends_with('/')) _noteFile(oldest, oldest.link.size(), _sha256Of(oldest.link));
       _waiting.pop_front();
       return;
     }
@@ -105,14 +142,17 @@ class ArchiveWriter {
     if (!_current.ended) _writeChunk(oldest, result);
     _pipeline.dropOldest();
     if (++_current.chunk < oldest.chunks) return;
-    if (_current.begun) _endEntry();
+    if (_current.begun) {
+      _endEntry();
+      _noteFile(oldest, _current.size, oldest.hash ? oldest.hash->takeDigest() : "");
+    }
     _current = {};
     _waiting.pop_front();
   }
 
   void _writeChunk(const Waiting& waiting, const ChunkResult& result) {
     if (result.error && result.read == 0 && !_current.begun) {
-      _line('"' + waiting.path + "\" is left out of the archive: " + result.error.message());
+      remark('"' + waiting.path + "\" is left out of the archive: " + result.error.message());
       _current.ended = true;
       return;
     }
@@ -130,9 +170,9 @@ class ArchiveWriter {
     const std::uint64_t expected = std::min<std::uint64_t>(waiting.size, (_current.chunk + 1) * kChunkSize);
     if (_current.size == expected) return;
     _current.ended = true;
-    _line('"' + waiting.path + "\" is cut in the archive after " + std::to_string(_current.size) + " of " +
-          std::to_string(waiting.size) + " bytes: " +
-          (result.error ? result.error.message() : std::string("it became shorter while it was read")));
+    remark('"' + waiting.path + "\" is cut in the archive after " + std::to_string(_current.size) + " of " +
+           std::to_string(waiting.size) + " bytes: " +
+           (result.error ? result.error.message() : std::string("it became shorter while it was read")));
   }
 
   void _endEntry() {
@@ -148,8 +188,36 @@ class ArchiveWriter {
         ::crc32(0, reinterpret_cast<const unsigned char*>(text.data()), static_cast<unsigned>(text.size())));
   }
 
+  std::string _sha256Of(const std::string& text) {
+    if (!_ending.text) return "";
+    _hash.add(text.data(), text.size());
+    return _hash.takeDigest();
+  }
+  void _noteFile(const Waiting& waiting, std::uint64_t bytes, std::string sha256) {
+    if (!_ending.text) return;
+    _content.files.push_back(
+        {waiting.entry.name.substr(_top.size()), bytes, std::move(sha256), bytes != _sizeOf(waiting)});
+  }
+  static std::uint64_t _sizeOf(const Waiting& waiting) {
+    return waiting.chunks > 0 ? waiting.size : waiting.link.size();
+  }
+  void _noteName(std::string_view below) {
+    if (_ending.text && below.starts_with(_ending.name)) _taken.emplace(below.substr(0, below.find('/')));
+  }
+  std::string _freeName() const {
+    std::string name = _ending.name;
+    for (int number = 2; _taken.count(name) != 0; ++number)
+      name = _ending.name + '-' + std::to_string(number);
+    return name;
+  }
+
   ArchiveOutput& _output;
+  const ArchiveEnding& _ending;
   const Line& _line;
+  std::string _top;              // the first entry: that of the directory
+  std::set<std::string> _taken;  // names below it that the ending's may have to make way for
+  ArchiveContent _content;
+  Sha256 _hash;
   ZipContainer _container;
   CompressionTrial _trial;
   std::deque<Waiting> _waiting;
@@ -166,15 +234,24 @@ class ArchiveWriter {
 }  // namespace
 
 ArchiveOutcome writeZipArchive(const std::string& directory, const std::string& output,
-                               ArchiveCompression compression,
+                               ArchiveCompression compression, const ArchiveEnding& ending,
                                const std::function<void(const std::string&)>& line) {
   ArchiveOutcome outcome;
   try {
-    TreeWalk walk(directory, line);
+    // The walk is there before the output is made, and what it leaves out at its beginning waits so long.
+    std::vector<std::string> early;
+    ArchiveWriter* writer = nullptr;
+    const auto leftOut = [&](const std::string& text) {
+      writer != nullptr ? writer->remark(text) : early.push_back(text);
+    };
+    TreeWalk walk(directory, leftOut, line);
     ArchiveOutput file(output);
     outcome.outputIsOurs = file.isMade();
     if (file.error()) throw std::system_error(file.error(), output);
-    outcome.entries = ArchiveWriter(file, compression, line).write(walk);
+    ArchiveWriter archive(file, compression, ending, line);
+    for (const std::string& text : early) archive.remark(text);
+    writer = &archive;
+    outcome.entries = archive.write(walk);
     file.sync();
     if (file.error()) throw std::system_error(file.error());
     // The archive's name as well; some file systems refuse, and it is there all the same.

@@ -5,6 +5,7 @@
 #include <string>
 
 #include "platform/configuration.h"
+#include "platform/file_copier.h"
 
 namespace zal {
 
@@ -16,10 +17,10 @@ struct ArchiveOutcome {
 };
 
 /// Writes the directory into a new zip archive at `output` and syncs it. `line` gets a line for
-/// everything that is left out or cut, on the calling thread. Waits for disks; compresses on threads of
-/// its own.
+/// everything that is left out or cut, on the calling thread, and so does the ending's text, if there is
+/// one. Waits for disks; compresses on threads of its own.
 [[nodiscard]] ArchiveOutcome writeZipArchive(const std::string& directory, const std::string& output,
-                                             ArchiveCompression compression,
+                                             ArchiveCompression compression, const ArchiveEnding& ending,
                                              const std::function<void(const std::string&)>& line);
 
 }  // namespace zal

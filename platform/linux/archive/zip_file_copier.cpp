@@ -32,13 +32,15 @@ class ZipJob : public FileCopierJob, public std::enable_shared_from_this<ZipJob>
 
   [[nodiscard]] const std::string& identifier() const override { return _description.identifier; }
 
+  void endWith(ArchiveEnding ending) override { _ending = std::move(ending); }
+
   void start() override {
     _queues.global(QueuePriority::standard).async([self = shared_from_this()] { self->_write(); });
   }
 
  private:
   void _write() {
-    _outcome = writeZipArchive(_description.input, _description.output, _description.compression,
+    _outcome = writeZipArchive(_description.input, _description.output, _description.compression, _ending,
                                [this](const std::string& line) { _log.notice(line); });
     if (!_outcome.failure.empty()) return _fail(_outcome.failure);
     _queues.global(QueuePriority::standard).async([self = shared_from_this()] { self->_check(); });
@@ -74,6 +76,7 @@ class ZipJob : public FileCopierJob, public std::enable_shared_from_this<ZipJob>
   AgentLog& _log;
   WorkQueue& _queue;
   FileCopier::Completion _completion;
+  ArchiveEnding _ending;
   ArchiveOutcome _outcome;
 };
 

@@ -16,7 +16,7 @@ class ZipCheckTest : public ::testing::Test {
     for (int i = 0; i < 300; ++i) text += "line " + std::to_string(i) + "\n";
     writeFile(directory / "Dump/log.txt", text);
     writeFile(directory / "Dump/stored", "x");
-    const auto outcome = writeZipArchive(directory / "Dump", archive, ArchiveCompression::fast,
+    const auto outcome = writeZipArchive(directory / "Dump", archive, ArchiveCompression::fast, {},
                                          [](const std::string& line) { ADD_FAILURE() << line; });
     ASSERT_EQ(outcome.failure, "");
     ASSERT_EQ(outcome.entries, 3U);

@@ -1,8 +1,8 @@
-#include "cli/json_text.h"
+#include "platform/json_text.h"
 
 #include <cstdio>
 
-#include "cli/utf8_walk.h"
+#include "platform/utf8_walk.h"
 
 namespace zal {
 namespace {

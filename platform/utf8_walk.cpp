@@ -1,4 +1,4 @@
-#include "cli/utf8_walk.h"
+#include "platform/utf8_walk.h"
 
 namespace zal {
 
