@@ -3,7 +3,10 @@
 #include <cstdint>
 #include <optional>
 #include <string>
+#include <system_error>
 #include <vector>
+
+#include "platform/archive_inspection.h"
 
 namespace zal {
 
@@ -22,6 +25,8 @@ class ArchiveReader {
   /// One of them, whole; nothing when it cannot be read.
   [[nodiscard]] virtual std::optional<std::string> text(const std::string& archive,
                                                         const std::string& path) = 0;
+  /// Reads all of it. Returned: why nothing could be read; what is wrong with it stands in the inspection.
+  [[nodiscard]] virtual std::error_code inspect(const std::string& archive, ArchiveInspection& into) = 0;
 };
 
 }  // namespace zal

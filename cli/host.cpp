@@ -1,6 +1,8 @@
 #include "cli/host.h"
 
+#include <fcntl.h>
 #include <sys/ioctl.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include <cstdio>
@@ -13,11 +15,14 @@
 
 #include "platform/agent_log.h"
 #include "platform/linux/alerts/alert_file.h"
+#include "platform/linux/archive/inspect_archive.h"
 #include "platform/linux/archive/zip_contents.h"
 #include "platform/linux/config/configuration_loader.h"
 #include "platform/linux/config/host_environment.h"
 #include "platform/linux/config/host_paths.h"
 #include "platform/linux/config/toml_preference_store.h"
+#include "platform/linux/files/descriptor.h"
+#include "platform/linux/files/system_error.h"
 #include "platform/linux/loop/linux_clock.h"
 #include "platform/linux/notifications/notification_file.h"
 #include "platform/linux/progress/progress_file.h"
@@ -59,6 +64,15 @@ class ZipReader final : public ArchiveReader {
     const auto entries = listZip(archive);
     if (!entries || entries->empty()) return std::nullopt;
     return readZipEntry(archive, topOf(entries->front().name) + path);
+  }
+  [[nodiscard]] std::error_code inspect(const std::string& archive, ArchiveInspection& into) override {
+    const Descriptor file(::open(archive.c_str(), O_RDONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC));
+    struct stat status {};
+    if (!file.isOpen() || ::fstat(file.get(), &status) != 0) return lastSystemError();
+    if (S_ISDIR(status.st_mode)) return std::make_error_code(std::errc::is_a_directory);
+    if (!S_ISREG(status.st_mode)) return std::make_error_code(std::errc::invalid_argument);
+    into = inspectArchive(file.get());
+    return {};
   }
 
  private:

@@ -17,6 +17,7 @@ constexpr const char* kFooter = R"(Examples:
   lirractl end Vistel                     carried out three seconds later
   lirractl sessions show Vistel
   lirractl dump Vistel --description "no sound"
+  lirractl verify ARCHIVE                 is it whole, and what is missing in it
 
 A request command ends when the agent has confirmed that it handled the request. TYPE is the kind of
 session: Vistel, Registration, Nexa, Messages or any other name. Text that begins with a dash goes
@@ -28,7 +29,9 @@ Exit codes:
   2  wrong usage
   3  not found: a session, a preference, an alert, a file
   4  a file could not be read or written
-  5  the agent took the request, but no archive came of it: the dump failed or was cut off)";
+  5  the agent took the request, but no archive came of it: the dump failed or was cut off
+  6  verify: the archive is as it was made, but something that was wanted is missing in it
+  7  verify: the archive is damaged)";
 
 void addGlobalOptions(CLI::App& app, ToolOptions& options) {
   app.add_option("--socket", options.socketPath, "The agent's socket, instead of the usual place")
@@ -77,6 +80,7 @@ int runTool(const std::vector<std::string>& arguments, ToolHost& host, std::istr
   addAlertCommands(app, tool);
   addPreferenceCommands(app, tool);
   addSessionTreeCommands(app, tool);
+  addVerifyCommand(app, tool);
   addStatusCommand(app, tool);
 
   try {

@@ -22,6 +22,8 @@ enum class ExitCode : int {
   notFound = 3,
   fileTrouble = 4,
   dumpFailed = 5,  ///< the agent took the request, but no archive came of it
+  incomplete = 6,  ///< the archive is as it was made, but lacks something that was wanted
+  damaged = 7,     ///< the archive is not as it was made
 };
 
 /// Options that every command understands.
@@ -65,6 +67,7 @@ void addDumpCommands(CLI::App& app, ToolContext& tool);
 void addAlertCommands(CLI::App& app, ToolContext& tool);
 void addPreferenceCommands(CLI::App& app, ToolContext& tool);
 void addSessionTreeCommands(CLI::App& app, ToolContext& tool);
+void addVerifyCommand(CLI::App& app, ToolContext& tool);
 void addStatusCommand(CLI::App& app, ToolContext& tool);
 
 }  // namespace zal

@@ -32,6 +32,13 @@ class ScriptedArchives final : public ArchiveReader {
     if (found == archives.end() || !found->second.contains(path)) return std::nullopt;
     return found->second.at(path);
   }
+  std::map<std::string, ArchiveInspection> inspections;
+  [[nodiscard]] std::error_code inspect(const std::string& archive, ArchiveInspection& into) override {
+    const auto found = inspections.find(archive);
+    if (found == inspections.end()) return std::make_error_code(std::errc::no_such_file_or_directory);
+    into = found->second;
+    return {};
+  }
 };
 
 /// A machine whose answers a test sets.

@@ -26,18 +26,27 @@ EntryCheck::EntryCheck(int archive)
 EntryCheck::~EntryCheck() = default;
 
 std::string EntryCheck::check(const ZipDirectoryEntry& entry) {
-  const std::string name = '"' + entry.name + "\" ";
-  const auto content = ZipDirectory::contentOf(_archive, entry);
-  if (!content) return name + "has a header that does not fit";
+  const std::string trouble = troubleOf(entry, {});
+  return trouble.empty() ? "" : '"' + entry.name + "\" " + trouble;
+}
+
+std::string EntryCheck::troubleOf(const ZipDirectoryEntry& entry, const Content& content) {
+  const auto begin = ZipDirectory::contentOf(_archive, entry);
+  if (!begin) return "has a header that does not fit";
   _error.clear();
   _crc = 0;
-  const bool unpacked =
-      entry.method == kDeflated
-          ? _inflate(*content, entry.packedSize, entry.size)
-          : entry.method == kStored && entry.packedSize == entry.size && _readStored(*content, entry.size);
-  if (_error) return name + "cannot be read: " + _error.message();
-  if (!unpacked) return name + "cannot be unpacked";
-  return _crc == entry.crc ? "" : name + "has a wrong checksum";
+  const bool unpacked = entry.method == kDeflated
+                            ? _inflate(*begin, entry.packedSize, entry.size, content)
+                            : entry.method == kStored && entry.packedSize == entry.size &&
+                                  _readStored(*begin, entry.size, content);
+  if (_error) return "cannot be read: " + _error.message();
+  if (!unpacked) return "cannot be unpacked";
+  return _crc == entry.crc ? "" : "has a wrong checksum";
+}
+
+void EntryCheck::_take(const unsigned char* bytes, std::size_t size, const Content& content) {
+  _crc = ::crc32_gzip_refl(_crc, bytes, size);
+  if (content) content(reinterpret_cast<const char*>(bytes), size);
 }
 
 // The next bytes of the entry; none when the file ends or fails.
@@ -51,18 +60,19 @@ std::size_t EntryCheck::_read(std::uint64_t position, std::uint64_t limit) {
   }
 }
 
-bool EntryCheck::_readStored(std::uint64_t position, std::uint64_t size) {
+bool EntryCheck::_readStored(std::uint64_t position, std::uint64_t size, const Content& content) {
   while (size > 0) {
     const std::size_t got = _read(position, size);
     if (got == 0) return false;
-    _crc = ::crc32_gzip_refl(_crc, _input.get(), got);
+    _take(_input.get(), got, content);
     position += got;
     size -= got;
   }
   return true;
 }
 
-bool EntryCheck::_inflate(std::uint64_t position, std::uint64_t packed, std::uint64_t size) {
+bool EntryCheck::_inflate(std::uint64_t position, std::uint64_t packed, std::uint64_t size,
+                          const Content& content) {
   ::isal_inflate_init(_state.get());
   _state->avail_in = 0;
   std::uint64_t unpacked = 0;
@@ -81,8 +91,9 @@ bool EntryCheck::_inflate(std::uint64_t position, std::uint64_t packed, std::uin
     const int result = ::isal_inflate(_state.get());
     if (result < 0) return false;
     const std::size_t got = kOutput - _state->avail_out;
-    _crc = ::crc32_gzip_refl(_crc, _output.get(), got);
     unpacked += got;
+    if (unpacked > size) return false;
+    _take(_output.get(), got, content);
     // Bytes are still to come, but there are none.
     if (got == 0 && before == _state->avail_in && packed == 0 && _state->block_state != ISAL_BLOCK_FINISH) {
       return false;

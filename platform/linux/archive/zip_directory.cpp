@@ -81,7 +81,9 @@ bool ZipDirectory::_findDirectory() {
         loadLittle(locator.data(), 4) != kWideLocatorMark) {
       return false;
     }
+    const std::uint64_t records = _end - locator.size();
     _end = loadLittle(locator.data() + 8, 8);
+    if (_end > records || records - _end < wide.size()) return false;
     if (!readAt(_file, _end, wide.data(), wide.size()) || loadLittle(wide.data(), 4) != kWideEndMark) {
       return false;
     }

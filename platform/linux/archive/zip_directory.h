@@ -34,6 +34,8 @@ class ZipDirectory {
   [[nodiscard]] std::uint64_t entries() const { return _entries; }
   /// The next entry; nothing behind the last one or when what comes is no entry.
   [[nodiscard]] std::optional<ZipDirectoryEntry> next();
+  /// Whether all of it was gone through.
+  [[nodiscard]] bool isAtEnd() const { return _at == _end; }
   void rewind() { _at = _begin; }
 
   /// Where the entry's content begins; nothing when its own header does not say the same as the directory.
