@@ -43,6 +43,12 @@ struct BusSettings {
   bool enabled = true;  ///< false: nothing that speaks D-Bus is loaded, and every service of a bus is absent
 };
 
+/// `[blackbox]`
+struct BlackBoxSettings {
+  bool enabled = true;  ///< what sessions accept survives the end of the process
+  bool sync = false;    ///< and, once a client was told that it is safe, the end of the power
+};
+
 /// `[log]`
 struct LogSettings {
   std::vector<std::string> categories;       ///< switched on; LIRRA_LOG_CATEGORIES adds to them
@@ -93,6 +99,7 @@ struct Configuration {
   Interfaces interfaces;
   IpcSettings ipc;
   BusSettings bus;
+  BlackBoxSettings blackBox;
   LogSettings log;
   CommandSettings commands;
   CollectionSettings collection;

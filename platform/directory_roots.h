@@ -22,6 +22,7 @@ struct DirectoryRoots {
   std::string UartLogFile = "/dev/uart.log";
   std::string VarLogRoot = "/var/log";
   std::string RuntimeRoot;  ///< notifications, alerts, progress records; gone after a restart of the host
+  std::string StateRoot;    ///< what the agent keeps for its own next start
 };
 
 }  // namespace zal

@@ -21,6 +21,7 @@
 #include "platform/property_list_writer.h"
 #include "platform/radio_coexistence.h"
 #include "platform/run_loop.h"
+#include "platform/session_records.h"
 #include "platform/system_notifications.h"
 #include "platform/system_shell.h"
 #include "platform/telephony.h"
@@ -61,6 +62,7 @@ struct Platform {
   RadioCoexistence& radioCoexistence;
   PropertyListWriter& propertyLists;
   DumpProgressRecords& dumpProgress;
+  SessionRecords& sessionRecords;
 };
 
 }  // namespace zal

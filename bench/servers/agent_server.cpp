@@ -23,7 +23,7 @@ ChildProcess::Options AgentServer::options(const std::filesystem::path& programF
   settings << "[roots]\n";
   for (const char* root : {"UserLogRoot", "MobileLogRoot", "DiagnosticReportRoot", "WirelessLogRoot",
                            "WirelessReportRoot", "RootReportRoot", "SystemLogRoot", "SystemReportRoot",
-                           "NetworkConfigRoot", "TemporaryRoot", "VarLogRoot", "RuntimeRoot"}) {
+                           "NetworkConfigRoot", "TemporaryRoot", "VarLogRoot", "RuntimeRoot", "StateRoot"}) {
     settings << root << " = \"" << home << "/" << root << "\"\n";
   }
   settings << "[log]\nrotationSize = " << rotationSize << "\n";

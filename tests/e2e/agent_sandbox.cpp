@@ -86,6 +86,7 @@ void AgentSandbox::writeConfiguration() const {
       {"TemporaryRoot", _directory / "tmp"},
       {"VarLogRoot", _directory / "var-log"},
       {"RuntimeRoot", _directory / "runtime"},
+      {"StateRoot", _directory / "home/kept"},
   };
   for (const auto& [key, value] : roots) text << key << " = '" << value << "'\n";
   text << "[log]\n" << logSettings;

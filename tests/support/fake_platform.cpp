@@ -51,7 +51,8 @@ Platform FakePlatform::with(PreferenceStore& store) {
           .wifiDiagnostics = wifiDiagnostics,
           .radioCoexistence = radioCoexistence,
           .propertyLists = propertyLists,
-          .dumpProgress = dumpProgress};
+          .dumpProgress = dumpProgress,
+          .sessionRecords = sessionRecords};
 }
 
 // The ends of all fakes, and with each what the compiler makes once for a class: test files that use
@@ -77,6 +78,7 @@ FakeWifiDiagnostics::~FakeWifiDiagnostics() = default;
 FakeRadioCoexistence::~FakeRadioCoexistence() = default;
 FakePropertyListWriter::~FakePropertyListWriter() = default;
 RecordingDumpProgress::~RecordingDumpProgress() = default;
+FakeSessionRecords::~FakeSessionRecords() = default;
 FakeMessage::~FakeMessage() = default;
 FakePeer::~FakePeer() = default;
 FakeIpcService::~FakeIpcService() = default;

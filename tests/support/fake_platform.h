@@ -6,6 +6,7 @@
 #include "tests/support/fake_dump_services.h"
 #include "tests/support/fake_ipc.h"
 #include "tests/support/fake_services.h"
+#include "tests/support/fake_session_records.h"
 #include "tests/support/manual_run_loop.h"
 #include "tests/support/manual_work_queues.h"
 #include "tests/support/plain_file_placement.h"
@@ -57,6 +58,7 @@ class FakePlatform {
   FakeRadioCoexistence radioCoexistence;
   FakePropertyListWriter propertyLists;
   RecordingDumpProgress dumpProgress;
+  FakeSessionRecords sessionRecords;
 
   Platform platform = with(preferences);
 

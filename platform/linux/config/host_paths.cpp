@@ -87,6 +87,7 @@ DirectoryRoots defaultDirectoryRoots(const HostEnvironment& environment) {
   roots.MediaLogCacheDir = below(caches, "Media");
   roots.LocationCacheDir = below(caches, "Location");
   roots.RuntimeRoot = runtimeRoot(environment);
+  roots.StateRoot = state;
   return roots;
 }
 

@@ -61,7 +61,11 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
       _ipc(_mainLoop.context(), _mainLoop, _agentLog,
            {.path = socketPath(environment).value_or(""),
             .settings = _loaded.configuration.ipc,
-            .flush = [this] { _logFiles.flush(); }}),
+            .flush = [this] { _logFiles.flush(); },
+            .confirm = [this] { _keepWhatCame(); }}),
+      // Before the log files: what it has to say is in them when the loop sleeps.
+      _sessionRecords(_mainLoop, _agentLog, _loaded.configuration.roots.StateRoot + "/BlackBox",
+                      _loaded.configuration.blackBox),
       _logFiles({_clock, _mainLoop, _queues, _agentLog}, _loaded.configuration.roots.UserLogRoot,
                 _loaded.configuration.log),
       _logMirror(_logFiles, {_clock, _mainLoop, _agentLog}, _loaded.configuration.log.journalSocket),
@@ -88,7 +92,7 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
                .systemBus = systemBusAddress(environment),
                .sessionBus = sessionBusAddress(environment),
                .isSystem = environment.isSystem(),
-               .flush = [this] { _logFiles.flush(); },
+               .flush = [this] { _keepWhatCame(); },
                .startBasebandDump = [this](std::string_view reason) { _basebandDumps.start(reason); }},
       _bus(_busHost, busModulePath(environment)),
       _ipcWithBus(_ipc, _bus),
@@ -114,6 +118,7 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
         _ipc.stopListening();
         _userAlerts.cutOffWaiting();
         _queueingShell.startWhatIsQueued();
+        _sessionRecords.flush();
         _logFacility.flush();
       }),
       _hostSignals(_mainLoop, [this] { _announceTermination(); }),
@@ -144,7 +149,8 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
                 .wifiDiagnostics = _wifiDiagnostics,
                 .radioCoexistence = _radioCoexistence,
                 .propertyLists = _propertyLists,
-                .dumpProgress = _dumpProgress} {
+                .dumpProgress = _dumpProgress,
+                .sessionRecords = _sessionRecords} {
   std::signal(SIGPIPE, SIG_IGN);
   if (_loaded.configuration.alerts.screen) _userAlerts.showOn(_screens);
   makeRootParents(_loaded.configuration.roots);
@@ -153,6 +159,11 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
   for (const std::string& warning : _loaded.warnings) _agentLog.warning(warning);
   removeTemporaryLeftoversLater(_queues.global(QueuePriority::background), _clock, _agentLog,
                                 temporaryArea(_loaded.configuration.roots, environment));
+}
+
+void LinuxPlatform::_keepWhatCame() {
+  _sessionRecords.flush();
+  _logFiles.flush();
 }
 
 void LinuxPlatform::_announceTermination() {

@@ -8,6 +8,7 @@
 #include "platform/linux/alerts/runtime_alert_store.h"
 #include "platform/linux/archive/zip_file_copier.h"
 #include "platform/linux/baseband/baseband_dump_starter.h"
+#include "platform/linux/blackbox/file_session_records.h"
 #include "platform/linux/bus_module/announced_dump_progress.h"
 #include "platform/linux/bus_module/bus_module.h"
 #include "platform/linux/bus_module/ipc_with_bus.h"
@@ -57,6 +58,7 @@ class LinuxPlatform {
   [[nodiscard]] Platform& services() { return _services; }
 
  private:
+  void _keepWhatCame();
   void _announceTermination();
   void _announceDump(DumpNews news);
 
@@ -66,6 +68,7 @@ class LinuxPlatform {
   LinuxAgentLog _agentLog;
   LinuxWorkQueues _queues;
   UnixIpcService _ipc;
+  FileSessionRecords _sessionRecords;
   FileLogFacility _logFiles;
   MirroringLogFacility _logMirror;
   PlatformLogFacility& _logFacility;

@@ -25,13 +25,17 @@ inline constexpr std::size_t kReadBufferSize = 256U << 10U;
 /// borrowed parts. Main thread only.
 struct IpcContext {
   IpcContext(asio::io_context& loop, AgentLog& agentLog, IpcSettings ipcSettings,
-             std::function<void()> flushLogs)
-      : io(loop), log(agentLog), settings(std::move(ipcSettings)), flush(std::move(flushLogs)) {}
+             std::function<void()> flushLogs, std::function<void()> keepWhatCame = {})
+      : io(loop),
+        log(agentLog),
+        settings(std::move(ipcSettings)),
+        flush(std::move(flushLogs)),
+        confirm(keepWhatCame ? std::move(keepWhatCame) : flush) {}
 
   asio::io_context& io;
   AgentLog& log;
   const IpcSettings settings;
-  const std::function<void()> flush;
+  const std::function<void()> flush, confirm;
   PeerHandler handler;                          // set once, before the first peer
   bool delivering = false;                      // from the listener's resume to its end
   std::function<void()> stopListening = [] {};  // by whoever listens

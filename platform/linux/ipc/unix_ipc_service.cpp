@@ -22,7 +22,7 @@ UnixIpcService::UnixIpcService(asio::io_context& context, RunLoop& loop, AgentLo
       _path(std::move(options.path)),
       _passed(takePassedListener()),
       _context(std::make_shared<IpcContext>(context, log, std::move(options.settings),
-                                            std::move(options.flush))) {}
+                                            std::move(options.flush), std::move(options.confirm))) {}
 
 UnixIpcService::~UnixIpcService() {
   for (const auto& peer : peersOf(*_context)) peer->cancel();

@@ -27,7 +27,9 @@ class UnixIpcService final : public IpcService {
   struct Options {
     std::string path;  ///< of the socket; not used when a listening descriptor was passed
     IpcSettings settings;
-    std::function<void()> flush;  ///< brings all that was logged into the files; before each barrier's answer
+    std::function<void()> flush;      ///< brings all that was logged into the files
+    std::function<void()> confirm{};  ///< keeps all that came as safe as is promised, before each barrier's
+                                      ///< answer; none: flush
   };
 
   /// Takes the descriptor that a service manager passed, and its variables out of the environment:

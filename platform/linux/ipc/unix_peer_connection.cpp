@@ -97,7 +97,7 @@ void UnixPeerConnection::_takeFrame(const std::shared_ptr<PeerConnection>& self,
     case FrameKind::messageExpectingReply:
       return _takeMessage(self, frame);
     case FrameKind::barrier: {
-      if (_context->flush) _context->flush();
+      if (_context->confirm) _context->confirm();
       FrameHeader passed;
       passed.kind = FrameKind::barrierPassed;
       passed.cookie = frame.header.cookie;

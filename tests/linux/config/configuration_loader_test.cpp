@@ -81,6 +81,7 @@ TemporaryRoot = "/r/tmp"
 UartLogFile = "/r/uart.log"
 VarLogRoot = "/r/varlog"
 RuntimeRoot = "/r/run"
+StateRoot = "/r/state"
 [endpoints]
 reportHost = "report.example"
 cellPingServer = "192.0.2.1"
@@ -100,6 +101,9 @@ maximumPayload = 2048
 maximumReplyBacklog = 4096
 [bus]
 enabled = false
+[blackbox]
+enabled = false
+sync = true
 [log]
 categories = ["IPC", "Ping"]
 rotationSize = 1024
@@ -145,6 +149,7 @@ closingStageDelay = 0.25
   EXPECT_EQ(c.roots.UartLogFile, "/r/uart.log");
   EXPECT_EQ(c.roots.VarLogRoot, "/r/varlog");
   EXPECT_EQ(c.roots.RuntimeRoot, "/r/run");
+  EXPECT_EQ(c.roots.StateRoot, "/r/state");
   EXPECT_EQ(c.endpoints.reportServer, "report.example");
   EXPECT_EQ(c.endpoints.cellPingServer, "192.0.2.1");
   EXPECT_EQ(c.endpoints.wifiPingServer, "192.0.2.2");
@@ -160,6 +165,8 @@ closingStageDelay = 0.25
   EXPECT_EQ(c.ipc.maximumPayload, 2048U);
   EXPECT_EQ(c.ipc.maximumReplyBacklog, 4096U);
   EXPECT_FALSE(c.bus.enabled);
+  EXPECT_FALSE(c.blackBox.enabled);
+  EXPECT_TRUE(c.blackBox.sync);
   EXPECT_THAT(c.log.categories, ElementsAre("IPC", "Ping"));
   EXPECT_EQ(c.log.rotationSize, 1024U);
   EXPECT_EQ(c.log.maximumOpenFiles, 2U);

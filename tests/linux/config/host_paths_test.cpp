@@ -81,7 +81,8 @@ std::string table(DirectoryRoots roots) {
          roots.WirelessLogRoot + '\n' + roots.WirelessReportRoot + '\n' + roots.RootReportRoot + '\n' +
          roots.SystemLogRoot + '\n' + roots.SystemReportRoot + '\n' + roots.NetworkConfigRoot + '\n' +
          roots.MediaLogCacheDir + '\n' + roots.LocationCacheDir + '\n' + roots.TemporaryRoot + '\n' +
-         roots.UartLogFile + '\n' + roots.VarLogRoot + '\n' + roots.RuntimeRoot + '\n';
+         roots.UartLogFile + '\n' + roots.VarLogRoot + '\n' + roots.RuntimeRoot + '\n' +
+         roots.StateRoot + '\n';
 }
 
 TEST(HostPathsTest, AUsersRootsLieBelowTheStateDirectory) {
@@ -100,6 +101,7 @@ TEST(HostPathsTest, AUsersRootsLieBelowTheStateDirectory) {
 /dev/uart.log
 /var/log
 /home/ann/.local/state/lirra/run
+/home/ann/.local/state/lirra
 )");
 }
 
@@ -130,6 +132,7 @@ TEST(HostPathsTest, ASystemAgentUsesTheSystemsDirectories) {
 /dev/uart.log
 /var/log
 /run/lirra
+/var/lib/lirra
 )");
 }
 

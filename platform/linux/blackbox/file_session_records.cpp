@@ -1,0 +1,88 @@
+#include "platform/linux/blackbox/file_session_records.h"
+
+#include <unistd.h>
+
+#include <algorithm>
+#include <exception>
+#include <filesystem>
+#include <system_error>
+#include <utility>
+
+#include "platform/linux/blackbox/left_record.h"
+#include "platform/linux/blackbox/record_frame.h"
+
+namespace zal {
+namespace {
+
+std::vector<std::string> namesIn(const std::string& directory, AgentLog& log) {
+  std::vector<std::string> names;
+  std::error_code error;
+  std::filesystem::directory_iterator entry(directory, error);
+  for (; !error && entry != std::filesystem::directory_iterator(); entry.increment(error)) {
+    names.push_back(entry->path().filename().string());
+  }
+  if (error && error != std::errc::no_such_file_or_directory) {
+    log.warning("The black box cannot be read: " + directory + ": " + error.message());
+  }
+  std::sort(names.begin(), names.end());
+  return names;
+}
+
+}  // namespace
+
+FileSessionRecords::FileSessionRecords(RunLoop& loop, AgentLog& log, std::string directory,
+                                       const BlackBoxSettings& settings)
+    : _log(log), _directory(std::move(directory)), _settings(settings) {
+  loop.addSleepObserver([this, alive = std::weak_ptr<bool>(_alive)] {
+    if (!alive.expired()) _write();
+  });
+}
+
+std::shared_ptr<SessionRecord> FileSessionRecords::begin() {
+  if (!_settings.enabled) return nullptr;
+  try {
+    auto file = std::make_shared<RecordFile>(_log, _directory, _settings.sync);
+    _open.push_back(file);
+    return file;
+  } catch (const std::exception& exception) {
+    _log.warning(std::string("A session goes on without the black box: ") + exception.what());
+    return nullptr;
+  }
+}
+
+void FileSessionRecords::_write() {
+  std::erase_if(_open, [](const std::weak_ptr<RecordFile>& record) {
+    const auto file = record.lock();
+    if (file) file->write();
+    return !file;
+  });
+}
+
+void FileSessionRecords::flush() {
+  _write();
+  if (!_settings.sync) return;
+  for (const auto& record : _open) {
+    if (const auto file = record.lock()) file->sync();
+  }
+}
+
+void FileSessionRecords::recover(const std::function<bool(const UnfinishedRecord& record)>& handler) {
+  for (const std::string& name : namesIn(_directory, _log)) {
+    const auto left = LeftRecord::take(_directory, name, _log);
+    if (!left) continue;
+    try {
+      const std::string content = left->content();
+      if (handler(readRecordFrames(content, left->seed()))) {
+        if (_settings.sync) ::sync();  // what came of it, wherever that lies
+        left->remove();
+      } else {
+        left->putBack();
+      }
+    } catch (const std::exception& exception) {
+      _log.warning("A session could not be recovered from " + _directory + "/" + name + ": " +
+                   exception.what());
+    }
+  }
+}
+
+}  // namespace zal

@@ -1,0 +1,46 @@
+#pragma once
+
+#include <cstdint>
+#include <functional>
+#include <memory>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace zal {
+
+/// What one session accepted, piece by piece, until its log files have it. It outlives the process unless
+/// removed; letting go of it keeps it. Nothing here fails towards the caller: what cannot be kept is logged
+/// once. Main thread only.
+class SessionRecord {
+ public:
+  virtual ~SessionRecord() = default;
+  /// Adds a piece at the end; it is safe from the next flush on, or when the main loop sleeps.
+  virtual void append(std::string_view piece) = 0;
+  /// Takes it away: the files in that directory hold everything now, or nothing needs to be held when the
+  /// directory is empty. What is appended afterwards is lost.
+  virtual void remove(const std::string& writtenInto) = 0;
+};
+
+/// What is left of a record that its process did not come to remove.
+struct UnfinishedRecord {
+  std::vector<std::string_view> pieces;  ///< in order; borrowed for the call
+  std::uint64_t unreadableBytes = 0;     ///< damaged ones between the pieces, and a torn end
+};
+
+/// The black box: records of sessions that survive the end of the process, however it comes. Main thread
+/// only.
+class SessionRecords {
+ public:
+  virtual ~SessionRecords() = default;
+  /// A new, empty record; null when none are kept.
+  [[nodiscard]] virtual std::shared_ptr<SessionRecord> begin() = 0;
+  /// Brings everything that was appended out of the process; on to the medium where that is configured.
+  virtual void flush() = 0;
+  /// Calls the handler for each record that earlier processes left. True: it has served and goes. False: it
+  /// stays for the next time. One under which the process ends, or whose handler throws, is tried once more
+  /// the next time and then set aside (logged).
+  virtual void recover(const std::function<bool(const UnfinishedRecord& record)>& handler) = 0;
+};
+
+}  // namespace zal

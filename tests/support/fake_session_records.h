@@ -1,0 +1,53 @@
+#pragma once
+
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "platform/session_records.h"
+
+namespace zal::testing {
+
+/// A black box in memory, which a test can look into and carry over to another process's session.
+class FakeSessionRecords : public SessionRecords {
+ public:
+  ~FakeSessionRecords() override;
+  struct Kept {
+    std::vector<std::string> pieces;
+    bool isRemoved = false;
+    std::string writtenInto;
+    std::uint64_t unreadableBytes = 0;  ///< what the reader of the record is told
+  };
+  std::vector<std::shared_ptr<Kept>> records;
+  bool isEnabled = true;
+
+  [[nodiscard]] std::shared_ptr<SessionRecord> begin() override {
+    if (!isEnabled) return nullptr;
+    records.push_back(std::make_shared<Kept>());
+    return std::make_shared<Record>(records.back());
+  }
+  void flush() override {}
+  void recover(const std::function<bool(const UnfinishedRecord& record)>& handler) override {
+    for (const auto& kept : records) {
+      if (kept->isRemoved) continue;
+      const UnfinishedRecord left{{kept->pieces.begin(), kept->pieces.end()}, kept->unreadableBytes};
+      kept->isRemoved = handler(left);
+    }
+  }
+
+ private:
+  class Record : public SessionRecord {
+   public:
+    explicit Record(std::shared_ptr<Kept> kept) : _kept(std::move(kept)) {}
+    void append(std::string_view piece) override { _kept->pieces.emplace_back(piece); }
+    void remove(const std::string& writtenInto) override {
+      _kept->isRemoved = true;
+      _kept->writtenInto = writtenInto;
+    }
+
+   private:
+    std::shared_ptr<Kept> _kept;
+  };
+};
+
+}  // namespace zal::testing
