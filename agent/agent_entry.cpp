@@ -6,6 +6,7 @@
 #include <utility>
 
 #include "agent/agent_workshop.h"
+#include "agent/session_recovery.h"
 #include "agent/zal_logging_agent_server.h"
 
 namespace zal {
@@ -41,6 +42,7 @@ int runAgent(Platform& platform, SessionServices& sessionServices, AgentHooks ho
     return 0;
   }
   followHostSignals(platform, *server);
+  recoverSessions(platform, sessionServices);
   server->start();
   runMainLoop(platform);
   platform.logFacility.flush();

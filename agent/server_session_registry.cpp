@@ -3,7 +3,7 @@
 #include <string>
 #include <utility>
 
-#include "agent/home_relative_path.h"
+#include "agent/session_directory.h"
 #include "agent/session_type_key.h"
 #include "agent/zal_logging_agent_server.h"
 #include "platform/open_directories.h"
@@ -25,10 +25,8 @@ ZalLoggingAgentServer::Session ZalLoggingAgentServer::_sessionForSessionType(Opt
   const std::string key = sessionTypeKey(type);
   if (const auto found = _sessions.find(key); found != _sessions.end()) return found->second;
   if (!allowCreation) return nullptr;
-  const std::string directory =
-      homeRelativePath(_platform.configuration.roots.DiagnosticReportRoot, _platform.files.homeDirectory()) +
-      "/" + key;
-  auto session = std::make_shared<ZalLoggingAgentVistelSession>(key, directory, _sessionServices);
+  auto session =
+      std::make_shared<ZalLoggingAgentVistelSession>(key, sessionDirectory(_platform, key), _sessionServices);
   session->setLogCheckpointsToConsole(_switches.isConsoleOutput());
   session->setLogDescriptionsToConsole(_switches.isVerboseConsoleOutput());
   _sessions.emplace(key, session);

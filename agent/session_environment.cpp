@@ -25,6 +25,7 @@ SessionEnvironment::SessionEnvironment(Platform& platform, Collectors& collector
                 .endpoints = platform.configuration.endpoints,
                 .buildInformation = _buildInformation,
                 .timeZone = _timeZone,
-                .CollectServiceLogs = std::move(CollectServiceLogs)} {}
+                .CollectServiceLogs = std::move(CollectServiceLogs),
+                .sessionRecords = &platform.sessionRecords} {}
 
 }  // namespace zal

@@ -84,7 +84,7 @@ class BufferedFile {
 
 }  // namespace
 
-void writeStrings(const LogLines& strings, const std::string& path, AgentLog& log) {
+bool writeStrings(const LogLines& strings, const std::string& path, AgentLog& log) {
   BufferedFile file(path);
   // Neighbours in the file are mostly neighbours in the arena too, newline included; they go together.
   const bool plain = !strings.texts || strings.texts->isAscii();
@@ -104,9 +104,9 @@ void writeStrings(const LogLines& strings, const std::string& path, AgentLog& lo
     end = line.data() + units + 1;
   }
   file.append({begin, static_cast<std::size_t>(end - begin)});
-  if (const int error = file.close(); error != 0) {
-    log.warning("Could not write " + path + ": " + std::generic_category().message(error));
-  }
+  const int error = file.close();
+  if (error != 0) log.warning("Could not write " + path + ": " + std::generic_category().message(error));
+  return error == 0;
 }
 
 }  // namespace zal

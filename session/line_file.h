@@ -9,7 +9,8 @@ namespace zal {
 
 /// Writes each text as one line of a fresh file. Of a line's UTF-8 form only as many bytes are written
 /// as the line, newline included, has UTF-16 units: text beyond ASCII costs the line its end. The
-/// readers of these files expect exactly that. What the disk refuses is logged in one warning.
-void writeStrings(const LogLines& strings, const std::string& path, AgentLog& log);
+/// readers of these files expect exactly that. What the disk refuses is logged in one warning. Returned:
+/// whether it took everything.
+bool writeStrings(const LogLines& strings, const std::string& path, AgentLog& log);
 
 }  // namespace zal

@@ -12,33 +12,48 @@ constexpr std::string_view kDefaultFileCategory = "Collected Files";
 
 void ZalLoggingAgentVistelSession::noteCheckpoint(OptionalText checkpoint, double checkpointTime,
                                                   OptionalText sender) {
-  _mainThread.check("ZalLoggingAgentVistelSession");
-  _beginUnlessActive(sender);
+  _accept(
+      {.kind = SessionEntryKind::checkpoint, .text = checkpoint, .sender = sender, .time = checkpointTime});
+}
+
+void ZalLoggingAgentVistelSession::_addCheckpoint(const SessionEntry& entry) {
+  _beginUnlessActive(entry.sender, entry.at);
   const std::string line =
-      checkpointLine(checkpoint, sender, _entryTime(wallTimeFromSeconds(checkpointTime)));
+      checkpointLine(entry.text, entry.sender, _entryTime(wallTimeFromSeconds(entry.time)));
   if (_logCheckpoints) _services.agentLog.notice(echoOf(line));
-  _simpleLogs.addLog(line, checkpointTime);
-  _verboseLogs.addLog(line, checkpointTime);
+  _simpleLogs.addLog(line, entry.time);
+  _verboseLogs.addLog(line, entry.time);
   _markActive();
 }
 
 void ZalLoggingAgentVistelSession::logDescription(OptionalText description, OptionalText log,
                                                   OptionalText sender, double time) {
-  _mainThread.check("ZalLoggingAgentVistelSession");
-  const std::string_view name = textOr(sender, kNoSender);
-  _beginUnlessActive(name);
-  const std::string line = descriptionLine(description, log, name, _entryTime(wallTimeFromSeconds(time)));
+  _accept({.kind = SessionEntryKind::description,
+           .text = description,
+           .log = log,
+           .sender = sender,
+           .time = time});
+}
+
+void ZalLoggingAgentVistelSession::_addDescription(const SessionEntry& entry) {
+  const std::string_view name = textOr(entry.sender, kNoSender);
+  _beginUnlessActive(name, entry.at);
+  const std::string line =
+      descriptionLine(entry.text, entry.log, name, _entryTime(wallTimeFromSeconds(entry.time)));
   if (_logDescriptions) _services.agentLog.notice(echoOf(line));
-  _verboseLogs.addLog(line, time);
+  _verboseLogs.addLog(line, entry.time);
   _markActive();
 }
 
 void ZalLoggingAgentVistelSession::logQualityCategory(OptionalText category, OptionalText log,
                                                       OptionalText sender) {
-  _mainThread.check("ZalLoggingAgentVistelSession");
-  const std::string_view name = textOr(sender, kNoSender);
-  _beginUnlessActive(name);
-  const std::string line = descriptionLine(category, log, name, _entryTime(_services.clock.wallNow()));
+  _accept({.kind = SessionEntryKind::quality, .text = category, .log = log, .sender = sender});
+}
+
+void ZalLoggingAgentVistelSession::_addQuality(const SessionEntry& entry) {
+  const std::string_view name = textOr(entry.sender, kNoSender);
+  _beginUnlessActive(name, entry.at);
+  const std::string line = descriptionLine(entry.text, entry.log, name, _entryTime(entry.at));
   if (_logDescriptions) _services.agentLog.notice(echoOf(line));
   _qualityLogs.append(line);
   _markActive();
@@ -46,32 +61,29 @@ void ZalLoggingAgentVistelSession::logQualityCategory(OptionalText category, Opt
 
 void ZalLoggingAgentVistelSession::logCallInfo(OptionalText value, OptionalText category,
                                                OptionalText sender) {
-  _mainThread.check("ZalLoggingAgentVistelSession");
-  _beginUnlessActive(textOr(sender, kNoSender));
-  _addCallInfo(value, category);
-  _markActive();
+  _accept({.kind = SessionEntryKind::callInfo, .text = value, .log = category, .sender = sender});
 }
 
 void ZalLoggingAgentVistelSession::logQualityMetric(OptionalText name, std::optional<Number> value,
                                                     OptionalText sender) {
-  _mainThread.check("ZalLoggingAgentVistelSession");
   if (!name || !value) return;  // not worth a session
-  const std::string_view shown = textOr(sender, kNoSender);
-  _beginUnlessActive(shown);
-  _addQualityMetric(name, value, shown);
-  _markActive();
+  _accept({.kind = SessionEntryKind::metric, .text = name, .sender = sender, .value = value});
 }
 
 void ZalLoggingAgentVistelSession::addLogFile(OptionalText path, OptionalText /*sender*/,
                                               OptionalText category) {
-  _mainThread.check("ZalLoggingAgentVistelSession");
+  if (!path) return;
+  _accept({.kind = SessionEntryKind::file, .text = path, .log = category});
+}
+
+void ZalLoggingAgentVistelSession::_addFile(OptionalText path, OptionalText category) {
   if (!path) return;
   // Only an absent category has a name of its own; an empty one means the session directory itself.
   _filesToCollect[std::string(category.value_or(kDefaultFileCategory))].emplace(*path);
 }
 
-void ZalLoggingAgentVistelSession::_beginUnlessActive(OptionalText sender) {
-  if (!_active) beginSessionWithSender(sender);
+void ZalLoggingAgentVistelSession::_beginUnlessActive(OptionalText sender, WallTime now) {
+  if (!_active) _begin(sender, now);
 }
 
 void ZalLoggingAgentVistelSession::_addCallInfo(OptionalText value, OptionalText category) {

@@ -9,6 +9,7 @@
 #include "platform/standard_path.h"
 #include "session/date_text.h"
 #include "session/line_file.h"
+#include "session/session_lines.h"
 #include "session/vistel_session.h"
 
 namespace zal {
@@ -41,15 +42,15 @@ std::string ZalLoggingAgentVistelSession::logPathForDate(const SessionServices& 
   return resolveAndStandardize(joined, services.files.homeDirectory());
 }
 
-void ZalLoggingAgentVistelSession::_writeStrings(const LogLines& strings, const std::string& path,
+bool ZalLoggingAgentVistelSession::_writeStrings(const LogLines& strings, const std::string& path,
                                                  AgentLog& log) {
-  writeStrings(strings, path, log);
+  return writeStrings(strings, path, log);
 }
 
 void ZalLoggingAgentVistelSession::writeSessionLog(bool endedByEndAll) {
   _mainThread.check("ZalLoggingAgentVistelSession");
   AgentLog& log = _services.agentLog;
-  if (_simpleLogs.count() < kFewestLines && _verboseLogs.count() < kFewestLines &&
+  if (!_wasCutOff && _simpleLogs.count() < kFewestLines && _verboseLogs.count() < kFewestLines &&
       _qualityLogs.count() < kFewestLines) {
     log.log("Logging", "No logs to write, bailing");
     return;
@@ -61,6 +62,7 @@ void ZalLoggingAgentVistelSession::writeSessionLog(bool endedByEndAll) {
   if (hasControlCharacters(_logBasePath)) {
     log.warning("Refused to write into \"" + printable(_logBasePath) +
                 "\": its name holds control characters");
+    _isWritten = false;
     return;
   }
 
@@ -70,12 +72,18 @@ void ZalLoggingAgentVistelSession::writeSessionLog(bool endedByEndAll) {
   const std::string fileEnding = "Log (" + fileTimeText(_services.clock.localTime(*_dateStarted)) + ").log";
   LinkRecentLogSets(_services.fileCollector, _services.roots, log, {_sessionType}, directory);
 
+  const std::optional<std::string> recovered = headerLine("Recovered", _recoveryNote);
+  if (recovered) {
+    _simpleLogs.prependLog(*recovered);
+    _verboseLogs.prependLog(*recovered);
+  }
   _addTimeInformation();
   _addCallInfoInformation();
   _addBuildInformation();
   _addFailureInformation();
   _addRecipientInformation();
   _addInitiatorInformation();
+  if (recovered) _qualityLogs.insertAtFront(*recovered);
 
   const LogLines simple = _simpleLogs.copySortedLogList();
   const LogLines verbose = _verboseLogs.copySortedLogList();
@@ -83,11 +91,16 @@ void ZalLoggingAgentVistelSession::writeSessionLog(bool endedByEndAll) {
   _simpleLogs.removeAllObjects();
   _verboseLogs.removeAllObjects();
   _qualityLogs.removeAllObjects();
-  _writeStrings(simple, directory + "/" + fileEnding, log);
-  _writeStrings(verbose, directory + "/Verbose " + fileEnding, log);
-  _writeStrings(quality, directory + "/Quality " + fileEnding, log);
+  _isWritten = _writeStrings(simple, directory + "/" + fileEnding, log);
+  _isWritten &= _writeStrings(verbose, directory + "/Verbose " + fileEnding, log);
+  _isWritten &= _writeStrings(quality, directory + "/Quality " + fileEnding, log);
 
   placeCollectedFiles(_filesToCollect, directory, _services.fileCollector, log);
+  if (_isWritten) {
+    _recorder.remove(directory);
+  } else {
+    _recorder.leave();  // perhaps the disk takes them at the next start
+  }
 
   CollectionRequest request{_sessionType, directory, std::nullopt, !endedByEndAll, _endFlags};
   const auto reason = failureReason();

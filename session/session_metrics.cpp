@@ -23,22 +23,24 @@ std::vector<Number>& ZalLoggingAgentVistelSession::_metricsForKey(std::string_vi
   return _qualityMetrics[std::string(name)];
 }
 
-void ZalLoggingAgentVistelSession::_addQualityMetric(OptionalText name, std::optional<Number> value,
-                                                     OptionalText sender) {
-  if (!name || !value) return;
-  _metricsForKey(*name).push_back(*value);
-  const std::string_view shown = textOr(sender, kNoSender);
-  _beginUnlessActive(shown);
-  _qualityLogs.append(metricLine(*name, numberText(*value), shown, _entryTime(_services.clock.wallNow())));
+void ZalLoggingAgentVistelSession::_addQualityMetric(const SessionEntry& entry) {
+  if (!entry.text || !entry.value) return;
+  const std::string_view shown = textOr(entry.sender, kNoSender);
+  _beginUnlessActive(shown, entry.at);
+  _metricsForKey(*entry.text).push_back(*entry.value);
+  _qualityLogs.append(metricLine(*entry.text, numberText(*entry.value), shown, _entryTime(entry.at)));
 }
 
 void ZalLoggingAgentVistelSession::_gatherQualityMetrics() {
-  gatherSignalMetrics(_services.telephony, _services.networkStatus,
-                      [this, pulse = std::weak_ptr<bool>(_pulseIsOn)](const SignalMetricsSnapshot& snapshot) {
-                        // An answer that comes after the end would begin the session again.
-                        if (pulse.expired()) return;
-                        for (const auto& [name, value] : snapshot) _addQualityMetric(name, value, kOwnSender);
-                      });
+  gatherSignalMetrics(
+      _services.telephony, _services.networkStatus,
+      [this, pulse = std::weak_ptr<bool>(_pulseIsOn)](const SignalMetricsSnapshot& snapshot) {
+        // An answer that comes after the end would begin the session again.
+        if (pulse.expired()) return;
+        for (const auto& [name, value] : snapshot) {
+          _accept({.kind = SessionEntryKind::sample, .text = name, .sender = kOwnSender, .value = value});
+        }
+      });
 }
 
 void ZalLoggingAgentVistelSession::_appendQualityMetrics() {

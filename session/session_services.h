@@ -20,6 +20,7 @@ class FilePlacement;
 class LocalNotifications;
 class NetworkStatus;
 class RunLoop;
+class SessionRecords;
 class SystemVersion;
 class Telephony;
 class _ZalLoggingAgentPingRunner;
@@ -55,6 +56,7 @@ struct SessionServices {
   TimeZoneCache& timeZone;
   /// Called on the main thread as the last step of writing a session's files.
   std::function<void(const CollectionRequest&)> CollectServiceLogs = [](const CollectionRequest&) {};
+  SessionRecords* sessionRecords = nullptr;  ///< the black box; null: there is none
 };
 
 }  // namespace zal

@@ -18,23 +18,31 @@ ZalLoggingAgentVistelSession::ZalLoggingAgentVistelSession(std::string sessionTy
     : _services(services),
       _logBasePath(std::move(logDirectory)),
       _sessionType(std::move(sessionType)),
+      _recorder(services.sessionRecords, _sessionType),
       _dateFormatter(services.clock, services.timeZone) {}
+
+ZalLoggingAgentVistelSession::~ZalLoggingAgentVistelSession() {
+  if (!_active) _recorder.remove({});
+}
 
 void ZalLoggingAgentVistelSession::beginSessionWithSender(OptionalText sender) {
   _mainThread.check("ZalLoggingAgentVistelSession");
-  const std::string_view name = sender.value_or("");
   if (_active) {
-    endSessionWithSender(std::string(kForcedEnd).append(name));
+    endSessionWithSender(std::string(kForcedEnd).append(sender.value_or("")));
     // The end wrote already, unless there was too little: then this says so, and what there is goes
     // on into the new session.
     writeSessionLog(false);
   }
-  _dateStarted = _services.clock.wallNow();
+  _accept({.kind = SessionEntryKind::begin, .sender = sender});
+}
+
+void ZalLoggingAgentVistelSession::_begin(OptionalText sender, WallTime now) {
+  _dateStarted = now;
   _active = true;
-  const std::string line = beginLine(name, _entryTime(_services.clock.wallNow()));
+  const std::string line = beginLine(sender.value_or(""), _entryTime(now));
   if (_logCheckpoints) _services.agentLog.notice(echoOf(line));
-  _simpleLogs.addLog(line, _currentTimeOfDay());
-  _verboseLogs.addLog(line, _currentTimeOfDay());
+  _simpleLogs.addLog(line, secondsSinceEpoch(now));
+  _verboseLogs.addLog(line, secondsSinceEpoch(now));
   if (!_qualityPulse.isSet()) {
     _pulseIsOn = std::make_shared<bool>(true);
     _qualityPulse =
@@ -45,19 +53,22 @@ void ZalLoggingAgentVistelSession::beginSessionWithSender(OptionalText sender) {
 }
 
 void ZalLoggingAgentVistelSession::endSessionWithSender(OptionalText sender) {
-  _mainThread.check("ZalLoggingAgentVistelSession");
+  _accept({.kind = SessionEntryKind::end, .sender = sender});
+}
+
+void ZalLoggingAgentVistelSession::_end(OptionalText sender, WallTime now) {
   _qualityPulse.cancel();
   _pulseIsOn.reset();
-  _dateEnded = _services.clock.wallNow();
+  _dateEnded = now;
   _active = false;
   if (_simpleLogs.count() == 0 && _verboseLogs.count() == 0) {
     _cancelInactivityTimer();
     return;
   }
-  const std::string line = endLine(sender.value_or(""), _entryTime(_services.clock.wallNow()));
+  const std::string line = endLine(sender.value_or(""), _entryTime(now));
   if (_logCheckpoints) _services.agentLog.notice(echoOf(line));
-  _simpleLogs.addLog(line, _currentTimeOfDay());
-  _verboseLogs.addLog(line, _currentTimeOfDay());
+  _simpleLogs.addLog(line, secondsSinceEpoch(now));
+  _verboseLogs.addLog(line, secondsSinceEpoch(now));
   _qualityLogs.append(line);
   _appendQualityMetrics();
   writeSessionLog(sender == kEndAllSender);
@@ -86,10 +97,6 @@ void ZalLoggingAgentVistelSession::_postInactive() {
 
 std::string_view ZalLoggingAgentVistelSession::_entryTime(WallTime moment) {
   return _dateFormatter.text(moment);
-}
-
-double ZalLoggingAgentVistelSession::_currentTimeOfDay() const {
-  return secondsSinceEpoch(_services.clock.wallNow());
 }
 
 std::optional<std::string> ZalLoggingAgentVistelSession::_property(

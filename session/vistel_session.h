@@ -20,6 +20,8 @@
 #include "session/log_lines.h"
 #include "session/optional_text.h"
 #include "session/quality_log_list.h"
+#include "session/session_entry.h"
+#include "session/session_recorder.h"
 #include "session/session_services.h"
 #include "session/sorted_log_list.h"
 
@@ -47,6 +49,8 @@ class ZalLoggingAgentVistelSession : public std::enable_shared_from_this<ZalLogg
  public:
   /// The directory gets one subdirectory per session; a leading "~" is the user's home.
   ZalLoggingAgentVistelSession(std::string sessionType, std::string logDirectory, SessionServices& services);
+  /// Its record goes with it once it was ended.
+  ~ZalLoggingAgentVistelSession();
   ZalLoggingAgentVistelSession(const ZalLoggingAgentVistelSession&) = delete;
   ZalLoggingAgentVistelSession& operator=(const ZalLoggingAgentVistelSession&) = delete;
 
@@ -69,6 +73,15 @@ class ZalLoggingAgentVistelSession : public std::enable_shared_from_this<ZalLogg
   /// absent one is "Collected Files", an empty one the session directory itself.
   void addLogFile(OptionalText path, OptionalText sender, OptionalText category);
 
+  // A session of a process that was cut off, from its record. The services have no black box then.
+  /// Stands as "[Recovered: note]" at the top of every log that is written.
+  void setRecoveryNote(std::string note) { _recoveryNote = std::move(note); }
+  /// Takes an entry as of the moment at which it was taken first.
+  void replay(const SessionEntry& entry);
+  /// Ends the session if its record did not; then it is written however few lines it has. Returned:
+  /// whether all that was to be written is in its files.
+  bool endReplay(WallTime moment);
+
   /// Starts the ping tests of a call and adds their result files to the session's.
   void startPing(bool useWifi);
 
@@ -90,32 +103,50 @@ class ZalLoggingAgentVistelSession : public std::enable_shared_from_this<ZalLogg
   [[nodiscard]] bool logDescriptionsToConsole() const { return _logDescriptions; }
   void setLogDescriptionsToConsole(bool enabled) { _logDescriptions = enabled; }
   [[nodiscard]] bool isInitiator() const { return _initiator; }
-  void setIsInitiator(bool initiator) { _initiator = initiator; }
+  void setIsInitiator(bool initiator) { _accept({.kind = SessionEntryKind::role, .value = initiator}); }
   [[nodiscard]] std::uint32_t endFlags() const { return _endFlags; }
   void setEndFlags(std::uint32_t flags) { _endFlags = flags; }
 
-  // Copied whole on both ways; any thread. Absent when never set or set to nothing.
+  // Copied whole on both ways; any thread, but where there is a black box they are set on the main thread.
+  // Absent when never set or set to nothing.
   [[nodiscard]] std::optional<std::string> failureReason() const { return _property(_failureReason); }
-  void setFailureReason(OptionalText reason) { _setProperty(_failureReason, reason); }
+  void setFailureReason(OptionalText reason) {
+    _take(_failureReason, {.kind = SessionEntryKind::failureReason, .text = reason});
+  }
   [[nodiscard]] std::optional<std::string> initiator() const { return _property(_initiatorID); }
-  void setInitiator(OptionalText initiator) { _setProperty(_initiatorID, initiator); }
+  void setInitiator(OptionalText initiator) {
+    _take(_initiatorID, {.kind = SessionEntryKind::initiator, .text = initiator});
+  }
   [[nodiscard]] std::optional<std::string> recipient() const { return _property(_recipientID); }
-  void setRecipient(OptionalText recipient) { _setProperty(_recipientID, recipient); }
+  void setRecipient(OptionalText recipient) {
+    _take(_recipientID, {.kind = SessionEntryKind::recipient, .text = recipient});
+  }
 
  private:
+  void _accept(SessionEntry entry);
+  void _take(std::optional<std::string>& field, const SessionEntry& entry);
+  void _note(const SessionEntry& entry);
+  void _noteWhatIsKept(WallTime now);
+  void _carryOut(const SessionEntry& entry);
+
+  void _begin(OptionalText sender, WallTime now);
+  void _end(OptionalText sender, WallTime now);
   void _markActive();
   void _cancelInactivityTimer();
   void _postInactive();
 
   /// Valid until the next call.
   [[nodiscard]] std::string_view _entryTime(WallTime moment);
-  [[nodiscard]] double _currentTimeOfDay() const;
-  void _beginUnlessActive(OptionalText sender);
+  void _beginUnlessActive(OptionalText sender, WallTime now);
+  void _addCheckpoint(const SessionEntry& entry);
+  void _addDescription(const SessionEntry& entry);
+  void _addQuality(const SessionEntry& entry);
   void _addCallInfo(OptionalText value, OptionalText category);
+  void _addFile(OptionalText path, OptionalText category);
 
   [[nodiscard]] std::vector<std::string> _storedMetrics() const;
   [[nodiscard]] std::vector<Number>& _metricsForKey(std::string_view name);
-  void _addQualityMetric(OptionalText name, std::optional<Number> value, OptionalText sender);
+  void _addQualityMetric(const SessionEntry& entry);
   void _appendQualityMetrics();
   void _gatherQualityMetrics();
 
@@ -126,7 +157,7 @@ class ZalLoggingAgentVistelSession : public std::enable_shared_from_this<ZalLogg
   void _addFailureInformation();
   void _addRecipientInformation();
   void _addInitiatorInformation();
-  static void _writeStrings(const LogLines& strings, const std::string& path, AgentLog& log);
+  static bool _writeStrings(const LogLines& strings, const std::string& path, AgentLog& log);
   [[nodiscard]] static const std::string& _timeZoneAbbreviation(const SessionServices& services);
 
   [[nodiscard]] std::optional<std::string> _property(const std::optional<std::string>& field) const;
@@ -146,6 +177,10 @@ class ZalLoggingAgentVistelSession : public std::enable_shared_from_this<ZalLogg
   std::vector<std::string> _callInfoCategories, _callInfoStrings;  // parallel
   std::map<std::string, std::vector<Number>, std::less<>> _qualityMetrics;
   FilesByCategory _filesToCollect;
+  SessionRecorder _recorder;
+  std::optional<std::string> _recoveryNote;
+  bool _wasCutOff = false;
+  bool _isWritten = true;
   EntryTimeText _dateFormatter;
   bool _initiator = false;
   bool _active = false;

@@ -1,0 +1,83 @@
+#include "agent/session_recovery.h"
+
+#include <algorithm>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "agent/session_directory.h"
+#include "agent/session_type_key.h"
+#include "session/entry_codec.h"
+#include "session/entry_time_text.h"
+#include "session/vistel_session.h"
+
+namespace zal {
+namespace {
+
+/// A record whose pieces were understood.
+struct CutOffSession {
+  std::optional<std::string> type;
+  std::vector<SessionEntry> entries;
+  std::uint64_t unreadableBytes = 0;
+};
+
+CutOffSession understood(const UnfinishedRecord& record) {
+  CutOffSession session;
+  session.unreadableBytes = record.unreadableBytes;
+  for (const std::string_view piece : record.pieces) {
+    const auto entry = decodeEntry(piece);
+    if (!entry) {
+      session.unreadableBytes += piece.size();
+    } else if (entry->kind == SessionEntryKind::opened) {
+      session.type = std::string(entry->text.value_or(""));
+    } else {
+      session.entries.push_back(*entry);
+    }
+  }
+  return session;
+}
+
+/// The clock may have been set back in the call: the last entry says when it was, not the latest.
+WallTime lastHeardOf(const CutOffSession& session) { return session.entries.back().at; }
+
+std::string recoveryNote(const CutOffSession& session, SessionServices& services) {
+  EntryTimeText time(services.clock, services.timeZone);
+  std::string note = "the agent was cut off after ";
+  note += time.text(lastHeardOf(session));
+  if (session.unreadableBytes > 0) {
+    note += "; " + std::to_string(session.unreadableBytes) + " bytes of its record could not be read";
+  }
+  return note;
+}
+
+/// Returned: whether the record has served.
+bool recover(const UnfinishedRecord& record, Platform& platform, SessionServices& services) {
+  const CutOffSession cutOff = understood(record);
+  const std::string key = sessionTypeKey(cutOff.type);
+  if (cutOff.entries.empty()) {
+    if (cutOff.unreadableBytes > 0) {
+      platform.agentLog.warning("Nothing of a session of type " + key + " could be read from the black box");
+    }
+    return true;
+  }
+  const auto session =
+      std::make_shared<ZalLoggingAgentVistelSession>(key, sessionDirectory(platform, key), services);
+  const std::string note = recoveryNote(cutOff, services);
+  session->setRecoveryNote(note);
+  for (const SessionEntry& entry : cutOff.entries) session->replay(entry);
+  const bool isWritten = session->endReplay(lastHeardOf(cutOff));
+  platform.agentLog.notice("Recovered a session of type " + key + ": " + note);
+  return isWritten;
+}
+
+}  // namespace
+
+void recoverSessions(Platform& platform, SessionServices& sessionServices) {
+  SessionServices services = sessionServices;
+  services.sessionRecords = nullptr;
+  services.CollectServiceLogs = nullptr;
+  platform.sessionRecords.recover(
+      [&](const UnfinishedRecord& record) { return recover(record, platform, services); });
+}
+
+}  // namespace zal

@@ -1,0 +1,38 @@
+#pragma once
+
+#include <memory>
+#include <string>
+#include <string_view>
+
+#include "session/session_entry.h"
+
+namespace zal {
+
+class SessionRecord;
+class SessionRecords;
+
+/// Keeps what one session takes in the host's black box, from its first entry until its log files have it.
+/// Does nothing without a black box. Main thread only.
+class SessionRecorder {
+ public:
+  SessionRecorder(SessionRecords* records, std::string_view sessionType);
+
+  [[nodiscard]] bool isRecording() const { return _records != nullptr; }
+  /// Whether the next entry opens a record: what the session still has from before belongs there first.
+  [[nodiscard]] bool needsRecord() const { return _records != nullptr && !_record; }
+  void open(WallTime now);
+  /// Nothing while no record is open.
+  void note(const SessionEntry& entry);
+  /// The record is of no more use; see SessionRecord::remove.
+  void remove(const std::string& writtenInto);
+  /// Lets the record stay as it is, for the next start of the agent.
+  void leave();
+
+ private:
+  SessionRecords* _records;
+  std::string _sessionType;
+  std::shared_ptr<SessionRecord> _record;
+  std::string _piece;  // kept for its memory
+};
+
+}  // namespace zal
