@@ -13,5 +13,7 @@ namespace zal {
 void fuzzFrames(const std::uint8_t* data, std::size_t size);
 /// The bytes are the payload of a message, of which everything is read.
 void fuzzMessage(const std::uint8_t* data, std::size_t size);
+/// The first byte is a file's seed, and the rest the file; after a 0 the rest is one piece.
+void fuzzBlackBox(const std::uint8_t* data, std::size_t size);
 
 }  // namespace zal

@@ -8,7 +8,9 @@
 
 #include <flatbuffers/flexbuffers.h>
 
+#include "platform/linux/blackbox/record_frame.h"
 #include "platform/linux/wire/message_builder.h"
+#include "session/entry_codec.h"
 
 namespace {
 
@@ -118,6 +120,46 @@ void makeMessages() {
   keepMessage("control_characters", [](Builder& b) { b.String("k\n", "a\nb\x1b[0m\xE2\x80\xAE"); });
 }
 
+std::string piece(const zal::SessionEntry& entry) {
+  std::string bytes;
+  zal::encodeEntry(entry, bytes);
+  return bytes;
+}
+
+void makeRecords() {
+  using zal::SessionEntryKind;
+  const std::string begin = piece({.kind = SessionEntryKind::begin, .sender = "caller"});
+  const std::string description = piece({.kind = SessionEntryKind::description,
+                                         .text = "Offer",
+                                         .log = "v=0",
+                                         .sender = "caller",
+                                         .time = 0.1});
+  const std::string metric =
+      piece({.kind = SessionEntryKind::metric, .text = "rtt", .sender = "caller", .value = 20.5});
+  const std::string role = piece({.kind = SessionEntryKind::role, .value = true});
+  const auto keepPiece = [](const std::string& name, const std::string& bytes) {
+    keep("black_box_fuzzer/" + name, std::string(1, '\0') + bytes);
+  };
+  keepPiece("begin", begin);
+  keepPiece("description", description);
+  keepPiece("metric", metric);
+  keepPiece("role", role);
+  std::string file;
+  for (const std::string& each : {begin, role, description, metric}) zal::appendRecordFrame(file, 1, each);
+  const auto keepFile = [](const std::string& name, const std::string& bytes) {
+    keep("black_box_fuzzer/" + name, "\x01" + bytes);
+  };
+  keepFile("whole", file);
+  keepFile("torn", file.substr(0, file.size() - 3));
+  keepFile("never_written_room", file + std::string(64, '\0'));
+  std::string damaged = file;
+  damaged[40] ^= 1;
+  keepFile("damaged_middle", damaged);
+  damaged[file.size() / 2] ^= 1;
+  keepFile("damaged_twice", damaged);
+  keepFile("another_files", file.substr(0, 20) + file);
+}
+
 }  // namespace
 
 int main(int count, char** arguments) {
@@ -128,4 +170,5 @@ int main(int count, char** arguments) {
   directory = arguments[1];
   makeFrames();
   makeMessages();
+  makeRecords();
 }
