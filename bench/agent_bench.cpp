@@ -14,6 +14,7 @@
 #include "bench/ingest/idle.h"
 #include "bench/ingest/list_figures.h"
 #include "bench/ingest/rounds.h"
+#include "bench/ingest/session_entries.h"
 #include "bench/ingest/start_up.h"
 #include "bench/servers/agent_server.h"
 #include "bench/stackshot/stackshot_figures.h"
@@ -176,6 +177,21 @@ bool addDump(Rows& rows, const std::filesystem::path& programs, bool quick) {
   return true;
 }
 
+/// Returned: whether there was a session.
+bool addSessionEntries(Rows& rows, const std::filesystem::path& programs, const Extent& extent) {
+  constexpr const char* kFigure = "session entries, 1 client, library : without the black box";
+  fprintf(stderr, "entries of a session, with and without the black box\n");
+  const SessionEntryFigures figures = measureSessionEntries(programs, extent.records, extent.rounds);
+  if (!figures.missing.empty()) {
+    rows.push_back(skipped(kFigure, figures.missing));
+    return false;
+  }
+  rows.push_back(atLeast(kFigure, figures.perSecond, figures.perSecondWithout, 0.85, rate));
+  rows.push_back(plain("agent's CPU a million entries : without the black box", figures.cpuSecondsPerMillion,
+                       figures.cpuSecondsPerMillionWithout, cpu));
+  return true;
+}
+
 /// Returned: whether there was a stackshot.
 bool addStackshot(Rows& rows, const std::filesystem::path& programs, bool quick) {
   const unsigned processes = quick ? 3 : 40;
@@ -234,6 +250,7 @@ int run(const std::filesystem::path& programs, bool quick) {
   addLatency(rows, results);
   addMemory(rows, results);
   bool ownPart = addStartUp(rows, programs, extent.startUps);
+  ownPart = addSessionEntries(rows, programs, extent) && ownPart;
   ownPart = addDump(rows, programs, quick) && ownPart;
   ownPart = addStackshot(rows, programs, quick) && ownPart;
   ownPart = addBus(rows, programs, quick) && ownPart;
