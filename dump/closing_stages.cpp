@@ -1,6 +1,8 @@
 #include "dump/closing_stages.h"
 
 #include <filesystem>
+#include <map>
+#include <set>
 #include <string_view>
 #include <system_error>
 #include <utility>
@@ -84,6 +86,7 @@ void tellGaps(const Services& services, const ClosingWork& work) {
   tellMissingPrograms(work.destination, *work.record);
 }
 
+constexpr std::string_view kArchiveStep = "Archive";
 constexpr CollectionFlags kAlways = 0;
 constexpr CollectionFlags kAnyNetwork = kCollectPushLogs | kCollectNetwork;
 
@@ -104,8 +107,35 @@ constexpr Step kSecondStage[] = {
     {kAlways, "Snapshots", collectSnapshotLogs},
     {kAnyNetwork, "Packet captures", linkFullPacketCapture},
     // The step goes on until the archive is made.
-    {kAlways, "Archive", tellGaps},
+    {kAlways, kArchiveStep, tellGaps},
 };
+
+void finish(const Services& services, const ClosingWork& work, const std::string& archive) {
+  Platform& platform = services.platform;
+  linkLatestArchive(
+      resolveAndStandardize(platform.configuration.roots.UserLogRoot, platform.files.homeDirectory()),
+      work.service, archive, platform.agentLog);
+  std::error_code error;
+  if (std::filesystem::exists(archive, error)) {
+    work.record->done(archive);
+  } else {
+    work.record->failed("no archive was made; the log says why");
+  }
+  if (work.completion) work.completion();
+}
+
+void archiveAndLink(const Services& services, ClosingWork work) {
+  const std::string destination = work.destination;
+  const auto manifest = [record = work.record,
+                         &clock = services.platform.clock](const ArchiveContent& content) {
+    return manifestText(record->account(), content, clock.wallNow());
+  };
+  CompressDirectory(services.compressor, services.platform.agentLog, destination, std::nullopt,
+                    [services, work = std::move(work)](const std::optional<std::string>& archive) {
+                      finish(services, work, archive.value());
+                    },
+                    {std::string(kManifestName), manifest});
+}
 
 /// One collection's way through the stages. Each job that waits for the next one holds it.
 class ClosingRun : public std::enable_shared_from_this<ClosingRun> {
@@ -155,30 +185,8 @@ class ClosingRun : public std::enable_shared_from_this<ClosingRun> {
   }
 
   void _archive() {
-    AgentLog& log = _services.platform.agentLog;
-    log.notice("Starting compression for item at path: " + _work.destination);
-    CompressDirectory(_services.compressor, log, _work.destination, std::nullopt,
-                      [self = shared_from_this()](const std::optional<std::string>& archive) {
-                        self->_finish(archive.value());
-                      },
-                      {std::string(kManifestName), [record = _work.record, &clock = _services.platform.clock](
-                                                       const ArchiveContent& content) {
-                         return manifestText(record->account(), content, clock.wallNow());
-                       }});
-  }
-
-  void _finish(const std::string& archive) {
-    Platform& platform = _services.platform;
-    linkLatestArchive(
-        resolveAndStandardize(platform.configuration.roots.UserLogRoot, platform.files.homeDirectory()),
-        _work.service, archive, platform.agentLog);
-    std::error_code error;
-    if (std::filesystem::exists(archive, error)) {
-      _work.record->done(archive);
-    } else {
-      _work.record->failed("no archive was made; the log says why");
-    }
-    if (_work.completion) _work.completion();
+    _services.platform.agentLog.notice("Starting compression for item at path: " + _work.destination);
+    archiveAndLink(_services, std::move(_work));
   }
 
   Services _services;
@@ -186,10 +194,66 @@ class ClosingRun : public std::enable_shared_from_this<ClosingRun> {
   std::size_t _nextStep;
 };
 
+/// To archive one directory, the first included.
+constexpr int kMostAttempts = 3;
+
+/// What is known of a former agent's steps: which began, and so that it ended in the last of them.
+std::vector<PlannedStep> formerSteps(const CutOffDump& dump) {
+  std::vector<PlannedStep> steps;
+  std::size_t lastBegun = 0;
+  for (const CutOffDump::Step& step : dump.steps) {
+    if (step.name == kArchiveStep) continue;
+    if (step.began) lastBegun = steps.size();
+    steps.push_back({step.name, false, step.began ? "" : "the agent ended before it",
+                     step.began ? PartState::done : PartState::notRun});
+  }
+  if (!steps.empty() && steps[lastBegun].unwanted == PartState::done) {
+    steps[lastBegun].unwanted = PartState::partial;
+    steps[lastBegun].whyNot = "the agent ended in it";
+  }
+  steps.push_back({std::string(kArchiveStep), true, ""});
+  return steps;
+}
+
 }  // namespace
 
 void ClosingStages::run(ClosingWork work) {
   std::make_shared<ClosingRun>(_services, std::move(work))->firstStage();
+}
+
+void ClosingStages::finishCutOff() {
+  Platform& platform = _services.platform;
+  const std::vector<CutOffDump> dumps = platform.dumpProgress.cutOff();
+  std::map<std::string, int> attempts;
+  for (const CutOffDump& dump : dumps) ++attempts[dump.directory];
+  std::set<std::string> directories;
+  for (const CutOffDump& dump : dumps) {
+    // What ends the agent each time is left to people.
+    if (attempts[dump.directory] > kMostAttempts) continue;
+    std::error_code error;
+    // A directory that is still there was not archived; where both are, the archive was whole first.
+    if (!std::filesystem::is_directory(dump.directory, error) ||
+        std::filesystem::exists(dump.directory + ".zip", error) ||
+        !directories.insert(dump.directory).second) {
+      continue;
+    }
+    platform.agentLog.notice("Finishing the collection of a former agent at path: " + dump.directory);
+    ClosingWork work;
+    work.service = dump.service;
+    work.destination = dump.directory;
+    work.record = beginRecord(platform, _services.collectors.witnesses,
+                              {.service = dump.service,
+                               .directory = dump.directory,
+                               .flags = 0,
+                               .steps = formerSteps(dump),
+                               .isFinishedLater = true});
+    platform.queues.global(QueuePriority::standard)
+        .async([services = _services, work = std::move(work)]() mutable {
+          work.record->step(1);
+          tellGaps(services, work);
+          archiveAndLink(services, std::move(work));
+        });
+  }
 }
 
 std::vector<PlannedStep> ClosingStages::plan(CollectionFlags flags) {

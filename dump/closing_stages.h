@@ -48,6 +48,9 @@ class ClosingStages {
   /// The first stage, on the calling thread; the second follows by timer on the standard queue. The
   /// completion runs once, on the main thread, archive or not; never while a baseband dump goes on.
   void run(ClosingWork work);
+  /// Archives and links what former agents gathered and did not live to archive: as far as they got. For
+  /// the start; the work itself goes on on the standard queue. Nobody is told, and the manifest says so.
+  void finishCutOff();
   /// Their steps with these flags, those that are skipped too.
   [[nodiscard]] static std::vector<PlannedStep> plan(CollectionFlags flags);
 

@@ -55,14 +55,15 @@ CollectionRecord::CollectionRecord(Plan plan, const Clock& clock, std::shared_pt
   _account.service = std::move(plan.service);
   _account.directory = std::move(plan.directory);
   _account.flags = plan.flags;
+  _account.isFinishedLater = plan.isFinishedLater;
   _account.began = clock.wallNow();
   for (PlannedStep& planned : plan.steps) {
     if (planned.isWanted) _wanted.push_back(_account.steps.size());
     Account::Step step;
     step.name = std::move(planned.name);
     if (!planned.isWanted) {
-      step.state = PartState::skipped;
-      step.why = {std::move(planned.whyNot)};
+      step.state = planned.unwanted;
+      if (!planned.whyNot.empty()) step.why = {std::move(planned.whyNot)};
     }
     _account.steps.push_back(std::move(step));
   }

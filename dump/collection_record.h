@@ -31,7 +31,8 @@ enum class PartState {
 struct PlannedStep {
   std::string name;
   bool isWanted = true;
-  std::string whyNot;  ///< when it is not wanted
+  std::string whyNot;                       ///< when it is not wanted
+  PartState unwanted = PartState::skipped;  ///< what it counts as then
 };
 
 /// What is known of a collection, as plain values.
@@ -66,7 +67,8 @@ struct CollectionAccount {
   std::vector<Step> steps;  ///< all that are planned, the skipped ones too, in order
   std::vector<Source> sources;
   std::vector<Command> commands;
-  std::size_t rowsLeftOut = 0;  ///< sources and commands for which there was no room
+  bool isFinishedLater = false;  ///< by another agent than the one that began
+  std::size_t rowsLeftOut = 0;   ///< sources and commands for which there was no room
 };
 
 /// The account of one collection while it is being made; what watchers need to hear goes on to the
@@ -80,6 +82,7 @@ class CollectionRecord : public GatheringWitness {
     std::string service, directory;
     CollectionFlags flags = 0;
     std::vector<PlannedStep> steps;
+    bool isFinishedLater = false;
   };
   /// The clock outlives it. The progress record was begun with the plan's wanted steps.
   CollectionRecord(Plan plan, const Clock& clock, std::shared_ptr<DumpProgress> progress);

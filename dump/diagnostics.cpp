@@ -30,7 +30,9 @@ Diagnostics::Diagnostics(Platform& platform, Collectors& collectors, const Sessi
                   .session = session,
                   .collection = collection,
                   .compressor = compressor,
-                  .logDump = logDump}) {}
+                  .logDump = logDump}) {
+  closing.finishCutOff();
+}
 
 Diagnostics::~Diagnostics() { _LirraLogCompressor::lendServices(nullptr); }
 

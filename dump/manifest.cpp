@@ -125,6 +125,7 @@ std::string manifestText(const CollectionAccount& account, const ArchiveContent&
   add("flags", jsonString(hexText(account.flags)));
   add("began", jsonString(utcText(account.began)));
   add("archived", jsonString(utcText(archived)));
+  if (account.isFinishedLater) add("finishedLater", "true");
   add("steps", rowsOf(account.steps, stepRow));
   add("commands",
       rowsOf(account.commands, [&](const auto& command) { return commandRow(account, command); }));

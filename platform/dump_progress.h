@@ -29,12 +29,25 @@ class DumpProgress {
   virtual void failed(std::string_view reason) = 0;
 };
 
+/// A collection whose agent ended before it did.
+struct CutOffDump {
+  struct Step {
+    std::string name;
+    bool began = false;
+  };
+  std::string service;
+  std::string directory;  ///< that was being filled
+  std::vector<Step> steps;
+};
+
 /// The host's place for such records. Any thread.
 class DumpProgressRecords {
  public:
   virtual ~DumpProgressRecords() = default;
   /// Never empty. A record that goes without done() or failed() reads as cut off.
   [[nodiscard]] virtual std::shared_ptr<DumpProgress> begin(DumpPlan plan) = 0;
+  /// Those of former agents that have no end, the oldest first.
+  [[nodiscard]] virtual std::vector<CutOffDump> cutOff() = 0;
 };
 
 }  // namespace zal

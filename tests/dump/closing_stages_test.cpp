@@ -349,6 +349,38 @@ TEST_F(ClosingStagesTest, ArchiveEndsWithAManifestOfAllStepsAndFiles) {
   }
 }
 
+TEST_F(ClosingStagesTest, WhatAFormerAgentGatheredIsArchivedAndLinkedAtTheStart) {
+  put("dump/Phone/Phone.log");
+  put("archived/x");
+  put("archived.zip");
+  host.dumpProgress.cutOffDumps = {
+      {"Vistel", host.home / "dump", {{"Crash logs", true}, {"Snapshots", false}, {"Archive", false}}},
+      {"Vistel", host.home / "archived", {{"Archive", true}}},
+      {"Vistel", host.home / "gone", {}}};
+  closing.finishCutOff();
+  EXPECT_TRUE(host.fileCopier.started.empty());
+  host.queues.runAll();
+  ASSERT_EQ(host.fileCopier.started.size(), 1U);
+  EXPECT_EQ(host.fileCopier.started[0].input, host.home / "dump");
+  EXPECT_EQ(fs::read_symlink(host.home / "Logs/Vistel/Latest-Vistel"), host.home / "dump.zip");
+  EXPECT_EQ(host.dumpProgress.lines, (Lines{"BEGIN Vistel " + (host.home / "dump"), "STEP 1 Archive",
+                                            "OK " + (host.home / "dump.zip")}));
+  EXPECT_NE(host.fileCopier.endings.at(0).find(R"("finishedLater": true)"), std::string::npos);
+  EXPECT_EQ(completions, 0);
+}
+
+TEST_F(ClosingStagesTest, WhatEndedThreeAgentsIsNotTriedAgain) {
+  const CutOffDump dump{"Vistel", host.home / "dump", {}};
+  host.dumpProgress.cutOffDumps = {dump, dump, dump, dump};
+  closing.finishCutOff();
+  host.queues.runAll();
+  EXPECT_TRUE(host.fileCopier.started.empty());
+  host.dumpProgress.cutOffDumps.pop_back();
+  closing.finishCutOff();
+  host.queues.runAll();
+  EXPECT_EQ(host.fileCopier.started.size(), 1U);
+}
+
 TEST_F(ClosingStagesTest, FirstStepOfAPlanThatBeganEarlierIsCountedOn) {
   ClosingWork later = work(0);
   std::vector<PlannedStep> steps = ClosingStages::plan(0);

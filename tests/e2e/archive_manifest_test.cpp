@@ -1,3 +1,4 @@
+#include <signal.h>
 #include <sys/wait.h>
 
 #include <cstdio>
@@ -107,6 +108,36 @@ TEST_F(ArchiveManifestE2eTest, AnyChangeIsFoundAndToldFromAbsence) {
   EXPECT_THAT(verify(copy(), "--json").text, HasSubstr(R"({"result": "damaged", )"));
   writeFile(copy(), bytes);
   EXPECT_EQ(verify(copy()).code, 0);
+}
+
+TEST_F(ArchiveManifestE2eTest, AnAgentThatWasKilledMeanwhileIsFollowedByOneThatFinishes) {
+  start();
+  lirra::Client client = makeClient();
+  client.log("Registration", "Default", "said by a client");
+  holdSecondStage();
+  (void)ask(client, "Registration", 0x04);
+  ASSERT_TRUE(testing::eventually([&] {
+    const auto all = records();
+    return all.size() == 1 && all[0].record.currentStep > 0 &&
+           all[0].record.steps[all[0].record.currentStep - 1].name == "Waiting for slow writers";
+  }));
+  const std::string directory = records()[0].record.directory;
+  agent->signal(SIGKILL);
+  ASSERT_EQ(agent->waitForExit(), -SIGKILL);
+  ASSERT_TRUE(std::filesystem::is_directory(directory));
+  start();
+  ASSERT_TRUE(testing::eventually([&] {
+    const auto all = records();
+    return all.size() == 2 && all[1].record.state == DumpProgressRecord::State::done;
+  }));
+  EXPECT_FALSE(std::filesystem::exists(directory));
+  const Verified found = verify(directory + ".zip");
+  EXPECT_EQ(found.code, 6) << found.text;
+  EXPECT_THAT(found.text, AllOf(HasSubstr("Waiting for slow writers: the agent ended in it\n"),
+                                HasSubstr("Baseband logs: the agent ended before it\n")));
+  EXPECT_THAT(textIn(directory + ".zip", "Manifest.json"), HasSubstr("\"finishedLater\": true"));
+  EXPECT_THAT(outputOf("find " + (sandbox / "") + " -name Latest-Registration -printf %l"),
+              directory + ".zip");
 }
 
 TEST_F(ArchiveManifestE2eTest, WhatIsNoArchiveIsNeitherWholeNorDamaged) {

@@ -162,6 +162,8 @@ class RecordingDumpProgress : public DumpProgressRecords {
   ~RecordingDumpProgress() override;
   std::vector<std::string> lines;
   std::vector<DumpPlan> plans;
+  std::vector<CutOffDump> cutOffDumps;
+  [[nodiscard]] std::vector<CutOffDump> cutOff() override { return cutOffDumps; }
   [[nodiscard]] std::shared_ptr<DumpProgress> begin(DumpPlan plan) override {
     lines.push_back("BEGIN " + plan.service + " " + plan.directory);
     plans.push_back(plan);

@@ -20,6 +20,7 @@ class AnnouncedDumpProgress : public DumpProgressRecords {
   AnnouncedDumpProgress(DumpProgressRecords& records, Announce announce);
 
   [[nodiscard]] std::shared_ptr<DumpProgress> begin(DumpPlan plan) override;
+  [[nodiscard]] std::vector<CutOffDump> cutOff() override { return _records.cutOff(); }
 
  private:
   DumpProgressRecords& _records;

@@ -105,6 +105,20 @@ std::shared_ptr<DumpProgress> RuntimeDumpProgress::begin(DumpPlan plan) {
   return file;
 }
 
+std::vector<CutOffDump> RuntimeDumpProgress::cutOff() {
+  std::vector<CutOffDump> found;
+  for (ListedDumpProgress& listed : listDumpProgress(_directory)) {
+    DumpProgressRecord& record = listed.record;
+    if (record.state != DumpProgressRecord::State::cutOff) continue;
+    CutOffDump dump{std::move(record.service), std::move(record.directory), {}};
+    for (DumpProgressRecord::Step& step : record.steps) {
+      dump.steps.push_back({std::move(step.name), step.began.has_value()});
+    }
+    found.push_back(std::move(dump));
+  }
+  return found;
+}
+
 /// The names sort by time, and within a millisecond by the order of one process.
 std::string RuntimeDumpProgress::_nextPath(WallTime now, const ProcessIdentity& agent) {
   std::array<char, 64> name{};

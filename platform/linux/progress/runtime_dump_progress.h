@@ -21,6 +21,7 @@ class RuntimeDumpProgress : public DumpProgressRecords {
   RuntimeDumpProgress(const Clock& clock, AgentLog& log, std::string directory);
 
   [[nodiscard]] std::shared_ptr<DumpProgress> begin(DumpPlan plan) override;
+  [[nodiscard]] std::vector<CutOffDump> cutOff() override;
 
  private:
   std::string _nextPath(WallTime now, const ProcessIdentity& agent);
