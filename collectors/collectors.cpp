@@ -5,7 +5,7 @@
 namespace zal {
 
 Collectors::Collectors(Platform& platform)
-    : commands(platform.shell, &witnesses),
+    : commands(platform.shell, platform.files, platform.agentLog, &witnesses),
       table(platform.configuration, platform.agentLog),
       files(platform.files, platform.agentLog, platform.configuration.roots, &witnesses),
       pings(platform.queues, platform.pings, platform.agentLog),

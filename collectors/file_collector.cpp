@@ -4,6 +4,7 @@
 
 #include "collectors/directory_listing.h"
 #include "collectors/gathering_witness.h"
+#include "platform/agent_log.h"
 #include "platform/file_placement.h"
 #include "platform/open_directories.h"
 #include "platform/standard_path.h"
@@ -22,6 +23,14 @@ void makeParent(const std::string& target) {
 }
 
 std::string nameOf(const std::string& path) { return std::filesystem::path(path).filename().string(); }
+
+/// The path relative to the directory that its text leads below, "." and ".." taken out; else empty.
+std::string belowDirectory(const std::string& path, const std::string& directory) {
+  const std::filesystem::path relative =
+      std::filesystem::path(path).lexically_normal().lexically_relative(directory);
+  const bool isBelow = !relative.empty() && relative != "." && *relative.begin() != "..";
+  return isBelow ? relative.string() : std::string();
+}
 
 }  // namespace
 
@@ -42,14 +51,24 @@ void FileCollector::_tell(const std::string& source, const std::string& director
                      isThere ? "" : error.message());
 }
 
-bool FileCollector::LinkFileIntoDirectory(const std::string& source, const std::string& directory,
-                                          const std::string& suffix) {
-  const std::string resolved = _resolved(source);
-  const std::string target = directory + "/" + nameOf(resolved) + suffix;
+std::string FileCollector::_source(const std::string& path, const std::string& directory) const {
+  std::string resolved = _resolved(path);
   if (!fileExists(resolved)) {
     _tell(resolved, directory, SourceOutcome::absent);
-    return false;
+    return {};
   }
+  const std::string below = belowDirectory(path, _roots.TemporaryRoot);
+  if (below.empty() || resolved == _resolved(_roots.TemporaryRoot) + "/" + below) return resolved;
+  _tell(path, directory, std::make_error_code(std::errc::too_many_symbolic_link_levels));
+  _log.warning(path + " is not taken: a symbolic link that anybody may have laid leads to " + resolved);
+  return {};
+}
+
+bool FileCollector::LinkFileIntoDirectory(const std::string& source, const std::string& directory,
+                                          const std::string& suffix) {
+  const std::string resolved = _source(source, directory);
+  if (resolved.empty()) return false;
+  const std::string target = directory + "/" + nameOf(resolved) + suffix;
   makeParent(target);
   const std::error_code error = _files.link(resolved, target);
   _tell(resolved, directory, error);
@@ -88,14 +107,11 @@ bool FileCollector::LinkDirectoryEntriesWithSuffix(const std::string& sourceDire
 
 bool FileCollector::MoveFileIntoDirectory(const std::string& source, const std::string& directory,
                                           const std::string& suffix) {
-  const std::string resolved = _resolved(source);
+  const std::string resolved = _source(source, directory);
   const std::string name = nameOf(resolved);
+  if (name.empty()) return false;  // "/" has no name to go under
   const std::string wanted = directory + "/" + name + suffix;
   const auto target = _files.uniqueSavePath(wanted);
-  if (name.empty() || !fileExists(resolved)) {  // "/" has no name to go under
-    _tell(resolved, directory, SourceOutcome::absent);
-    return false;
-  }
   makeParent(target.value_or(wanted));
   if (target) {
     const std::error_code error = _files.move(resolved, *target);

@@ -15,8 +15,9 @@ enum class SourceOutcome;
 
 /// Brings files into a dump or session directory. Single files are hard-linked, so that they cost no
 /// space and still grow with their writer (copied where they lie on another file system); whole
-/// directories are copied. Nothing is ever overwritten. Source paths may begin with "~". Any thread;
-/// keeps no state; may wait for a disk.
+/// directories are copied. Nothing is ever overwritten. Source paths may begin with "~". Everybody writes to
+/// TemporaryRoot: a single file below it is taken only when no symbolic link leads to it; the log names one
+/// that is refused. Any thread; keeps no state; may wait for a disk.
 class FileCollector {
  public:
   /// The services and the roots are borrowed, and so are the witnesses, if there are any.
@@ -52,6 +53,8 @@ class FileCollector {
 
  private:
   [[nodiscard]] std::string _resolved(const std::string& path) const;
+  /// The source as a path without links; empty, and told, when there is nothing to take.
+  [[nodiscard]] std::string _source(const std::string& path, const std::string& directory) const;
   bool _linkEntry(const std::string& sourceDirectory, const std::string& name, const std::string& directory);
   void _copy(const std::string& source, const std::string& target, std::error_code& errorSlot);
   void _tell(const std::string& source, const std::string& directory, SourceOutcome outcome) const;

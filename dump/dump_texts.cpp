@@ -1,8 +1,10 @@
 #include "dump/dump_texts.h"
 
+#include <cstdio>
 #include <filesystem>
-#include <fstream>
 #include <system_error>
+
+#include "platform/fresh_file.h"
 
 namespace zal {
 
@@ -15,11 +17,12 @@ std::string deviceInfoText(std::string_view deviceName, std::string_view deviceD
 
 void writeWholeFile(const std::string& path, std::string_view text) {
   const std::string unfinished = path + ".unfinished";
-  std::ofstream file(unfinished, std::ios::binary | std::ios::trunc);
-  if (!file) return;
-  file.write(text.data(), static_cast<std::streamsize>(text.size()));
-  file.close();
-  std::error_code error = file ? std::error_code{} : std::make_error_code(std::errc::io_error);
+  std::FILE* const file = openFreshFile(unfinished);
+  if (file == nullptr) return;
+  const bool isWhole = std::fwrite(text.data(), 1, text.size(), file) == text.size();
+  const bool isClosed = std::fclose(file) == 0;
+  std::error_code error;
+  if (!isWhole || !isClosed) error = std::make_error_code(std::errc::io_error);
   if (!error) std::filesystem::rename(unfinished, path, error);
   if (error) std::filesystem::remove(unfinished, error);
 }

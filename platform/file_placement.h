@@ -25,6 +25,10 @@ class FilePlacement {
   /// Rename; across file systems a synced copy and then the removal, so that at every moment at
   /// least one whole file exists. An existing target is an error.
   virtual std::error_code move(const std::string& source, const std::string& target) = 0;
+  /// Before a program writes a file whose name others know: makes sure that the name leads to a file of
+  /// this user's own or to nothing. What somebody else put there goes, a link without what it leads to.
+  /// An error when it cannot be made sure; that the directory is missing is none.
+  virtual std::error_code prepareOutput(const std::string& path) = 0;
   /// Copies a file, or a directory with all below it, with modes and modification times; symbolic
   /// links as links. An existing target is an error.
   virtual std::error_code copy(const std::string& source, const std::string& target) = 0;

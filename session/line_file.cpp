@@ -10,6 +10,7 @@
 #include <system_error>
 #include <utility>
 
+#include "platform/fresh_file.h"
 #include "session/fetch_soon.h"
 #include "session/text_encoding.h"
 
@@ -29,7 +30,7 @@ constexpr std::size_t kCacheLine = 64;
 
 class BufferedFile {
  public:
-  explicit BufferedFile(const std::string& path) : _file(std::fopen(path.c_str(), "wb")) {
+  explicit BufferedFile(const std::string& path) : _file(openFreshFile(path)) {
     if (_file == nullptr) {
       _error = errno;
       return;

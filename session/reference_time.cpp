@@ -18,7 +18,7 @@ constexpr std::size_t kLargestText = 64U * 1024U;
 
 std::optional<std::string> readText(const std::string& path) {
   std::error_code error;
-  if (!std::filesystem::is_regular_file(path, error)) return std::nullopt;
+  if (!std::filesystem::is_regular_file(std::filesystem::symlink_status(path, error))) return std::nullopt;
   std::ifstream file(path, std::ios::binary);
   if (!file) return std::nullopt;
   std::string text(kLargestText + 1, '\0');
@@ -31,7 +31,8 @@ std::optional<std::string> readText(const std::string& path) {
 }  // namespace
 
 std::optional<std::string> referenceTime(CommandRunner& commands, const std::string& directory) {
-  commands.RunCommandAndWait(kCommand, directory, kFileName);
+  // What lies there instead is not the tool's answer.
+  if (!commands.RunCommandAndWait(kCommand, directory, kFileName)) return std::nullopt;
   const std::string path = directory + "/" + kFileName;
   std::error_code error;
   if (!std::filesystem::exists(path, error)) return "Unknown reference time!";

@@ -61,7 +61,7 @@ std::string takeFiles(const std::filesystem::path& base, std::uint64_t atLeastLi
 SessionEndSeconds measureSessionEnd(const std::filesystem::path& folder, const std::vector<double>& times) {
   const std::uint64_t lines = times.size();
   testing::FakePlatform fakes;
-  CommandRunner commandRunner{fakes.shell};
+  CommandRunner commandRunner{fakes.shell, fakes.files, fakes.agentLog};
   FileCollector fileCollector{fakes.files, fakes.agentLog, fakes.configuration.roots};
   _ZalLoggingAgentPingRunner pingRunner{fakes.queues, fakes.pings, fakes.agentLog};
   BuildInformationCache buildInformation;

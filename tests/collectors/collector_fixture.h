@@ -20,6 +20,7 @@ class CollectorFixture : public ::testing::Test {
     std::filesystem::create_directories(out);
     roots.UserLogRoot = "~/Logs";
     roots.DiagnosticReportRoot = in + "/Reports";
+    roots.TemporaryRoot = shared;
   }
 
   void put(const std::string& name) { writeFile(in + "/" + name, "content of " + name + "\n"); }
@@ -31,6 +32,7 @@ class CollectorFixture : public ::testing::Test {
   TemporaryDirectory directory;
   const std::string in = std::filesystem::canonical(directory.path()).string() + "/in";
   const std::string out = std::filesystem::canonical(directory.path()).string() + "/out";
+  const std::string shared = std::filesystem::canonical(directory.path()).string() + "/shared";
   DirectoryRoots roots;
   PlainFilePlacement files{in};
   RecordingAgentLog log;

@@ -3,6 +3,7 @@
 #include <gtest/gtest.h>
 
 #include "tests/support/fake_services.h"
+#include "tests/support/plain_file_placement.h"
 
 namespace zal {
 namespace {
@@ -10,7 +11,9 @@ namespace {
 class CommandRunnerTest : public ::testing::Test {
  protected:
   testing::ScriptedShell shell;
-  CommandRunner runner{shell};
+  testing::PlainFilePlacement files{"/"};
+  testing::RecordingAgentLog log;
+  CommandRunner runner{shell, files, log};
 };
 
 TEST_F(CommandRunnerTest, BackgroundCommandHasItsWholeOutputInTheFileAndIsNotWaitedFor) {
@@ -40,6 +43,21 @@ TEST_F(CommandRunnerTest, DirectoryNamedByAClientStaysTextForTheShell) {
   runner.RunCommandInBackground("top", "/logs/\";reboot;\"$(id)`id`\\", "f$x");
   EXPECT_EQ(shell.commands,
             std::vector<std::string>{R"(top > "/logs/\";reboot;\"\$(id)\`id\`\\/f\$x"  2>&1 &)"});
+}
+
+TEST_F(CommandRunnerTest, AnOutputThatIsSomebodyElsesLeavesItsCommandOutAndTheRestGoesOn) {
+  files.refuseOutput = [](const std::string& path) {
+    return path == "/tmp/planted" ? std::make_error_code(std::errc::operation_not_permitted)
+                                  : std::error_code{};
+  };
+  runner.RunCommandInBackground("one", "/tmp", "planted");
+  EXPECT_FALSE(runner.RunCommandAndWait("two", "/tmp", "planted"));
+  EXPECT_TRUE(runner.RunCommandAndWait("three", "/tmp", "free"));
+  EXPECT_EQ(shell.commands, std::vector<std::string>{"three > \"/tmp/free\"  2>&1"});
+  const std::string line =
+      "warning: Somebody else's file is in the way at /tmp/planted and cannot be removed (Operation not "
+      "permitted); the command is left out";
+  EXPECT_EQ(log.lines, (std::vector<std::string>{line, line}));
 }
 
 }  // namespace

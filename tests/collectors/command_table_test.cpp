@@ -8,6 +8,7 @@
 #include "collectors/command_runner.h"
 #include "platform/configuration.h"
 #include "tests/support/fake_services.h"
+#include "tests/support/plain_file_placement.h"
 #include "tests/support/temporary_directory.h"
 
 namespace zal {
@@ -257,7 +258,8 @@ TEST_F(CommandTableTest, SeveralCommandsOfOneRowAreBracedSoThatTheFileGetsAllOfT
 TEST_F(CommandTableTest, ShellAcceptsEveryLineBehindItsRedirection) {
   testing::TemporaryDirectory directory;
   testing::ScriptedShell shell;
-  CommandRunner runner{shell};
+  testing::PlainFilePlacement files{"/"};
+  CommandRunner runner{shell, files, log};
   for (const NamedGroup& named : kGroups) table().runInBackground(runner, named.group, "/d");
   std::string script;
   for (const std::string& command : shell.commands) script += command + "\n";
@@ -267,7 +269,8 @@ TEST_F(CommandTableTest, ShellAcceptsEveryLineBehindItsRedirection) {
 
 TEST_F(CommandTableTest, GroupRunsInTheBackgroundInItsOrderIntoTheDirectory) {
   testing::ScriptedShell shell;
-  CommandRunner runner{shell};
+  testing::PlainFilePlacement files{"/"};
+  CommandRunner runner{shell, files, log};
   table().runInBackground(runner, CommandGroup::sessionCaptures, "/tmp");
   EXPECT_EQ(shell.commands,
             (std::vector<std::string>{

@@ -153,5 +153,33 @@ TEST_F(FileCollectorTest, MovingTheRootDirectoryIsRefused) {
   EXPECT_EQ(testing::listTree(out), "");
 }
 
+TEST_F(FileCollectorTest, ALinkInTheDirectoryThatEverybodyWritesToIsNeitherFollowedNorMoved) {
+  put("secret");
+  fs::create_directories(shared + "/plain");
+  fs::create_symlink(in + "/secret", shared + "/vistel-ping.log");
+  fs::create_directory_symlink(in, shared + "/way");
+  for (const std::string name : {"/vistel-ping.log", "/way/secret", "/plain/../way/secret"}) {
+    EXPECT_FALSE(collector.LinkFileIntoDirectory(shared + name, out, ""));
+    EXPECT_FALSE(collector.MoveFileIntoDirectory(shared + name, out, ""));
+  }
+  EXPECT_EQ(testing::listTree(out), "");
+  EXPECT_EQ(testing::readFile(in + "/secret"), "content of secret\n");
+  ASSERT_EQ(log.lines.size(), 6U);
+  EXPECT_EQ(log.lines[0], "warning: " + shared +
+                              "/vistel-ping.log is not taken: a symbolic link that anybody " +
+                              "may have laid leads to " + in + "/secret");
+}
+
+TEST_F(FileCollectorTest, APlainFileThereIsTakenAndTheEntriesBesideALinkToo) {
+  put("secret");
+  testing::writeFile(shared + "/uart-1", "one");
+  fs::create_symlink(in + "/secret", shared + "/uart-2");
+  testing::writeFile(shared + "/uart-3", "three");
+  EXPECT_FALSE(collector.LinkDirectoryEntriesWithPrefix(shared, "uart-", out));
+  EXPECT_EQ(testing::listTree(out), "uart-1\nuart-3\n");
+  EXPECT_TRUE(collector.MoveFileIntoDirectory(shared + "//uart-1", out + "/moved", ""));
+  EXPECT_EQ(testing::readFile(out + "/moved/uart-1"), "one");
+}
+
 }  // namespace
 }  // namespace zal

@@ -113,7 +113,7 @@ class NetworkFixture : public ::testing::Test {
 
   std::size_t _notedPings = 0;
   NotedPropertyLists _propertyLists{*this};
-  CommandRunner _commands{fake.shell};
+  CommandRunner _commands{fake.shell, fake.files, fake.agentLog};
   CommandTable _table{fake.configuration, fake.agentLog};
   FileCollector _files{fake.files, fake.agentLog, fake.configuration.roots};
   CellularSnapshot _cellular{fake.telephony, _propertyLists, fake.agentLog};

@@ -4,6 +4,7 @@
 
 #include <filesystem>
 
+#include "tests/support/file_size_limit.h"
 #include "tests/support/temporary_directory.h"
 
 namespace zal {
@@ -35,11 +36,24 @@ TEST(DumpTextsTest, AFileThatCannotBeWrittenLeavesNothing) {
 }
 
 TEST(DumpTextsTest, AFileThatTheDiskCannotHoldLeavesNothing) {
-  if (!std::filesystem::exists("/dev/full")) GTEST_SKIP() << "no /dev/full";
   const testing::TemporaryDirectory directory;
-  std::filesystem::create_symlink("/dev/full", directory / "Reason.txt.unfinished");
-  writeWholeFile(directory / "Reason.txt", "text");
+  {
+    const testing::FileSizeLimit limit(2);
+    writeWholeFile(directory / "Reason.txt", "text");
+  }
   EXPECT_EQ(testing::listTree(directory.path()), "");
+}
+
+TEST(DumpTextsTest, ALinkLaidAtEitherNameIsNotFollowed) {
+  const testing::TemporaryDirectory directory;
+  testing::writeFile(directory / "victim", "untouched");
+  std::filesystem::create_symlink(directory / "victim", directory / "Reason.txt");
+  std::filesystem::create_symlink(directory / "victim", directory / "Reason.txt.unfinished");
+  writeWholeFile(directory / "Reason.txt", "text");
+  EXPECT_EQ(testing::readFile(directory / "victim"), "untouched");
+  EXPECT_EQ(testing::readFile(directory / "Reason.txt"), "text");
+  EXPECT_FALSE(std::filesystem::is_symlink(directory / "Reason.txt"));
+  EXPECT_EQ(testing::listTree(directory.path()), "Reason.txt\nvictim\n");
 }
 
 }  // namespace

@@ -2,6 +2,8 @@
 
 #include <gtest/gtest.h>
 
+#include <filesystem>
+
 #include "session/quality_log_list.h"
 #include "tests/support/fake_services.h"
 #include "tests/support/temporary_directory.h"
@@ -99,6 +101,21 @@ TEST_F(LineFileTest, AFullDiskIsNoticedByASmallFileToo) {
   write({"x"});
   EXPECT_EQ(log.lines,
             std::vector<std::string>{"warning: Could not write /dev/full: No space left on device"});
+}
+
+TEST_F(LineFileTest, ALinkOrASecondNameLaidAtTheNameIsNeitherFollowedNorOverwritten) {
+  const std::string victim = directory / "victim";
+  testing::writeFile(victim, "untouched");
+  path = directory / "symbolic";
+  std::filesystem::create_symlink(victim, path);
+  write({"x"});
+  EXPECT_EQ(written(), "x\n");
+  path = directory / "hard";
+  std::filesystem::create_hard_link(victim, path);
+  write({"y"});
+  EXPECT_EQ(written(), "y\n");
+  EXPECT_EQ(testing::readFile(victim), "untouched");
+  EXPECT_EQ(log.lines, std::vector<std::string>{});
 }
 
 TEST_F(LineFileTest, AFileThatCannotBeOpenedCostsOneWarning) {

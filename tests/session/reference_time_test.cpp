@@ -4,6 +4,7 @@
 
 #include "collectors/command_runner.h"
 #include "tests/support/fake_services.h"
+#include "tests/support/plain_file_placement.h"
 #include "tests/support/temporary_directory.h"
 
 namespace zal {
@@ -13,7 +14,9 @@ class ReferenceTimeTest : public ::testing::Test {
  protected:
   testing::TemporaryDirectory directory;
   testing::ScriptedShell shell;
-  CommandRunner commands{shell};
+  testing::PlainFilePlacement files{directory.path()};
+  testing::RecordingAgentLog log;
+  CommandRunner commands{shell, files, log};
   std::string file = directory / "time-file.txt";
 
   void answer(std::string text) {

@@ -22,7 +22,7 @@ class SessionFixture : public ::testing::Test {
 
   FakePlatform fakes;
   ManualRunLoop& host = fakes.host;
-  CommandRunner commandRunner{fakes.shell};
+  CommandRunner commandRunner{fakes.shell, fakes.files, fakes.agentLog};
   FileCollector fileCollector{fakes.files, fakes.agentLog, fakes.configuration.roots};
   _ZalLoggingAgentPingRunner pingRunner{fakes.queues, fakes.pings, fakes.agentLog};
   BuildInformationCache buildInformation;

@@ -41,6 +41,11 @@ class PlainFilePlacement : public FilePlacement {
     if (!error) std::filesystem::rename(source, target, error);
     return error;
   }
+  /// As where nobody else writes, unless a test says so of some paths.
+  std::function<std::error_code(const std::string& path)> refuseOutput;
+  std::error_code prepareOutput(const std::string& path) override {
+    return refuseOutput ? refuseOutput(path) : std::error_code{};
+  }
   std::error_code copy(const std::string& source, const std::string& target) override {
     std::error_code error = _injected(source);
     if (!error && std::filesystem::exists(target)) error = std::make_error_code(std::errc::file_exists);

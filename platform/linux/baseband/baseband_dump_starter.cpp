@@ -14,6 +14,7 @@
 #include "platform/linux/baseband/hand_off_marker.h"
 #include "platform/linux/files/descriptor.h"
 #include "platform/linux/files/escaped_text.h"
+#include "platform/linux/process/child_environment.h"
 #include "platform/linux/process/child_setup.h"
 #include "platform/linux/process/process_descriptor.h"
 
@@ -37,7 +38,7 @@ class BasebandDumpStarter::State : public std::enable_shared_from_this<State> {
     const int error = ChildSetup().start(
         _child, _places.helper,
         {_places.helper, "--directory", _places.directory, "--marker", _places.marker, "--reason", text},
-        environ);
+        ChildEnvironment().pointers());
     if (error == 0) {
       _watch();
       return;

@@ -13,6 +13,7 @@
 
 #include <asio/post.hpp>
 
+#include "platform/linux/process/child_environment.h"
 #include "platform/linux/process/child_setup.h"
 
 namespace zal {
@@ -48,7 +49,7 @@ int HelperRun::start(const std::vector<std::string>& command) {
   const Descriptor theirs(ends[1]);
   ChildSetup setup;
   setup.sendOutputTo(theirs.get());
-  if (const int error = setup.start(_child, command.front(), command, environ)) {
+  if (const int error = setup.start(_child, command.front(), command, ChildEnvironment().pointers())) {
     _child = -1;
     return error;
   }

@@ -28,7 +28,8 @@ struct DialogOutcome {
 /// as an option, as markup or as an escape, whatever the alert's texts are.
 [[nodiscard]] std::optional<std::vector<std::string>> dialogArguments(DialogProgram program,
                                                                       const UserAlert& alert);
-/// The program's environment: ours, given as "NAME=value", with what makes its answers readable.
+/// The program's environment: what is for children of ours, given as "NAME=value", with what makes its
+/// answers readable.
 [[nodiscard]] std::vector<std::string> dialogEnvironment(std::vector<std::string> variables);
 /// What the person did, as that program tells it; nothing, and the reason in half a sentence, when the dialog
 /// was not seen or was ended by somebody else.

@@ -1,10 +1,10 @@
 #include "platform/linux/dialog/dialog_screen.h"
 
-#include <unistd.h>
-
 #include <cerrno>
 #include <system_error>
 #include <utility>
+
+#include "platform/linux/process/child_environment.h"
 
 namespace zal {
 
@@ -47,11 +47,9 @@ std::shared_ptr<DialogProcess> DialogScreen::_start(const std::string& id, const
     if (!words) continue;
     const std::string& name = program == DialogProgram::zenity ? _options.zenity : _options.kdialog;
     words->insert(words->begin(), name);
-    std::vector<std::string> variables;
-    for (char** entry = environ; *entry != nullptr; ++entry) variables.emplace_back(*entry);
     auto process = std::make_shared<DialogProcess>(_context);
     const int error =
-        process->start(std::move(*words), dialogEnvironment(std::move(variables)),
+        process->start(std::move(*words), dialogEnvironment(ChildEnvironment().variables()),
                        [this, id, program](const DialogOutcome& outcome) { _takeEnd(id, program, outcome); });
     if (error == 0) return process;
     if (error != ENOENT) reason = name + ": " + std::generic_category().message(error);

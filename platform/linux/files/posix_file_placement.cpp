@@ -3,10 +3,12 @@
 #include <fcntl.h>
 #include <unistd.h>
 
+#include <cerrno>
 #include <filesystem>
 #include <utility>
 
 #include "platform/linux/files/file_copy.h"
+#include "platform/linux/files/own_file.h"
 #include "platform/linux/files/private_directory.h"
 #include "platform/linux/files/rename_no_replace.h"
 #include "platform/linux/files/system_error.h"
@@ -95,6 +97,13 @@ std::error_code PosixFilePlacement::move(const std::string& source, const std::s
   error = copyIntoPlace(source, target);
   if (!error) std::filesystem::remove_all(source, error);
   return error;
+}
+
+std::error_code PosixFilePlacement::prepareOutput(const std::string& path) {
+  // The mode that a shell gives its outputs.
+  constexpr mode_t kMode = 0666;
+  if (openOwnFile(path, kMode).isOpen() || errno == ENOENT || errno == ENOTDIR) return {};
+  return lastSystemError();
 }
 
 std::error_code PosixFilePlacement::copy(const std::string& source, const std::string& target) {

@@ -13,6 +13,7 @@
 
 #include "platform/linux/files/descriptor.h"
 #include "platform/linux/files/system_error.h"
+#include "platform/linux/process/child_environment.h"
 #include "platform/linux/process/child_setup.h"
 #include "platform/linux/process/process_descriptor.h"
 
@@ -79,7 +80,7 @@ ProgramOutcome runBounded(const std::vector<std::string>& command, Patience& pat
   setup.sendErrorsTo(errors.theirs.get());
   setup.putIntoOwnGroup();
   pid_t child = -1;
-  if (const int error = setup.start(child, command.front(), command, environ)) {
+  if (const int error = setup.start(child, command.front(), command, ChildEnvironment().pointers())) {
     const std::string why = error == ENOENT ? "not installed" : std::generic_category().message(error);
     return {.output = {}, .errors = {}, .trouble = why};
   }

@@ -1,6 +1,6 @@
 #include "platform/linux/ping/linux_ping_test.h"
 
-#include <fcntl.h>
+#include <unistd.h>
 
 #include <algorithm>
 #include <cerrno>
@@ -9,7 +9,7 @@
 
 #include <asio/post.hpp>
 
-#include "platform/linux/files/descriptor.h"
+#include "platform/linux/files/own_file.h"
 #include "platform/linux/files/whole_file.h"
 #include "platform/linux/ping/ping_attempt.h"
 
@@ -53,9 +53,10 @@ void LinuxPingTest::stop() {
 // somebody laid there must not turn us against another file.
 bool LinuxPingTest::writeResultsToFile(const std::string& path, std::string& error) {
   constexpr mode_t kMode = 0644;
-  const Descriptor file(
-      ::open(path.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC, kMode));
-  if (file.isOpen() && !writeWhole(file.get(), _report->text())) return true;
+  const Descriptor file = openOwnFile(path, kMode);
+  if (file.isOpen() && (::ftruncate(file.get(), 0) == 0 || errno == EINVAL) &&
+      !writeWhole(file.get(), _report->text()))
+    return true;
   error = std::generic_category().message(errno);
   return false;
 }

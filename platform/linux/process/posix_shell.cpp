@@ -8,6 +8,7 @@
 #include <system_error>
 #include <utility>
 
+#include "platform/linux/process/child_environment.h"
 #include "platform/linux/process/child_setup.h"
 
 namespace zal {
@@ -28,7 +29,8 @@ PosixShell::PosixShell(AgentLog& log, std::string shell) : _log(log), _shell(std
 
 int PosixShell::PerformSystem(const std::string& commandLine) {
   pid_t child = -1;
-  if (const int error = ChildSetup().start(child, _shell, {"sh", "-c", commandLine}, environ)) {
+  if (const int error =
+          ChildSetup().start(child, _shell, {"sh", "-c", commandLine}, ChildEnvironment().pointers())) {
     _log.warning("Could not start " + _shell + ": " + reason(error));
     return -1;
   }

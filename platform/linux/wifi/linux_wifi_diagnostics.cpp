@@ -12,6 +12,7 @@
 
 #include "platform/linux/files/escaped_text.h"
 #include "platform/linux/process/all_signals_blocked.h"
+#include "platform/linux/process/child_environment.h"
 #include "platform/linux/process/child_setup.h"
 #include "platform/linux/process/process_descriptor.h"
 
@@ -65,8 +66,8 @@ bool LinuxWifiDiagnostics::_startOne(const std::string& directory, const std::st
   if (_thread.joinable()) _thread.join();  // it has said its last word
   const std::string text(cutAtCharacter(reason, kLongestReason));
   ChildSetup setup;
-  const int error =
-      setup.start(_child, _helper, {_helper, "--directory", directory, "--reason", text}, environ);
+  const int error = setup.start(_child, _helper, {_helper, "--directory", directory, "--reason", text},
+                                ChildEnvironment().pointers());
   if (error != 0) {
     _child = -1;
     _log.warning("Wi-Fi diagnostics: cannot start " + _helper + ": " +

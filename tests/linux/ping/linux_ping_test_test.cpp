@@ -110,13 +110,22 @@ TEST_F(LinuxPingTestTest, ResultFileFailuresNameTheErrorOnly) {
   std::string error;
   EXPECT_FALSE(ping->writeResultsToFile(directory / "missing/file", error));
   EXPECT_EQ(error, "No such file or directory");
-  std::filesystem::create_symlink("/dev/null", directory / "link");
-  EXPECT_FALSE(ping->writeResultsToFile(directory / "link", error));
-  EXPECT_EQ(error, "Too many levels of symbolic links");
+  std::filesystem::create_directory(directory / "taken");
+  EXPECT_FALSE(ping->writeResultsToFile(directory / "taken", error));
   start(0.2);
   finish();
   EXPECT_FALSE(ping->writeResultsToFile("/dev/full", error));
   EXPECT_EQ(error, "No space left on device");
+}
+
+TEST_F(LinuxPingTestTest, ALinkLaidAtTheResultsNameIsReplacedNotFollowed) {
+  prepare("10.77.0.2");
+  testing::writeFile(directory / "victim", "untouched");
+  std::filesystem::create_symlink(directory / "victim", directory / "vistel-ping.log");
+  std::string error;
+  EXPECT_TRUE(ping->writeResultsToFile(directory / "vistel-ping.log", error)) << error;
+  EXPECT_FALSE(std::filesystem::is_symlink(directory / "vistel-ping.log"));
+  EXPECT_EQ(testing::readFile(directory / "victim"), "untouched");
 }
 
 TEST_F(LinuxPingTestTest, LongIntervalIsAMinute) {
