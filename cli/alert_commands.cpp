@@ -10,7 +10,7 @@
 namespace zal {
 namespace {
 
-struct Values {
+struct AlertValues {
   bool all = false;
   std::string id;
   std::string button = "default";
@@ -41,7 +41,7 @@ void print(ToolContext& tool, const PostedAlert& alert) {
   tool.out << "cancel" << (alert.takesText ? "   (takes --text)" : "") << "\n";
 }
 
-ExitCode list(ToolContext& tool, bool all) {
+ExitCode listAlertRecords(ToolContext& tool, bool all) {
   std::vector<PostedAlert> alerts = tool.host.alerts();
   if (!all) std::erase_if(alerts, [](const PostedAlert& alert) { return !alert.waits(); });
   if (tool.options.json) {
@@ -56,7 +56,7 @@ ExitCode list(ToolContext& tool, bool all) {
   return ExitCode::done;
 }
 
-ExitCode answer(ToolContext& tool, const Values& values, bool hasText) {
+ExitCode answer(ToolContext& tool, const AlertValues& values, bool hasText) {
   const std::vector<PostedAlert> alerts = tool.host.alerts();
   const auto alert =
       std::find_if(alerts.begin(), alerts.end(), [&](const PostedAlert& one) { return one.id == values.id; });
@@ -81,7 +81,7 @@ ExitCode answer(ToolContext& tool, const Values& values, bool hasText) {
 }  // namespace
 
 void addAlertCommands(CLI::App& app, ToolContext& tool) {
-  const auto values = std::make_shared<Values>();
+  const auto values = std::make_shared<AlertValues>();
   CLI::App* const alerts = app.add_subcommand("alerts", "The agent's alerts that wait for somebody");
   alerts->group("The agent");
   alerts->footer(
@@ -92,7 +92,8 @@ void addAlertCommands(CLI::App& app, ToolContext& tool) {
   alerts->require_subcommand(0, 1);
   alerts->add_flag("--all", values->all, "Those as well that are over");
   alerts->callback([&tool, alerts, values] {
-    if (alerts->get_subcommands().empty()) tool.command = [&tool, values] { return list(tool, values->all); };
+    if (alerts->get_subcommands().empty())
+      tool.command = [&tool, values] { return listAlertRecords(tool, values->all); };
   });
 
   CLI::App* const answerer = alerts->add_subcommand("answer", "Answer one as its person would");

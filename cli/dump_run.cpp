@@ -13,9 +13,9 @@ namespace {
 
 using namespace std::chrono_literals;
 
-constexpr auto kLookAgain = 100ms;
+constexpr auto kNextLook = 100ms;
 /// An agent that does not confirm in this time is at it: a dump may hold it up for a while.
-constexpr auto kConfirmation = 2s;
+constexpr auto kRequestConfirmation = 2s;
 /// What ends a dump without a word mostly ends the agent, which is seen at once; this is for the rest.
 constexpr auto kReplyAfterEnd = 5s;
 
@@ -74,11 +74,11 @@ ExitCode DumpRun::run() {
 lirra::Result DumpRun::_reachAgent(lirra::Client& client) {
   for (;;) {
     const auto left = std::chrono::ceil<std::chrono::milliseconds>(_deadline - _tool.host.now());
-    const lirra::Result result =
-        client.flush(static_cast<int>(std::min<std::chrono::milliseconds>(left, kConfirmation).count()));
-    if (result == LIRRA_TIMEOUT && left > kConfirmation) return LIRRA_OK;
-    if (result != LIRRA_UNREACHABLE || !_tool.options.waitForAgent || left <= kLookAgain) return result;
-    _tool.host.pause(kLookAgain);
+    const lirra::Result result = client.flush(
+        static_cast<int>(std::min<std::chrono::milliseconds>(left, kRequestConfirmation).count()));
+    if (result == LIRRA_TIMEOUT && left > kRequestConfirmation) return LIRRA_OK;
+    if (result != LIRRA_UNREACHABLE || !_tool.options.waitForAgent || left <= kNextLook) return result;
+    _tool.host.pause(kNextLook);
   }
 }
 
@@ -99,7 +99,7 @@ std::optional<ExitCode> DumpRun::_awaitReply(lirra::Client& client, std::uint64_
           "It goes on without this command; a longer --timeout waits longer. It may wait for an "
           "answer: see \"lirractl alerts\".");
     }
-    _tool.host.pause(kLookAgain);
+    _tool.host.pause(kNextLook);
   }
 }
 

@@ -50,7 +50,7 @@ std::string jsonOf(std::string_view key, std::optional<bool> value) {
       .text();
 }
 
-ExitCode list(ToolContext& tool) {
+ExitCode listPreferences(ToolContext& tool) {
   std::vector<std::string> elements;
   for (const Switch& one : kSwitches) {
     const auto value = tool.host.preference(one.key);
@@ -98,7 +98,7 @@ void addPreferenceCommands(CLI::App& app, ToolContext& tool) {
   const auto key = std::make_shared<std::string>();
   const auto value = std::make_shared<bool>(false);
   tool.onCommand(*prefs->add_subcommand("list", "All switches and what they do"),
-                 [&tool] { return list(tool); });
+                 [&tool] { return listPreferences(tool); });
 
   CLI::App* const getter = prefs->add_subcommand("get", "Print true or false; false when it was never set");
   getter->add_option("KEY", *key, "The switch")->required();

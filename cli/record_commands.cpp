@@ -9,7 +9,7 @@
 namespace zal {
 namespace {
 
-struct Values {
+struct RecordValues {
   std::string text;
   std::string type;
   std::string category;
@@ -21,7 +21,7 @@ using Send = lirra::Result (lirra::Client::*)(lirra::Text, lirra::Text, lirra::T
                                               std::uint64_t);
 
 void addRecordCommand(CLI::App& app, ToolContext& tool, const char* name, const char* about, Send send) {
-  const auto values = std::make_shared<Values>();
+  const auto values = std::make_shared<RecordValues>();
   CLI::App* const command = app.add_subcommand(name, about);
   command->group("Records");
   command->footer(std::string("Examples:\n  lirractl ") + name +

@@ -13,7 +13,7 @@
 namespace zal {
 namespace {
 
-struct Values {
+struct SessionValues {
   std::string session;
   std::string first;
   std::string second;
@@ -26,7 +26,7 @@ struct Values {
   double time = LIRRA_NOW;
 };
 
-using SharedValues = std::shared_ptr<Values>;
+using SharedValues = std::shared_ptr<SessionValues>;
 
 CLI::App* command(CLI::App& app, const char* name, const char* about, const char* example) {
   CLI::App* const result = app.add_subcommand(name, about);
@@ -68,7 +68,7 @@ std::optional<Number> parseNumber(const std::string& text, const std::string& ki
   return std::nullopt;
 }
 
-ExitCode sendMetric(ToolContext& tool, const Values& values) {
+ExitCode sendMetric(ToolContext& tool, const SessionValues& values) {
   const auto number = parseNumber(values.second, values.kind);
   if (!number) {
     return tool.fail(ExitCode::usage, "\"" + values.second + "\" is no number of that kind",
@@ -80,7 +80,7 @@ ExitCode sendMetric(ToolContext& tool, const Values& values) {
   });
 }
 
-ExitCode sendFile(ToolContext& tool, const Values& values, bool hasCategory) {
+ExitCode sendFile(ToolContext& tool, const SessionValues& values, bool hasCategory) {
   const std::string path = tool.host.absolutePath(values.first);
   std::error_code error;
   if (!std::filesystem::exists(path, error)) {
@@ -222,7 +222,7 @@ void addFacts(CLI::App& app, ToolContext& tool, const SharedValues& values) {
 }  // namespace
 
 void addSessionCommands(CLI::App& app, ToolContext& tool) {
-  const auto values = std::make_shared<Values>();
+  const auto values = std::make_shared<SessionValues>();
   addBeginAndEnd(app, tool, values);
   addEntries(app, tool, values);
   addFacts(app, tool, values);

@@ -38,7 +38,7 @@ std::string jsonOf(const SessionDirectory& session) {
       .text();
 }
 
-ExitCode list(ToolContext& tool) {
+ExitCode listSessions(ToolContext& tool) {
   const std::vector<SessionDirectory> sessions = findSessions(root(tool), tool.host.archives());
   if (tool.options.json) {
     std::vector<std::string> elements;
@@ -167,7 +167,7 @@ void addSessionTreeCommands(CLI::App& app, ToolContext& tool) {
   sessions->footer("Examples:\n  lirractl sessions list\n  lirractl sessions show Vistel --verbose");
 
   CLI::App* const lister = sessions->add_subcommand("list", "All sessions, the latest first");
-  tool.onCommand(*lister, [&tool] { return list(tool); });
+  tool.onCommand(*lister, [&tool] { return listSessions(tool); });
 
   const auto wanted = std::make_shared<Shown>();
   CLI::App* const shower =

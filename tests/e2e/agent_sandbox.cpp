@@ -8,7 +8,6 @@
 #include <regex>
 #include <sstream>
 #include <stdexcept>
-#include <thread>
 
 #include "platform/linux/log/rotation_names.h"
 #include "platform/linux/notifications/notification_file.h"
@@ -49,15 +48,6 @@ std::string unzipped(const std::string& archive) {
 std::string ownProcessIds() {
   return std::string("unshare") + (::geteuid() == 0 ? "" : " --user --map-root-user") +
          " --pid --fork --mount-proc";
-}
-
-bool eventually(const std::function<bool()>& condition, std::chrono::milliseconds deadline) {
-  const auto end = std::chrono::steady_clock::now() + deadline;
-  while (!condition()) {
-    if (std::chrono::steady_clock::now() > end) return false;
-    std::this_thread::sleep_for(std::chrono::milliseconds{5});
-  }
-  return true;
 }
 
 AgentSandbox::AgentSandbox() : stateRoot(_directory / "state"), bus("unix:path=" + (_directory / "no-bus")) {

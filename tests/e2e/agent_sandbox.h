@@ -5,15 +5,13 @@
 #include <string>
 #include <vector>
 
+#include "tests/support/child_program.h"
 #include "tests/support/temporary_directory.h"
 
 namespace zal::testing {
 
 /// Longest time that any condition of these tests may take to come true.
 inline constexpr std::chrono::seconds kDeadline{180};
-
-/// Asks again and again, with short waits, until the condition holds. False after the deadline.
-bool eventually(const std::function<bool()>& condition, std::chrono::milliseconds deadline = kDeadline);
 
 /// The beginning of a command that is to see no process of this machine but its own.
 [[nodiscard]] std::string ownProcessIds();

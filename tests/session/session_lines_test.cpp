@@ -5,12 +5,12 @@
 namespace zal {
 namespace {
 
-constexpr const char* kTime = "14:03:07.251  (2024-05-02) (CEST)";
+constexpr const char* kWritten = "14:03:07.251  (2024-05-02) (CEST)";
 
 TEST(SessionLinesTest, WritesBeginAndEndWithTwoBlanks) {
-  EXPECT_EQ(beginLine("X", kTime), "[Sender: X] Begin Session  [14:03:07.251  (2024-05-02) (CEST)]");
-  EXPECT_EQ(endLine("X", kTime), "[Sender: X] End Session  [14:03:07.251  (2024-05-02) (CEST)]");
-  EXPECT_EQ(beginLine("", kTime), "[Sender: ] Begin Session  [14:03:07.251  (2024-05-02) (CEST)]");
+  EXPECT_EQ(beginLine("X", kWritten), "[Sender: X] Begin Session  [14:03:07.251  (2024-05-02) (CEST)]");
+  EXPECT_EQ(endLine("X", kWritten), "[Sender: X] End Session  [14:03:07.251  (2024-05-02) (CEST)]");
+  EXPECT_EQ(beginLine("", kWritten), "[Sender: ] Begin Session  [14:03:07.251  (2024-05-02) (CEST)]");
 }
 
 TEST(SessionLinesTest, WritesCheckpointsWhateverIsMissing) {

@@ -132,9 +132,9 @@ class SortedLogListAgainstScan : public ::testing::TestWithParam<unsigned> {
 };
 
 TEST_P(SortedLogListAgainstScan, FewDistinctAndHostileTimesComeOutAsScanned) {
-  constexpr double kInfinity = std::numeric_limits<double>::infinity();
-  const double times[] = {std::nan(""), kInfinity, -kInfinity,       0.0,    -0.0, 1.0, 2.0, -std::nan(""),
-                          -1.0,         1e308,     5e-324 /*least*/, -5e-324};
+  constexpr double kBoundless = std::numeric_limits<double>::infinity();
+  const double times[] = {std::nan(""), kBoundless, -kBoundless,      0.0,    -0.0, 1.0, 2.0, -std::nan(""),
+                          -1.0,         1e308,      5e-324 /*least*/, -5e-324};
   const std::size_t distinct = 1 + below(std::size(times));
   const std::size_t first = below(std::size(times));
   for (int step = 0; step < 400; ++step) {

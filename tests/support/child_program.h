@@ -2,6 +2,7 @@
 
 #include <sys/types.h>
 
+#include <chrono>
 #include <functional>
 #include <map>
 #include <optional>
@@ -10,8 +11,9 @@
 
 namespace zal::testing {
 
-/// True once the condition holds; false when it does not within ten seconds.
-bool eventually(const std::function<bool()>& condition);
+/// Asks again and again, with short waits, until the condition holds. False after the deadline.
+bool eventually(const std::function<bool()>& condition,
+                std::chrono::milliseconds deadline = std::chrono::minutes(3));
 
 /// A program as a child process, its outputs in files. Killed at the end if it still runs.
 class ChildProgram {

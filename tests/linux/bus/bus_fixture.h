@@ -26,8 +26,8 @@ class BusFixture : public ::testing::Test {
     if (const std::string obstacle = PrivateBus::obstacle(); !obstacle.empty()) GTEST_SKIP() << obstacle;
   }
 
-  /// Runs the loop until the condition holds; false when it does not within ten seconds.
-  bool runUntil(const std::function<bool()>& condition) { return _run(condition, std::chrono::seconds(10)); }
+  /// Runs the loop until the condition holds; false when it does not within three minutes.
+  bool runUntil(const std::function<bool()>& condition) { return _run(condition, std::chrono::minutes(3)); }
   /// For what must not happen: runs the loop for that long.
   void runFor(std::chrono::milliseconds time) {
     (void)_run([] { return false; }, time);

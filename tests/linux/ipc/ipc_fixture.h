@@ -51,9 +51,9 @@ class IpcFixture : public ::testing::Test {
     return "nothing";
   }
 
-  /// Runs the loop until the condition holds; false after ten seconds.
+  /// Runs the loop until the condition holds; false after three minutes.
   bool runUntil(const std::function<bool()>& condition,
-                std::chrono::milliseconds limit = std::chrono::seconds(10)) {
+                std::chrono::milliseconds limit = std::chrono::minutes(3)) {
     bool held = false;
     const ScopedTimer check(loop, loop.callEvery(std::chrono::milliseconds(1), [&] {
       held = condition();

@@ -111,7 +111,7 @@ TEST_F(LinuxWorkQueuesTest, JobsOfAGlobalQueueRunSideBySide) {
     done.set_value();
   });
   standard().async([&] { second.set_value(); });
-  EXPECT_EQ(done.get_future().wait_for(10s), std::future_status::ready);
+  EXPECT_EQ(done.get_future().wait_for(180s), std::future_status::ready);
 }
 
 TEST_F(LinuxWorkQueuesTest, ThreadsAreBounded) {

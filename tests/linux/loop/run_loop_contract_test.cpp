@@ -24,8 +24,8 @@ class RunLoopContractTest : public ::testing::Test {
   std::string trace;
 };
 
-using Hosts = ::testing::Types<ManualHost, LinuxHost>;
-TYPED_TEST_SUITE(RunLoopContractTest, Hosts);
+using LoopHosts = ::testing::Types<ManualHost, LinuxHost>;
+TYPED_TEST_SUITE(RunLoopContractTest, LoopHosts);
 
 TYPED_TEST(RunLoopContractTest, RunsPostedTasksInTheirOrderAndNeverInsidePost) {
   this->loop.post([this] {

@@ -9,12 +9,12 @@
 
 namespace zal::testing {
 
-/// Lets the loop run until the condition holds; a failure when it does not within ten seconds.
+/// Lets the loop run until the condition holds; a failure when it does not within three minutes.
 inline void runUntil(RunLoop& loop, const std::function<bool()>& condition) {
   const ScopedTimer check(loop, loop.callEvery(std::chrono::milliseconds{1}, [&] {
     if (condition()) loop.stop();
   }));
-  const ScopedTimer limit(loop, loop.callAfter(std::chrono::seconds{10}, [&] {
+  const ScopedTimer limit(loop, loop.callAfter(std::chrono::minutes{3}, [&] {
     ADD_FAILURE() << "the condition never held";
     loop.stop();
   }));

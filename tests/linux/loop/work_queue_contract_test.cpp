@@ -64,8 +64,8 @@ class WorkQueueContractTest : public ::testing::Test {
   Host host;
 };
 
-using Hosts = ::testing::Types<ManualQueuesHost, LinuxQueuesHost>;
-TYPED_TEST_SUITE(WorkQueueContractTest, Hosts);
+using QueueHosts = ::testing::Types<ManualQueuesHost, LinuxQueuesHost>;
+TYPED_TEST_SUITE(WorkQueueContractTest, QueueHosts);
 
 TYPED_TEST(WorkQueueContractTest, ASerialQueueKeepsTheOrderOfItsJobs) {
   const auto queue = this->host.queues.makeSerial("letters", QueuePriority::standard);

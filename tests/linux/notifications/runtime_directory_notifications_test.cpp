@@ -25,7 +25,7 @@ class RuntimeDirectoryNotificationsTest : public ::testing::Test {
   }
   /// Posts the mark and lets the loop run until it came: all that was posted before is delivered too.
   void settle() {
-    const TimerId limit = loop.callAfter(10s, [this] {
+    const TimerId limit = loop.callAfter(180s, [this] {
       ADD_FAILURE() << "the mark was not delivered";
       loop.stop();
     });
