@@ -94,9 +94,11 @@ void NamedDoor::_leaveBus() {
 
 void NamedDoor::_take(sdbus::MethodCall call) {
   const std::string name = call.getSender();
-  Visitor* const visitor = _visitorFor(name);
-  if (visitor == nullptr) return refuse(call, kLimitsExceeded, "the agent has too many callers");
-  if (visitor->isRefused) return refuse(call, kAccessDenied, "you may not talk to the agent");
+  const auto known = _visitors.find(name);
+  if (known == _visitors.end() && !_hasRoom())
+    return refuse(call, kLimitsExceeded, "the agent has too many callers");
+  if (known != _visitors.end() && known->second.isRefused)
+    return refuse(call, kAccessDenied, "you may not talk to the agent");
   std::optional<ReadDictionary> dictionary;
   try {
     dictionary = readDictionary(call, {.bytes = _host.configuration.ipc.maximumPayload});
@@ -104,23 +106,21 @@ void NamedDoor::_take(sdbus::MethodCall call) {
     return refuse(call, kInvalidArgs, error.getMessage());
   }
   if (!dictionary) return refuse(call, kLimitsExceeded, "the request is too large");
-  if (visitor->caller != nullptr) return _carryOut(visitor->caller, *std::move(dictionary), std::move(call));
-  _hold(*visitor, *std::move(dictionary), std::move(call));
+  // Who it is is asked once the request has been read, for that may take longer than an answer may.
+  Visitor& visitor = _visitors[name];
+  if (known == _visitors.end()) _identify(name);
+  if (visitor.caller != nullptr) return _carryOut(visitor.caller, *std::move(dictionary), std::move(call));
+  _hold(visitor, *std::move(dictionary), std::move(call));
 }
 
-NamedDoor::Visitor* NamedDoor::_visitorFor(const std::string& name) {
-  const auto place = _visitors.find(name);
-  if (place != _visitors.end()) return &place->second;
-  if (_visitors.size() == kMostCallers) {
-    if (!std::exchange(_saidFull, true)) {
-      _host.log.warning("More than " + std::to_string(kMostCallers) + " callers on the " + _busName +
-                        "; further ones are refused");
-    }
-    return nullptr;
+/// For one more caller.
+bool NamedDoor::_hasRoom() {
+  if (_visitors.size() < kMostCallers) return true;
+  if (!std::exchange(_saidFull, true)) {
+    _host.log.warning("More than " + std::to_string(kMostCallers) + " callers on the " + _busName +
+                      "; further ones are refused");
   }
-  Visitor& visitor = _visitors[name];
-  _identify(name);
-  return &visitor;
+  return false;
 }
 
 void NamedDoor::_hold(Visitor& visitor, ReadDictionary dictionary, sdbus::MethodCall call) {

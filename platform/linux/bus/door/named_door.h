@@ -48,7 +48,7 @@ class NamedDoor : public BusDoor {
   void _wantName();
   void _sayNameless(const std::string& reason);
   void _take(sdbus::MethodCall call);
-  [[nodiscard]] Visitor* _visitorFor(const std::string& name);
+  [[nodiscard]] bool _hasRoom();
   void _hold(Visitor& visitor, ReadDictionary dictionary, sdbus::MethodCall call);
   void _identify(const std::string& name);
   void _decide(const std::string& name, const std::map<std::string, sdbus::Variant>& credentials);
