@@ -30,6 +30,9 @@ VirtualDisplay::VirtualDisplay() {
   std::string name = ":" + readFile(number);
   name.pop_back();
   ::setenv("DISPLAY", name.c_str(), 1);
+  // With these letters on it; for others xdotool changes the keyboard between two of them, which programs
+  // may notice too late.
+  (void)outputOf({"/usr/bin/setxkbmap", "de"});
 }
 
 VirtualDisplay::~VirtualDisplay() {
