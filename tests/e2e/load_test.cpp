@@ -85,7 +85,7 @@ TEST_F(LoadE2eTest, RecordsBeforeTheLastAnsweredBarrierSurviveAKillOnceAndInOrde
 
 TEST_F(LoadE2eTest, SixtyFourClientsAtOnceEachFindTheirLinesInTheirOwnFilesInOrder) {
   constexpr int kClients = 64;
-  constexpr int kEntries = 10'000;
+  constexpr int kEntries = ZAL_LOAD_ENTRIES;
   start();
   std::vector<std::thread> clients;
   std::atomic<int> confirmed = 0;
