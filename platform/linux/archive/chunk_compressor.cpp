@@ -17,7 +17,9 @@ namespace {
 // but what leaves much anyway (captures, tables) gains next to nothing by the last level.
 constexpr int kSmallLevel = 6, kSmallLevelOfStubborn = 5;
 constexpr double kStubbornShare = 0.4;
-constexpr int kFastLevel = 3;
+// And of the fast levels, the second leaves such files no larger than the third does, sooner.
+constexpr int kFastLevel = 3, kFastLevelOfStubborn = 2;
+constexpr double kFastStubbornShare = 0.3;
 constexpr int kTrialLevel = 1;
 constexpr std::size_t kLongestStored = 65535;
 
@@ -47,7 +49,8 @@ std::size_t deflateAtOnce(isal_zstream& stream, int level, std::uint8_t* workspa
 class FastCompressor : public ChunkCompressor {
  public:
   std::size_t compress(const Chunk& chunk, char* output, std::size_t capacity) override {
-    return deflateAtOnce(_stream, kFastLevel, _workspace.data(), _workspace.size(), chunk.bytes, chunk.size,
+    const int level = chunk.share > kFastStubbornShare ? kFastLevelOfStubborn : kFastLevel;
+    return deflateAtOnce(_stream, level, _workspace.data(), _workspace.size(), chunk.bytes, chunk.size,
                          chunk.last, output, capacity);
   }
 
