@@ -8,6 +8,7 @@
 
 #include "platform/linux/alerts/alert_file.h"
 #include "platform/linux/config/text_file.h"
+#include "platform/linux/files/directory_names.h"
 #include "platform/linux/files/escaped_text.h"
 #include "platform/linux/files/whole_file.h"
 #include "platform/linux/notifications/notification_file.h"
@@ -26,16 +27,6 @@ constexpr std::size_t kLongestScreenText = kLargestAlertAnswer;
 std::optional<std::string_view> idBefore(std::string_view name, std::string_view ending) {
   if (!name.ends_with(ending)) return std::nullopt;
   return name.substr(0, name.size() - ending.size());
-}
-
-std::vector<std::string> namesIn(const std::string& directory) {
-  std::vector<std::string> names;
-  std::error_code error;
-  for (std::filesystem::directory_iterator entry(directory, error), end; !error && entry != end;
-       entry.increment(error)) {
-    names.push_back(entry->path().filename().string());
-  }
-  return names;
 }
 
 AlertResponse responseFor(const UserAlert& alert, const std::optional<AlertAnswer>& answer) {

@@ -2,29 +2,23 @@
 
 #include <unistd.h>
 
-#include <algorithm>
 #include <exception>
-#include <filesystem>
 #include <system_error>
 #include <utility>
 
 #include "platform/linux/blackbox/left_record.h"
 #include "platform/linux/blackbox/record_frame.h"
+#include "platform/linux/files/directory_names.h"
 
 namespace zal {
 namespace {
 
-std::vector<std::string> namesIn(const std::string& directory, AgentLog& log) {
-  std::vector<std::string> names;
+std::vector<std::string> leftIn(const std::string& directory, AgentLog& log) {
   std::error_code error;
-  std::filesystem::directory_iterator entry(directory, error);
-  for (; !error && entry != std::filesystem::directory_iterator(); entry.increment(error)) {
-    names.push_back(entry->path().filename().string());
-  }
+  std::vector<std::string> names = namesIn(directory, error);
   if (error && error != std::errc::no_such_file_or_directory) {
     log.warning("The black box cannot be read: " + directory + ": " + error.message());
   }
-  std::sort(names.begin(), names.end());
   return names;
 }
 
@@ -67,7 +61,7 @@ void FileSessionRecords::flush() {
 }
 
 void FileSessionRecords::recover(const std::function<bool(const UnfinishedRecord& record)>& handler) {
-  for (const std::string& name : namesIn(_directory, _log)) {
+  for (const std::string& name : leftIn(_directory, _log)) {
     const auto left = LeftRecord::take(_directory, name, _log);
     if (!left) continue;
     try {

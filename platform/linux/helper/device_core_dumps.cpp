@@ -5,6 +5,8 @@
 #include <system_error>
 #include <vector>
 
+#include "platform/linux/files/directory_names.h"
+
 namespace zal::helper {
 namespace {
 

@@ -6,7 +6,6 @@
 #include <algorithm>
 #include <array>
 #include <cerrno>
-#include <filesystem>
 #include <system_error>
 
 #include "platform/linux/files/descriptor.h"
@@ -142,15 +141,6 @@ void DumpFiles::writeNote(const std::string& name, const std::string& reason, co
   if (!patience.reason().empty()) text += "cut short: " + patience.reason() + "\n";
   for (const std::string& line : _lines) text += line + "\n";
   (void)_place(name, text);
-}
-
-std::vector<std::string> namesIn(const std::string& directory) {
-  std::vector<std::string> names;
-  std::error_code error;
-  std::filesystem::directory_iterator entry(directory, error);
-  for (; !error && entry != std::filesystem::directory_iterator(); entry.increment(error))
-    names.push_back(entry->path().filename().string());
-  return names;
 }
 
 }  // namespace zal::helper

@@ -55,7 +55,4 @@ class DumpFiles {
   bool _hasFailed = false;
 };
 
-/// What lies in the directory, in no order; empty when it cannot be read.
-[[nodiscard]] std::vector<std::string> namesIn(const std::string& directory);
-
 }  // namespace zal::helper

@@ -6,6 +6,7 @@
 #include <system_error>
 #include <vector>
 
+#include "platform/linux/files/directory_names.h"
 #include "platform/linux/helper/bounded_program.h"
 
 namespace zal::modemdump {
@@ -35,7 +36,7 @@ const std::vector<ControlTool>& controlTools() {
 }
 
 std::vector<std::string> controlDevices(const std::string& root) {
-  auto names = helper::namesIn(root + "/dev");
+  auto names = namesIn(root + "/dev");
   std::erase_if(names, [](const std::string& name) { return !name.starts_with("cdc-wdm"); });
   std::sort(names.begin(), names.end());
   return names;

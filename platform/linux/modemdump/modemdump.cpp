@@ -7,6 +7,7 @@
 #include <system_error>
 
 #include "platform/linux/baseband/hand_off_marker.h"
+#include "platform/linux/files/directory_names.h"
 #include "platform/linux/files/escaped_text.h"
 #include "platform/linux/helper/device_core_dumps.h"
 #include "platform/linux/helper/dump_files.h"
@@ -53,7 +54,7 @@ int fail(int code, const std::string& trouble) {
 
 void removeOutdated(const std::string& directory) {
   std::error_code ignored;
-  for (const std::string& name : outdatedNames(helper::namesIn(directory)))
+  for (const std::string& name : outdatedNames(namesIn(directory)))
     std::filesystem::remove(directory + "/" + name, ignored);
 }
 
@@ -77,7 +78,7 @@ int writeSet(const Options& options, helper::Patience& patience) {
     return fail(kCannotWrite, options.directory + ": " + error.message());
   const LinuxClock clock;
   helper::DumpFiles files(options.directory,
-                          newSetPrefix(helper::namesIn(options.directory), clock.wallNow(), clock));
+                          newSetPrefix(namesIn(options.directory), clock.wallNow(), clock));
   askBus(options, files, patience);
   writeControlDevices(options.root, files, patience);
   helper::copyDeviceCoreDumps(options.root, files, patience);

@@ -5,6 +5,7 @@
 #include <iostream>
 #include <system_error>
 
+#include "platform/linux/files/directory_names.h"
 #include "platform/linux/files/escaped_text.h"
 #include "platform/linux/helper/bounded_program.h"
 #include "platform/linux/helper/device_core_dumps.h"
@@ -110,7 +111,7 @@ class Dump {
 /// A directory that others fill too holds one dump of ours, not all of them.
 void removeEarlierFiles(const std::string& directory) {
   std::error_code ignored;
-  for (const std::string& name : helper::namesIn(directory)) {
+  for (const std::string& name : namesIn(directory)) {
     if (name.starts_with(kPrefix)) std::filesystem::remove(directory + "/" + name, ignored);
   }
 }
