@@ -60,7 +60,7 @@ void ZalLoggingAgentServer::endSession(OptionalText type, OptionalText sender, b
     _reallyEndSession(request);
   } else {
     // Never cancelled, not even by a later begin of the type.
-    _platform.mainLoop.callAfter(kDelayedEndInterval,
+    _platform.mainLoop.callAfter(_platform.configuration.delayedEnd.value_or(kDelayedEndInterval),
                                  [this, request, alive = std::weak_ptr<void>(_delayedEnds)] {
                                    if (!alive.expired()) _reallyEndSession(request);
                                  });

@@ -112,6 +112,8 @@ struct Configuration {
   std::optional<std::chrono::milliseconds> inactivityLimit;
   /// For tests only: the wait between a collection's closing stages. `[testing] closingStageDelay`, seconds.
   std::optional<std::chrono::milliseconds> closingStageDelay;
+  /// For tests only: the wait between a client's end request and the end. `[testing] delayedEnd`, seconds.
+  std::optional<std::chrono::milliseconds> delayedEnd;
 };
 
 }  // namespace zal

@@ -80,8 +80,7 @@ void AgentSandbox::writeConfiguration() const {
   };
   for (const auto& [key, value] : roots) text << key << " = '" << value << "'\n";
   text << "[log]\n" << logSettings;
-  // Other log readers on this machine, and those of tests beside this one, are left alone.
-  text << "[commands]\n\"captures.stop\" = 'true'\ntoolDirectory = '" << (_directory / "tools") << "'\n";
+  text << "[commands]\n" << commandSettings << "toolDirectory = '" << (_directory / "tools") << "'\n";
   text << "[device]\nSystemVersionFile = '" << (_directory / "config/version.plist") << "'\n" << settings;
   writeFile(configurationFile(), text.str());
 }

@@ -30,6 +30,9 @@ class AgentSandbox {
   std::string settings = "[testing]\nclosingStageDelay = 3600\n";
   /// Lines of its section `[log]`. The machine's journal is none of these tests' business.
   std::string logSettings = "journal = false\n";
+  /// Lines of its section `[commands]`. Other log readers on this machine, and those of tests beside this
+  /// one, are left alone.
+  std::string commandSettings = "\"captures.stop\" = 'true'\n";
   /// Where the log and report roots lie; another directory when a test wants another file system.
   std::string stateRoot;
 

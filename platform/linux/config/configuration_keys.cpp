@@ -243,6 +243,7 @@ constexpr ConfigurationKey kKeys[] = {
     {"device", "videoCallsOverCellular", takeFlagOf<&Configuration::videoCallsOverCellular>},
     {"testing", "inactivityLimit", takeDuration<&Configuration::inactivityLimit>},
     {"testing", "closingStageDelay", takeDuration<&Configuration::closingStageDelay>},
+    {"testing", "delayedEnd", takeDuration<&Configuration::delayedEnd>},
 };
 
 }  // namespace

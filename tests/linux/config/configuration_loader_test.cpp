@@ -131,6 +131,7 @@ videoCallsOverCellular = false
 [testing]
 inactivityLimit = 1.5
 closingStageDelay = 0.25
+delayedEnd = 0.5
 )");
   EXPECT_THAT(loaded.warnings, IsEmpty());
   const auto& c = loaded.configuration;
@@ -188,6 +189,7 @@ closingStageDelay = 0.25
   EXPECT_EQ(c.systemVersionFile, "/r/version.plist");
   EXPECT_EQ(c.inactivityLimit, std::chrono::milliseconds{1500});
   EXPECT_EQ(c.closingStageDelay, std::chrono::milliseconds{250});
+  EXPECT_EQ(c.delayedEnd, std::chrono::milliseconds{500});
 }
 
 TEST_F(ConfigurationLoaderTest, WithoutAWordTheAgentTalksToNobodyAndRunsWhatLinuxHas) {

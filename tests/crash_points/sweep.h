@@ -1,0 +1,27 @@
+#pragma once
+
+#include <cstdint>
+#include <string>
+
+#include "tests/crash_points/trial.h"
+
+namespace zal::testing {
+
+struct SweepOptions {
+  std::string scenario = "call";
+  Harm harm = Harm::kill;
+  std::uint64_t start = 1;  ///< the first point
+  std::uint64_t every = 1;  ///< 1: all points
+  unsigned jobs = 1;        ///< processes
+};
+
+struct SweepFigures {
+  std::size_t points = 0;     ///< where the agent was harmed
+  std::size_t confirmed = 0;  ///< of what clients told, over all points
+  std::size_t failures = 0;   ///< points with a violation
+};
+
+/// Tries one point after the other until a run has none of that number. Prints each that fails.
+[[nodiscard]] SweepFigures sweep(const SweepOptions& options);
+
+}  // namespace zal::testing
