@@ -1,5 +1,6 @@
 #include "dump/closing_stages.h"
 
+#include <algorithm>
 #include <filesystem>
 #include <map>
 #include <set>
@@ -110,11 +111,13 @@ constexpr Step kSecondStage[] = {
     {kAlways, kArchiveStep, tellGaps},
 };
 
+std::string logRoot(Platform& platform) {
+  return resolveAndStandardize(platform.configuration.roots.UserLogRoot, platform.files.homeDirectory());
+}
+
 void finish(const Services& services, const ClosingWork& work, const std::string& archive) {
   Platform& platform = services.platform;
-  linkLatestArchive(
-      resolveAndStandardize(platform.configuration.roots.UserLogRoot, platform.files.homeDirectory()),
-      work.service, archive, platform.agentLog);
+  linkLatestArchive(logRoot(platform), work.service, archive, platform.agentLog);
   std::error_code error;
   if (std::filesystem::exists(archive, error)) {
     work.record->done(archive);
@@ -215,6 +218,22 @@ std::vector<PlannedStep> formerSteps(const CutOffDump& dump) {
   return steps;
 }
 
+/// The archive had its name before the agent ended: it was whole. What was left to do then is done now.
+void tidyUpAfter(const CutOffDump& dump, const std::string& archive, Platform& platform) {
+  platform.queues.global(QueuePriority::standard).async([dump, archive, &platform] {
+    std::error_code ignored;
+    std::filesystem::remove_all(dump.directory, ignored);
+    platform.queues.main().async([service = dump.service, archive, &platform] {
+      linkArchiveOfEarlier(logRoot(platform), service, archive, platform.agentLog);
+    });
+  });
+}
+
+bool wasBeingArchived(const CutOffDump& dump) {
+  return std::any_of(dump.steps.begin(), dump.steps.end(),
+                     [](const CutOffDump::Step& step) { return step.began && step.name == kArchiveStep; });
+}
+
 }  // namespace
 
 void ClosingStages::run(ClosingWork work) {
@@ -225,18 +244,22 @@ void ClosingStages::finishCutOff() {
   Platform& platform = _services.platform;
   const std::vector<CutOffDump> dumps = platform.dumpProgress.cutOff();
   std::map<std::string, int> attempts;
-  for (const CutOffDump& dump : dumps) ++attempts[dump.directory];
+  std::set<std::string> beingArchived;
+  for (const CutOffDump& dump : dumps) {
+    ++attempts[dump.directory];
+    if (wasBeingArchived(dump)) beingArchived.insert(dump.directory);
+  }
   std::set<std::string> directories;
   for (const CutOffDump& dump : dumps) {
     // What ends the agent each time is left to people.
     if (attempts[dump.directory] > kMostAttempts) continue;
     std::error_code error;
-    // A directory that is still there was not archived; where both are, the archive was whole first.
-    if (!std::filesystem::is_directory(dump.directory, error) ||
-        std::filesystem::exists(dump.directory + ".zip", error) ||
-        !directories.insert(dump.directory).second) {
+    if (!directories.insert(dump.directory).second) continue;
+    if (const std::string archive = dump.directory + ".zip"; std::filesystem::exists(archive, error)) {
+      if (beingArchived.contains(dump.directory)) tidyUpAfter(dump, archive, platform);
       continue;
     }
+    if (!std::filesystem::is_directory(dump.directory, error)) continue;
     platform.agentLog.notice("Finishing the collection of a former agent at path: " + dump.directory);
     ClosingWork work;
     work.service = dump.service;

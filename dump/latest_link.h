@@ -12,4 +12,8 @@ class AgentLog;
 void linkLatestArchive(const std::string& logRoot, const std::string& service, const std::string& archive,
                        AgentLog& log);
 
+/// The same for an archive of earlier, unless the link leads to one that is not older. Any thread.
+void linkArchiveOfEarlier(const std::string& logRoot, const std::string& service, const std::string& archive,
+                          AgentLog& log);
+
 }  // namespace zal

@@ -43,6 +43,14 @@ std::string temporarySuffix(std::string name) {
   return name.substr(start);
 }
 
+/// Not to be written any more, it is no leftover of who made it. False when there is none.
+bool keepInTemporaryArea(const std::string& archive) {
+  using std::filesystem::perms;
+  std::error_code error;
+  std::filesystem::permissions(archive, perms::owner_read | perms::group_read, error);
+  return !error;
+}
+
 std::string locationText(const std::optional<std::string>& path) { return path ? fileUrl(*path) : "nil"; }
 
 }  // namespace
@@ -100,10 +108,15 @@ void _LirraLogCompressor::_settle(FileCopierJob& job, const std::string& tempora
                                   const std::string& archive, std::function<void()> completion) {
   _services.queues.global(QueuePriority::standard)
       .async([this, &job, temporary, archive, completion = std::move(completion)]() mutable {
-        _services.files.move(temporary, archive);
+        const std::error_code error = _services.files.move(temporary, archive);
         std::error_code ignored;
-        // Without a slash at the end: with one, a link would be followed.
-        std::filesystem::remove_all(withoutEndSlashes(job.identifier()), ignored);
+        const bool isKept = error && keepInTemporaryArea(temporary);
+        if (isKept) {
+          _services.log.warning("\"" + archive + "\" could not be put in its place (" + error.message() +
+                                "); for a day it is kept as \"" + temporary + '"');
+        }
+        // What is in no archive stays. Without a slash at the end: with one, a link would be followed.
+        if (!error || isKept) std::filesystem::remove_all(withoutEndSlashes(job.identifier()), ignored);
         _services.queues.main().async([this, &job, completion = std::move(completion)] {
           const auto released = _take(job);
           if (completion) completion();

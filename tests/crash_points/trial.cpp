@@ -132,7 +132,8 @@ class Trial {
         },
         std::chrono::seconds(5));
     const auto status = agent.terminate();
-    if (status != 0) _result.violations.emplace_back("the next agent did not end well");
+    if (status != 0)
+      _result.violations.push_back("the next agent ended with " + std::to_string(status.value_or(-1)));
   }
 
   void _look() {

@@ -369,6 +369,25 @@ TEST_F(ClosingStagesTest, WhatAFormerAgentGatheredIsArchivedAndLinkedAtTheStart)
   EXPECT_EQ(completions, 0);
 }
 
+TEST_F(ClosingStagesTest, OfAnArchiveThatHadItsNameTheDirectoryGoesAndTheLinkIsMade) {
+  put("dump/half a file");
+  put("dump.zip");
+  put("other/of a collection");
+  put("other.zip");
+  put("Logs/Vistel/Vistel.log");
+  host.dumpProgress.cutOffDumps = {
+      {"Vistel", host.home / "dump", {{"Snapshots", true}, {"Archive", false}}},
+      {"Vistel", host.home / "dump", {{"Archive", true}}},  // by the agent that finished it
+      {"Messages", host.home / "other", {{"Snapshots", true}, {"Archive", false}}}};
+  closing.finishCutOff();
+  host.queues.runAll();
+  EXPECT_FALSE(fs::exists(host.home / "dump"));
+  EXPECT_EQ(fs::read_symlink(host.home / "Logs/Vistel/Latest-Vistel"), host.home / "dump.zip");
+  // An archive that was there before this one was begun is none of it.
+  EXPECT_TRUE(fs::exists(host.home / "other/of a collection"));
+  EXPECT_TRUE(host.fileCopier.started.empty());
+}
+
 TEST_F(ClosingStagesTest, WhatEndedThreeAgentsIsNotTriedAgain) {
   const CutOffDump dump{"Vistel", host.home / "dump", {}};
   host.dumpProgress.cutOffDumps = {dump, dump, dump, dump};

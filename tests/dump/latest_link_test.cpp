@@ -41,6 +41,24 @@ TEST_F(LatestLinkTest, ReplacesWhateverStandsThereWithoutTouchingWhatALinkLeadsT
   EXPECT_EQ(testing::listTree(home / "kept"), "archive.zip\n");
 }
 
+TEST_F(LatestLinkTest, AnArchiveOfEarlierTakesTheLinkOnlyFromNoneOrAnOlderOne) {
+  const std::string place = home / "Logs/Vistel/Latest-Vistel";
+  for (const char* file : {"Logs/Vistel/Vistel.log", "older.zip", "middle.zip", "newest.zip"})
+    testing::writeFile(home / file, "");
+  const auto now = fs::last_write_time(home / "newest.zip");
+  fs::last_write_time(home / "middle.zip", now - std::chrono::hours(1));
+  fs::last_write_time(home / "older.zip", now - std::chrono::hours(2));
+  const auto linkedAfter = [&](const std::string& archive) {
+    linkArchiveOfEarlier(home / "Logs", "Vistel", home / archive, log);
+    return fs::read_symlink(place).filename();
+  };
+  EXPECT_EQ(linkedAfter("middle.zip"), "middle.zip");
+  EXPECT_EQ(linkedAfter("older.zip"), "middle.zip");
+  EXPECT_EQ(linkedAfter("newest.zip"), "newest.zip");
+  fs::remove(home / "newest.zip");
+  EXPECT_EQ(linkedAfter("older.zip"), "older.zip");
+}
+
 TEST_F(LatestLinkTest, ServiceWithoutLogsHasNoPlaceForALinkAndNothingIsSaid) {
   link("Vistel");
   EXPECT_FALSE(fs::exists(home / "Logs"));

@@ -80,6 +80,8 @@ TEST_F(LogCompressorTest, ExistingArchiveStaysAndTheFreshOneStaysInTheTemporaryA
   host.queues.runAll();
   EXPECT_EQ(testing::readFile(gathered + ".zip"), "earlier");
   EXPECT_EQ(testing::readFile(temporary), "archive of " + gathered);
+  // So that it is not taken for a leftover.
+  EXPECT_EQ(fs::status(temporary).permissions() & fs::perms::owner_write, fs::perms::none);
   EXPECT_FALSE(fs::exists(gathered));
   EXPECT_EQ(reported, std::vector<std::string>{gathered + ".zip"});
 }
@@ -90,6 +92,13 @@ TEST_F(LogCompressorTest, ArchiveIsReportedEvenWhenNoneCouldBeMade) {
   host.queues.runAll();
   EXPECT_EQ(reported, std::vector<std::string>{gathered + ".zip"});
   EXPECT_FALSE(fs::exists(gathered + ".zip"));
+}
+
+TEST_F(LogCompressorTest, ADirectoryThatIsInNoArchiveStays) {
+  host.fileCopier.writesArchives = false;
+  compress(gathered);
+  host.queues.runAll();
+  EXPECT_TRUE(fs::exists(gathered));
 }
 
 TEST_F(LogCompressorTest, MissingPathsCompleteInsideTheCall) {

@@ -1,6 +1,7 @@
 #include "platform/linux/archive/archive_output.h"
 
 #include <fcntl.h>
+#include <sys/file.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -26,6 +27,8 @@ ArchiveOutput::ArchiveOutput(const std::string& path)
       _buffer(std::make_unique<char[]>(kBufferSize)) {
   struct stat status {};
   if (!_file.isOpen() || ::fstat(_file.get(), &status) != 0) _error = lastSystemError();
+  // Until it is closed it is nobody's leftover.
+  if (_file.isOpen()) static_cast<void>(::flock(_file.get(), LOCK_EX | LOCK_NB));
   _device = status.st_dev;
   _inode = status.st_ino;
 }

@@ -1,12 +1,15 @@
 #include "platform/linux/files/temporary_leftovers.h"
 
+#include <fcntl.h>
 #include <gtest/gtest.h>
+#include <sys/file.h>
 #include <unistd.h>
 
 #include <chrono>
 #include <filesystem>
 #include <string>
 
+#include "platform/linux/files/descriptor.h"
 #include "tests/support/fake_services.h"
 #include "tests/support/manual_run_loop.h"
 #include "tests/support/manual_work_queues.h"
@@ -35,6 +38,7 @@ class TemporaryLeftoversTest : public ::testing::Test {
   TemporaryDirectory directory;
   const std::string area = directory / "area";
   const WallTime now{1714651387251ms};
+  const WallTime started = now - 30h;
 };
 
 TEST_F(TemporaryLeftoversTest, OnlyEntriesOlderThanADayGo) {
@@ -42,15 +46,25 @@ TEST_F(TemporaryLeftoversTest, OnlyEntriesOlderThanADayGo) {
   put("a day old.zip", 24h);
   put("fresh.zip", 1s);
   put("from the future.zip", -24h * 365);
-  EXPECT_EQ(removeTemporaryLeftovers(area, now), 1U);
+  EXPECT_EQ(removeTemporaryLeftovers(area, now, started), 1U);
   EXPECT_EQ(listTree(area), "a day old.zip\nfresh.zip\nfrom the future.zip\n");
+}
+
+TEST_F(TemporaryLeftoversTest, OfThisDayAFileGoesThatAnEarlierRunDidNotFinishAndNobodyWrites) {
+  for (const char* name : {"unfinished.zip", "written.zip", "kept.zip", "of this run.zip"}) put(name, 1h);
+  fs::permissions(area + "/kept.zip", fs::perms::owner_read);
+  setAge("of this run.zip", 59min);
+  const Descriptor writer(::open((area + "/written.zip").c_str(), O_RDONLY | O_CLOEXEC));
+  ASSERT_EQ(::flock(writer.get(), LOCK_EX), 0);
+  EXPECT_EQ(removeTemporaryLeftovers(area, now, now - 59min), 1U);
+  EXPECT_EQ(listTree(area), "kept.zip\nof this run.zip\nwritten.zip\n");
 }
 
 TEST_F(TemporaryLeftoversTest, DirectoriesGoWithAllBelowThemByTheirOwnAge) {
   put("old/deep/file", 1h);
   put("fresh/deep/file", 48h);
   setAge("old", 48h);
-  EXPECT_EQ(removeTemporaryLeftovers(area, now), 1U);
+  EXPECT_EQ(removeTemporaryLeftovers(area, now, started), 1U);
   EXPECT_EQ(listTree(area), "fresh/\nfresh/deep/\nfresh/deep/file\n");
 }
 
@@ -63,7 +77,7 @@ TEST_F(TemporaryLeftoversTest, LinksGoAndWhatTheyLeadToStays) {
   put("old/file", 48h);
   fs::create_directory_symlink(directory / "elsewhere", area + "/old/link");
   setAge("old", 48h);
-  EXPECT_EQ(removeTemporaryLeftovers(area, now), 2U);
+  EXPECT_EQ(removeTemporaryLeftovers(area, now, started), 2U);
   EXPECT_EQ(listTree(directory.path()), "area/\nelsewhere/\nelsewhere/file\n");
 }
 
@@ -72,25 +86,25 @@ TEST_F(TemporaryLeftoversTest, AFreshLinkToSomethingOldStays) {
   setTime(directory / "elsewhere", 1, 0);
   fs::create_symlink(directory / "elsewhere", area + "/link");
   setAge("link", 1h);
-  EXPECT_EQ(removeTemporaryLeftovers(area, now), 0U);
+  EXPECT_EQ(removeTemporaryLeftovers(area, now, started), 0U);
 }
 
 TEST_F(TemporaryLeftoversTest, AnAreaThatIsALinkIsNotTouched) {
   put("old", 48h);
   fs::create_directory_symlink(area, directory / "prepared");
-  EXPECT_EQ(removeTemporaryLeftovers(directory / "prepared", now), 0U);
+  EXPECT_EQ(removeTemporaryLeftovers(directory / "prepared", now, started), 0U);
   EXPECT_EQ(listTree(area), "old\n");
 }
 
 TEST_F(TemporaryLeftoversTest, AnAreaOfSomebodyElseIsNotTouched) {
   put("old", 48h);
   if (::chown(area.c_str(), 65534, 65534) != 0) GTEST_SKIP() << "only the superuser gives files away";
-  EXPECT_EQ(removeTemporaryLeftovers(area, now), 0U);
+  EXPECT_EQ(removeTemporaryLeftovers(area, now, started), 0U);
   EXPECT_EQ(listTree(area), "old\n");
 }
 
 TEST_F(TemporaryLeftoversTest, AMissingAreaHasNoLeftoversAndIsNotMade) {
-  EXPECT_EQ(removeTemporaryLeftovers(directory / "missing", now), 0U);
+  EXPECT_EQ(removeTemporaryLeftovers(directory / "missing", now, started), 0U);
   EXPECT_FALSE(fs::exists(directory / "missing"));
 }
 
@@ -109,12 +123,12 @@ class TemporaryLeftoversLaterTest : public TemporaryLeftoversTest {
   RecordingAgentLog log;
 };
 
-TEST_F(TemporaryLeftoversLaterTest, TheyGoTenSecondsAfterTheStartInTheBackgroundWithOneLine) {
+TEST_F(TemporaryLeftoversLaterTest, TheyGoOneSecondAfterTheStartInTheBackgroundWithOneLine) {
   put("one", 48h);
   put("two", 48h);
-  put("fresh", 1h);
+  put("fresh", -1h);
   start(area);
-  pass(9999ms);
+  pass(999ms);
   EXPECT_EQ(listTree(area), "fresh\none\ntwo\n");
   loop.advance(1ms);
   EXPECT_EQ(queues.readyJobs("global.background"), 1U);
@@ -125,9 +139,9 @@ TEST_F(TemporaryLeftoversLaterTest, TheyGoTenSecondsAfterTheStartInTheBackground
 }
 
 TEST_F(TemporaryLeftoversLaterTest, WithoutLeftoversThereIsNoLine) {
-  put("fresh", 1h);
+  put("fresh", -1h);
   start(area);
-  pass(10s);
+  pass(1s);
   EXPECT_TRUE(log.lines.empty());
 }
 
