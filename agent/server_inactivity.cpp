@@ -3,6 +3,7 @@
 #include <chrono>
 
 #include "agent/zal_logging_agent_server.h"
+#include "session/session_writings.h"
 
 namespace zal {
 
@@ -43,7 +44,9 @@ void ZalLoggingAgentServer::terminate() {
     return;
   }
   _clearInactivityTimer();
-  if (!_automationRunning) _platform.processExit.exit(0);
+  if (_automationRunning) return;
+  if (_sessionServices.writings != nullptr) _sessionServices.writings->finishAll();
+  _platform.processExit.exit(0);
 }
 
 }  // namespace zal

@@ -9,7 +9,8 @@ namespace zal {
 
 SessionEnvironment::SessionEnvironment(Platform& platform, Collectors& collectors,
                                        std::function<void(const CollectionRequest&)> CollectServiceLogs)
-    : _services{.clock = platform.clock,
+    : _writings(platform.mainLoop, platform.queues),
+      _services{.clock = platform.clock,
                 .mainLoop = platform.mainLoop,
                 .localNotifications = platform.localNotifications,
                 .agentLog = platform.agentLog,
@@ -26,6 +27,10 @@ SessionEnvironment::SessionEnvironment(Platform& platform, Collectors& collector
                 .buildInformation = _buildInformation,
                 .timeZone = _timeZone,
                 .CollectServiceLogs = std::move(CollectServiceLogs),
-                .sessionRecords = &platform.sessionRecords} {}
+                .sessionRecords = &platform.sessionRecords,
+                .memory = &platform.memory,
+                .spillFiles = &platform.spillFiles,
+                .queues = &platform.queues,
+                .writings = &_writings} {}
 
 }  // namespace zal

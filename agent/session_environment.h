@@ -3,6 +3,7 @@
 #include <functional>
 
 #include "session/session_services.h"
+#include "session/session_writings.h"
 
 namespace zal {
 
@@ -25,6 +26,7 @@ class SessionEnvironment {
  private:
   BuildInformationCache _buildInformation;
   TimeZoneCache _timeZone;
+  SessionWritings _writings;
   SessionServices _services;
 };
 

@@ -76,6 +76,9 @@ void recoverSessions(Platform& platform, SessionServices& sessionServices) {
   SessionServices services = sessionServices;
   services.sessionRecords = nullptr;
   services.CollectServiceLogs = nullptr;
+  // There is nobody yet whom waiting for the disk could keep waiting.
+  services.queues = nullptr;
+  services.writings = nullptr;
   platform.sessionRecords.recover(
       [&](const UnfinishedRecord& record) { return recover(record, platform, services); });
 }

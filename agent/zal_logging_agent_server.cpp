@@ -7,6 +7,7 @@
 #include "agent/message_handler.h"
 #include "agent/verbose_log_purge.h"
 #include "platform/standard_path.h"
+#include "session/session_writings.h"
 
 namespace zal {
 namespace {
@@ -95,6 +96,7 @@ void ZalLoggingAgentServer::start() {
 
 void ZalLoggingAgentServer::stop() {
   endAllSessions();
+  if (_sessionServices.writings != nullptr) _sessionServices.writings->finishAll();
   _noteActivity();
 }
 

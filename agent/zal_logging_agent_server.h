@@ -50,7 +50,7 @@ class ZalLoggingAgentServer : public ActionServer {
 
   /// Opens the listener, once; every call counts as activity.
   void start();
-  /// Ends all sessions in place.
+  /// Ends all sessions in place, and waits for their files.
   void stop();
   /// Ends the process if it was idle for longer than the limit, else waits for another limit.
   void terminate();

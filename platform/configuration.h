@@ -49,6 +49,13 @@ struct BlackBoxSettings {
   bool sync = false;    ///< and, once a client was told that it is safe, the end of the power
 };
 
+/// `[memory]`: bytes beyond which lines of sessions wait on the disk for the end of their session.
+struct MemorySettings {
+  std::uint64_t session = 192ULL << 20U;  ///< of one session
+  std::uint64_t peer = 224ULL << 20U;     ///< of all sessions together, as far as one client sent it
+  std::uint64_t total = 256ULL << 20U;
+};
+
 /// `[log]`
 struct LogSettings {
   std::vector<std::string> categories;       ///< switched on; LIRRA_LOG_CATEGORIES adds to them
@@ -100,6 +107,7 @@ struct Configuration {
   IpcSettings ipc;
   BusSettings bus;
   BlackBoxSettings blackBox;
+  MemorySettings memory;
   LogSettings log;
   CommandSettings commands;
   CollectionSettings collection;

@@ -13,6 +13,7 @@
 #include "platform/ipc_listener.h"
 #include "platform/local_notifications.h"
 #include "platform/log_facility.h"
+#include "platform/memory_ledger.h"
 #include "platform/network_status.h"
 #include "platform/ping_test.h"
 #include "platform/preference_store.h"
@@ -22,6 +23,7 @@
 #include "platform/radio_coexistence.h"
 #include "platform/run_loop.h"
 #include "platform/session_records.h"
+#include "platform/spill_files.h"
 #include "platform/system_notifications.h"
 #include "platform/system_shell.h"
 #include "platform/telephony.h"
@@ -63,6 +65,8 @@ struct Platform {
   PropertyListWriter& propertyLists;
   DumpProgressRecords& dumpProgress;
   SessionRecords& sessionRecords;
+  MemoryLedger& memory;
+  SpillFiles& spillFiles;
 };
 
 }  // namespace zal

@@ -5,6 +5,7 @@
 #include <string_view>
 #include <vector>
 
+#include "session/line_part.h"
 #include "session/log_lines.h"
 
 namespace zal {
@@ -17,6 +18,10 @@ class QualityLogList {
   void insertAtFront(std::string_view text);
   [[nodiscard]] LogLines copy() const;
   void removeAllObjects();
+
+  /// The lines of which the list has no more, numbered in order of arrival in place of times.
+  [[nodiscard]] LinePart takeLines();
+  [[nodiscard]] LogLines frontLines() const;
   [[nodiscard]] std::size_t count() const { return _front.size() + _lines.size(); }
 
  private:
@@ -24,6 +29,7 @@ class QualityLogList {
 
   std::vector<std::string_view> _front;  ///< the last one is the first line
   std::vector<std::string_view> _lines;
+  std::size_t _taken = 0;
   std::shared_ptr<TextArena> _texts;
 };
 

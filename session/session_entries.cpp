@@ -21,8 +21,7 @@ void ZalLoggingAgentVistelSession::_addCheckpoint(const SessionEntry& entry) {
   const std::string line =
       checkpointLine(entry.text, entry.sender, _entryTime(wallTimeFromSeconds(entry.time)));
   if (_logCheckpoints) _services.agentLog.notice(echoOf(line));
-  _simpleLogs.addLog(line, entry.time);
-  _verboseLogs.addLog(line, entry.time);
+  _logs.addCheckpoint(line, entry.time);
   _markActive();
 }
 
@@ -41,7 +40,7 @@ void ZalLoggingAgentVistelSession::_addDescription(const SessionEntry& entry) {
   const std::string line =
       descriptionLine(entry.text, entry.log, name, _entryTime(wallTimeFromSeconds(entry.time)));
   if (_logDescriptions) _services.agentLog.notice(echoOf(line));
-  _verboseLogs.addLog(line, entry.time);
+  _logs.addDescription(line, entry.time);
   _markActive();
 }
 
@@ -55,7 +54,7 @@ void ZalLoggingAgentVistelSession::_addQuality(const SessionEntry& entry) {
   _beginUnlessActive(name, entry.at);
   const std::string line = descriptionLine(entry.text, entry.log, name, _entryTime(entry.at));
   if (_logDescriptions) _services.agentLog.notice(echoOf(line));
-  _qualityLogs.append(line);
+  _logs.addQuality(line);
   _markActive();
 }
 

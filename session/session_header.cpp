@@ -15,9 +15,7 @@ void ZalLoggingAgentVistelSession::_addHeaderLine(OptionalText label, OptionalTe
   const auto line = headerLine(label, value);
   if (!line) return;
   if (_logCheckpoints || _logDescriptions) _services.agentLog.notice(echoOf(*line));
-  _simpleLogs.prependLog(*line);
-  _verboseLogs.prependLog(*line);
-  _qualityLogs.insertAtFront(*line);
+  _logs.addHeader(*line);
 }
 
 void ZalLoggingAgentVistelSession::_addTimeInformation() {

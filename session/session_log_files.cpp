@@ -6,10 +6,11 @@
 #include "platform/agent_log.h"
 #include "platform/file_placement.h"
 #include "platform/open_directories.h"
+#include "platform/session_records.h"
 #include "platform/standard_path.h"
 #include "session/date_text.h"
-#include "session/line_file.h"
 #include "session/session_lines.h"
+#include "session/session_writings.h"
 #include "session/vistel_session.h"
 
 namespace zal {
@@ -42,16 +43,10 @@ std::string ZalLoggingAgentVistelSession::logPathForDate(const SessionServices& 
   return resolveAndStandardize(joined, services.files.homeDirectory());
 }
 
-bool ZalLoggingAgentVistelSession::_writeStrings(const LogLines& strings, const std::string& path,
-                                                 AgentLog& log) {
-  return writeStrings(strings, path, log);
-}
-
 void ZalLoggingAgentVistelSession::writeSessionLog(bool endedByEndAll) {
   _mainThread.check("ZalLoggingAgentVistelSession");
   AgentLog& log = _services.agentLog;
-  if (!_wasCutOff && _simpleLogs.count() < kFewestLines && _verboseLogs.count() < kFewestLines &&
-      _qualityLogs.count() < kFewestLines) {
+  if (!_wasCutOff && !_logs.anyHas(kFewestLines)) {
     log.log("Logging", "No logs to write, bailing");
     return;
   }
@@ -73,39 +68,37 @@ void ZalLoggingAgentVistelSession::writeSessionLog(bool endedByEndAll) {
   LinkRecentLogSets(_services.fileCollector, _services.roots, log, {_sessionType}, directory);
 
   const std::optional<std::string> recovered = headerLine("Recovered", _recoveryNote);
-  if (recovered) {
-    _simpleLogs.prependLog(*recovered);
-    _verboseLogs.prependLog(*recovered);
-  }
+  if (recovered) _logs.addTimedHeader(*recovered);
   _addTimeInformation();
   _addCallInfoInformation();
   _addBuildInformation();
   _addFailureInformation();
   _addRecipientInformation();
   _addInitiatorInformation();
-  if (recovered) _qualityLogs.insertAtFront(*recovered);
+  if (recovered) _logs.addQualityHeader(*recovered);
 
-  const LogLines simple = _simpleLogs.copySortedLogList();
-  const LogLines verbose = _verboseLogs.copySortedLogList();
-  const LogLines quality = _qualityLogs.copy();
-  _simpleLogs.removeAllObjects();
-  _verboseLogs.removeAllObjects();
-  _qualityLogs.removeAllObjects();
-  _isWritten = _writeStrings(simple, directory + "/" + fileEnding, log);
-  _isWritten &= _writeStrings(verbose, directory + "/Verbose " + fileEnding, log);
-  _isWritten &= _writeStrings(quality, directory + "/Quality " + fileEnding, log);
+  const bool areLarge = _logs.areLarge();
+  const SessionLogs::Taken logs = _logs.take(directory, fileEnding);
+  const auto finish = [&services = _services, directory, hold = logs.hold, record = _recorder.release(),
+                       files = _filesToCollect,
+                       collection = _collection(directory, endedByEndAll)](bool isWritten) {
+    hold->release(hold->bytes());
+    placeCollectedFiles(files, directory, services.fileCollector, services.agentLog);
+    // One that is left stays: perhaps the disk takes the files at the next start.
+    if (record && isWritten) record->remove(directory);
+    if (services.CollectServiceLogs) services.CollectServiceLogs(collection);
+  };
+  if (areLarge && _services.writings != nullptr) return _services.writings->begin(logs.writing, finish);
+  _isWritten = logs.writing->run();
+  finish(_isWritten);
+}
 
-  placeCollectedFiles(_filesToCollect, directory, _services.fileCollector, log);
-  if (_isWritten) {
-    _recorder.remove(directory);
-  } else {
-    _recorder.leave();  // perhaps the disk takes them at the next start
-  }
-
+CollectionRequest ZalLoggingAgentVistelSession::_collection(const std::string& directory,
+                                                            bool endedByEndAll) const {
   CollectionRequest request{_sessionType, directory, std::nullopt, !endedByEndAll, _endFlags};
   const auto reason = failureReason();
   if (!isEmptyText(reason)) request.reason = _sessionType + " - " + *reason;
-  if (_services.CollectServiceLogs) _services.CollectServiceLogs(request);
+  return request;
 }
 
 }  // namespace zal

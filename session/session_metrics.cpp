@@ -28,7 +28,7 @@ void ZalLoggingAgentVistelSession::_addQualityMetric(const SessionEntry& entry) 
   const std::string_view shown = textOr(entry.sender, kNoSender);
   _beginUnlessActive(shown, entry.at);
   _metricsForKey(*entry.text).push_back(*entry.value);
-  _qualityLogs.append(metricLine(*entry.text, numberText(*entry.value), shown, _entryTime(entry.at)));
+  _logs.addQuality(metricLine(*entry.text, numberText(*entry.value), shown, _entryTime(entry.at)));
 }
 
 void ZalLoggingAgentVistelSession::_gatherQualityMetrics() {
@@ -47,7 +47,7 @@ void ZalLoggingAgentVistelSession::_appendQualityMetrics() {
   for (const std::string& name : _storedMetrics()) {
     for (const std::string& line : statisticsBlock(name, statisticsOf(_metricsForKey(name)))) {
       if (_logDescriptions) _services.agentLog.notice(line);
-      _qualityLogs.append(line);
+      _logs.addQuality(line);
     }
   }
 }

@@ -34,6 +34,4 @@ void SessionRecorder::remove(const std::string& writtenInto) {
   _record.reset();
 }
 
-void SessionRecorder::leave() { _record.reset(); }
-
 }  // namespace zal

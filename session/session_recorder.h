@@ -3,6 +3,7 @@
 #include <memory>
 #include <string>
 #include <string_view>
+#include <utility>
 
 #include "session/session_entry.h"
 
@@ -25,8 +26,8 @@ class SessionRecorder {
   void note(const SessionEntry& entry);
   /// The record is of no more use; see SessionRecord::remove.
   void remove(const std::string& writtenInto);
-  /// Lets the record stay as it is, for the next start of the agent.
-  void leave();
+  /// The record as it is, which who lets go of it leaves to the next start of the agent; null: there is none.
+  [[nodiscard]] std::shared_ptr<SessionRecord> release() { return std::exchange(_record, nullptr); }
 
  private:
   SessionRecords* _records;

@@ -18,11 +18,15 @@ class DeviceRegistry;
 class FileCollector;
 class FilePlacement;
 class LocalNotifications;
+class MemoryLedger;
 class NetworkStatus;
 class RunLoop;
 class SessionRecords;
+class SessionWritings;
+class SpillFiles;
 class SystemVersion;
 class Telephony;
+class WorkQueues;
 class _ZalLoggingAgentPingRunner;
 
 /// What an ended session asks of the per-service collection.
@@ -57,6 +61,11 @@ struct SessionServices {
   /// Called on the main thread as the last step of writing a session's files.
   std::function<void(const CollectionRequest&)> CollectServiceLogs = [](const CollectionRequest&) {};
   SessionRecords* sessionRecords = nullptr;  ///< the black box; null: there is none
+  // Where these are null, all lines stay in memory, and everything is done at once on the main thread.
+  MemoryLedger* memory = nullptr;
+  SpillFiles* spillFiles = nullptr;
+  WorkQueues* queues = nullptr;         ///< for the way to the disk
+  SessionWritings* writings = nullptr;  ///< for the end of large sessions
 };
 
 }  // namespace zal

@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <cmath>
+#include <utility>
 
 #include "session/arrival_order.h"
 
@@ -29,6 +30,12 @@ LogLines _ZalLoggingAgentSessionSortedLogList::copySortedLogList() const {
   copy.lines = _prependedLogs;
   appendInTimeOrder(_sortedLogList, copy.lines);
   return copy;
+}
+
+LinePart _ZalLoggingAgentSessionSortedLogList::takeLines() {
+  LinePart taken{std::exchange(_sortedLogList, {}), std::exchange(_texts, nullptr)};
+  for (std::string_view& line : _prependedLogs) line = _keep(line);
+  return taken;
 }
 
 void _ZalLoggingAgentSessionSortedLogList::removeAllObjects() {

@@ -6,6 +6,7 @@
 #include <string_view>
 #include <vector>
 
+#include "session/line_part.h"
 #include "session/log_lines.h"
 #include "session/text_arena.h"
 #include "session/zal_pair.h"
@@ -25,6 +26,11 @@ class _ZalLoggingAgentSessionSortedLogList {
   void prependLog(std::string_view text);
   [[nodiscard]] LogLines copySortedLogList() const;
   void removeAllObjects();
+
+  /// The timed lines, which the list has no more: what follows is ordered as if they were there still.
+  [[nodiscard]] LinePart takeLines();
+  /// The untimed ones.
+  [[nodiscard]] LogLines prependedLines() const { return {_prependedLogs, _texts}; }
   [[nodiscard]] std::size_t count() const { return _prependedLogs.size() + _sortedLogList.size(); }
 
  private:

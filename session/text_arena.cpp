@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <cstring>
+#include <functional>
 
 #include "session/text_encoding.h"
 
@@ -16,8 +17,8 @@ std::string_view TextArena::keep(std::string_view text) {
   if (needed > _left) {
     // Doubling up to a limit: a short session stays small, a long one allocates seldom.
     const std::size_t size = std::max(_nextChunk, needed);
-    _chunks.push_back(std::unique_ptr<char[]>(new char[size]));
-    _free = _chunks.back().get();
+    _chunks.push_back({std::unique_ptr<char[]>(new char[size]), size});
+    _free = _chunks.back().bytes.get();
     _left = size;
     _nextChunk = std::min(_nextChunk * 2, kLargestChunk);
   }
@@ -28,6 +29,14 @@ std::string_view TextArena::keep(std::string_view text) {
   _free += needed;
   _left -= needed;
   return {kept, text.size()};
+}
+
+void TextArena::releaseBefore(std::string_view text) {
+  const auto holds = [text](const Chunk& chunk) {
+    const std::less_equal<> isUpTo;
+    return isUpTo(chunk.bytes.get(), text.data()) && !isUpTo(chunk.bytes.get() + chunk.size, text.data());
+  };
+  while (!_chunks.empty() && !holds(_chunks.front())) _chunks.pop_front();
 }
 
 }  // namespace zal

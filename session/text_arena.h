@@ -1,9 +1,9 @@
 #pragma once
 
 #include <cstddef>
+#include <deque>
 #include <memory>
 #include <string_view>
-#include <vector>
 
 namespace zal {
 
@@ -15,12 +15,19 @@ class TextArena {
   /// memory, and mostly the next text follows that: lines in order of arrival are one stretch of bytes.
   [[nodiscard]] std::string_view keep(std::string_view text);
 
+  /// Frees what only texts before this one, which is one of its own, needed.
+  void releaseBefore(std::string_view text);
+
   /// Whether no text had a character beyond ASCII. Asked for each text on arrival, when it is at hand
   /// anyway, so that nobody needs to go through a million lines for it later.
   [[nodiscard]] bool isAscii() const { return _isAscii; }
 
  private:
-  std::vector<std::unique_ptr<char[]>> _chunks;
+  struct Chunk {
+    std::unique_ptr<char[]> bytes;
+    std::size_t size;
+  };
+  std::deque<Chunk> _chunks;
   char* _free = nullptr;
   std::size_t _left = 0;
   std::size_t _nextChunk = 4096;

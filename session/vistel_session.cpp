@@ -18,6 +18,7 @@ ZalLoggingAgentVistelSession::ZalLoggingAgentVistelSession(std::string sessionTy
     : _services(services),
       _logBasePath(std::move(logDirectory)),
       _sessionType(std::move(sessionType)),
+      _logs(services),
       _recorder(services.sessionRecords, _sessionType),
       _dateFormatter(services.clock, services.timeZone) {}
 
@@ -41,8 +42,7 @@ void ZalLoggingAgentVistelSession::_begin(OptionalText sender, WallTime now) {
   _active = true;
   const std::string line = beginLine(sender.value_or(""), _entryTime(now));
   if (_logCheckpoints) _services.agentLog.notice(echoOf(line));
-  _simpleLogs.addLog(line, secondsSinceEpoch(now));
-  _verboseLogs.addLog(line, secondsSinceEpoch(now));
+  _logs.addCheckpoint(line, secondsSinceEpoch(now));
   if (!_qualityPulse.isSet()) {
     _pulseIsOn = std::make_shared<bool>(true);
     _qualityPulse =
@@ -61,15 +61,14 @@ void ZalLoggingAgentVistelSession::_end(OptionalText sender, WallTime now) {
   _pulseIsOn.reset();
   _dateEnded = now;
   _active = false;
-  if (_simpleLogs.count() == 0 && _verboseLogs.count() == 0) {
+  if (!_logs.hasTimedLines()) {
     _cancelInactivityTimer();
     return;
   }
   const std::string line = endLine(sender.value_or(""), _entryTime(now));
   if (_logCheckpoints) _services.agentLog.notice(echoOf(line));
-  _simpleLogs.addLog(line, secondsSinceEpoch(now));
-  _verboseLogs.addLog(line, secondsSinceEpoch(now));
-  _qualityLogs.append(line);
+  _logs.addCheckpoint(line, secondsSinceEpoch(now));
+  _logs.addQuality(line);
   _appendQualityMetrics();
   writeSessionLog(sender == kEndAllSender);
   _cancelInactivityTimer();

@@ -17,13 +17,11 @@
 #include "platform/value.h"
 #include "session/collected_files.h"
 #include "session/entry_time_text.h"
-#include "session/log_lines.h"
 #include "session/optional_text.h"
-#include "session/quality_log_list.h"
 #include "session/session_entry.h"
+#include "session/session_logs.h"
 #include "session/session_recorder.h"
 #include "session/session_services.h"
-#include "session/sorted_log_list.h"
 
 namespace zal {
 
@@ -87,7 +85,8 @@ class ZalLoggingAgentVistelSession : public std::enable_shared_from_this<ZalLogg
 
   /// The device model, or nothing when the host has none.
   [[nodiscard]] std::optional<std::string> model();
-  /// Writes and empties the line lists; does nothing but log while all have fewer than four lines.
+  /// Writes and empties the logs; does nothing but log while all have fewer than four lines. The files of a
+  /// large session are there later, and what follows them follows then.
   void writeSessionLog(bool endedByEndAll);
 
   /// Where the files of a session that started at that moment go: absolute, without links or dots.
@@ -157,7 +156,7 @@ class ZalLoggingAgentVistelSession : public std::enable_shared_from_this<ZalLogg
   void _addFailureInformation();
   void _addRecipientInformation();
   void _addInitiatorInformation();
-  static bool _writeStrings(const LogLines& strings, const std::string& path, AgentLog& log);
+  [[nodiscard]] CollectionRequest _collection(const std::string& directory, bool endedByEndAll) const;
   [[nodiscard]] static const std::string& _timeZoneAbbreviation(const SessionServices& services);
 
   [[nodiscard]] std::optional<std::string> _property(const std::optional<std::string>& field) const;
@@ -171,9 +170,7 @@ class ZalLoggingAgentVistelSession : public std::enable_shared_from_this<ZalLogg
   std::optional<std::string> _initiatorID, _recipientID, _failureReason;  // under the property lock
   mutable std::mutex _propertyLock;
   std::optional<std::string> _model;
-  _ZalLoggingAgentSessionSortedLogList _simpleLogs;
-  _ZalLoggingAgentSessionSortedLogList _verboseLogs;
-  QualityLogList _qualityLogs;
+  SessionLogs _logs;
   std::vector<std::string> _callInfoCategories, _callInfoStrings;  // parallel
   std::map<std::string, std::vector<Number>, std::less<>> _qualityMetrics;
   FilesByCategory _filesToCollect;

@@ -52,7 +52,9 @@ Platform FakePlatform::with(PreferenceStore& store) {
           .radioCoexistence = radioCoexistence,
           .propertyLists = propertyLists,
           .dumpProgress = dumpProgress,
-          .sessionRecords = sessionRecords};
+          .sessionRecords = sessionRecords,
+          .memory = memory,
+          .spillFiles = spillFiles};
 }
 
 // The ends of all fakes, and with each what the compiler makes once for a class: test files that use

@@ -7,6 +7,7 @@
 #include "tests/support/fake_ipc.h"
 #include "tests/support/fake_services.h"
 #include "tests/support/fake_session_records.h"
+#include "tests/support/fake_spill_files.h"
 #include "tests/support/manual_run_loop.h"
 #include "tests/support/manual_work_queues.h"
 #include "tests/support/plain_file_placement.h"
@@ -59,6 +60,8 @@ class FakePlatform {
   FakePropertyListWriter propertyLists;
   RecordingDumpProgress dumpProgress;
   FakeSessionRecords sessionRecords;
+  MemoryLedger memory{configuration.memory};
+  FakeSpillFiles spillFiles;
 
   Platform platform = with(preferences);
 

@@ -175,6 +175,7 @@ std::string takeDuration(const toml::node& value, const std::string& /*home*/, C
 }
 
 constexpr std::int64_t kLargestBlock = 1LL << 30;
+constexpr std::int64_t kLargestMemory = 1LL << 40;
 
 constexpr ConfigurationKey kKeys[] = {
     {"roots", "UserLogRoot", takeRoot<&DirectoryRoots::UserLogRoot>},
@@ -217,6 +218,9 @@ constexpr ConfigurationKey kKeys[] = {
     {"bus", "enabled", takeFlag<&Configuration::bus, &BusSettings::enabled>},
     {"blackbox", "enabled", takeFlag<&Configuration::blackBox, &BlackBoxSettings::enabled>},
     {"blackbox", "sync", takeFlag<&Configuration::blackBox, &BlackBoxSettings::sync>},
+    {"memory", "session", takeCount<&Configuration::memory, &MemorySettings::session, 65536, kLargestMemory>},
+    {"memory", "peer", takeCount<&Configuration::memory, &MemorySettings::peer, 65536, kLargestMemory>},
+    {"memory", "total", takeCount<&Configuration::memory, &MemorySettings::total, 65536, kLargestMemory>},
     {"log", "categories", takeCategories},
     {"log", "rotationSize", takeCount<&Configuration::log, &LogSettings::rotationSize, 1024, kLargestBlock>},
     {"log", "maximumOpenFiles", takeCount<&Configuration::log, &LogSettings::maximumOpenFiles, 1, 65536>},

@@ -57,6 +57,7 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
     : _loaded(ConfigurationLoader(environment).load()),
       _agentLog(_mainLoop, agentLogOptions(_loaded.configuration, environment)),
       _queues(_mainLoop, [this](std::string_view line) { _agentLog.warning(line); }),
+      _memory(_loaded.configuration.memory),
       // Before what may give a job to a thread: it takes variables out of the environment.
       _ipc(_mainLoop.context(), _mainLoop, _agentLog,
            {.path = socketPath(environment).value_or(""),
@@ -66,6 +67,7 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
       // Before the log files: what it has to say is in them when the loop sleeps.
       _sessionRecords(_mainLoop, _agentLog, _loaded.configuration.roots.StateRoot + "/BlackBox",
                       _loaded.configuration.blackBox),
+      _spillFiles(_loaded.configuration.roots.StateRoot + "/BlackBox"),
       _logFiles({_clock, _mainLoop, _queues, _agentLog}, _loaded.configuration.roots.UserLogRoot,
                 _loaded.configuration.log),
       _logMirror(_logFiles, {_clock, _mainLoop, _agentLog}, _loaded.configuration.log.journalSocket),
@@ -150,7 +152,9 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
                 .radioCoexistence = _radioCoexistence,
                 .propertyLists = _propertyLists,
                 .dumpProgress = _dumpProgress,
-                .sessionRecords = _sessionRecords} {
+                .sessionRecords = _sessionRecords,
+                .memory = _memory,
+                .spillFiles = _spillFiles} {
   std::signal(SIGPIPE, SIG_IGN);
   if (_loaded.configuration.alerts.screen) _userAlerts.showOn(_screens);
   makeRootParents(_loaded.configuration.roots);

@@ -9,6 +9,7 @@
 #include "platform/linux/archive/zip_file_copier.h"
 #include "platform/linux/baseband/baseband_dump_starter.h"
 #include "platform/linux/blackbox/file_session_records.h"
+#include "platform/linux/blackbox/unnamed_spill_files.h"
 #include "platform/linux/bus_module/announced_dump_progress.h"
 #include "platform/linux/bus_module/bus_module.h"
 #include "platform/linux/bus_module/ipc_with_bus.h"
@@ -67,8 +68,10 @@ class LinuxPlatform {
   LinuxRunLoop _mainLoop;
   LinuxAgentLog _agentLog;
   LinuxWorkQueues _queues;
+  MemoryLedger _memory;
   UnixIpcService _ipc;
   FileSessionRecords _sessionRecords;
+  UnnamedSpillFiles _spillFiles;
   FileLogFacility _logFiles;
   MirroringLogFacility _logMirror;
   PlatformLogFacility& _logFacility;

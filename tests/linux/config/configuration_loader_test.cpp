@@ -104,6 +104,10 @@ enabled = false
 [blackbox]
 enabled = false
 sync = true
+[memory]
+session = 65536
+peer = 131072
+total = 262144
 [log]
 categories = ["IPC", "Ping"]
 rotationSize = 1024
@@ -168,6 +172,9 @@ delayedEnd = 0.5
   EXPECT_FALSE(c.bus.enabled);
   EXPECT_FALSE(c.blackBox.enabled);
   EXPECT_TRUE(c.blackBox.sync);
+  EXPECT_EQ(c.memory.session, 65536U);
+  EXPECT_EQ(c.memory.peer, 131072U);
+  EXPECT_EQ(c.memory.total, 262144U);
   EXPECT_THAT(c.log.categories, ElementsAre("IPC", "Ping"));
   EXPECT_EQ(c.log.rotationSize, 1024U);
   EXPECT_EQ(c.log.maximumOpenFiles, 2U);
