@@ -34,6 +34,7 @@ class SessionMemoryTest : public SessionFixture {
     bounded.writings = &writings;
     session = std::make_shared<ZalLoggingAgentVistelSession>("Vistel", base, bounded);
   }
+  ~SessionMemoryTest() override { session.reset(); }  // it leaves the ledger
   std::string unboundedBase() const { return fakes.home / "Unbounded"; }
 
   void both(const std::function<void(ZalLoggingAgentVistelSession&)>& entry) const {
