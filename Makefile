@@ -9,7 +9,7 @@ CMAKE := cmake
 FUZZ_SECONDS ?= 120
 TEST_FUZZ_SECONDS ?= 10
 
-.PHONY: help demo test build bench fuzz lint format hooks install clean \
+.PHONY: help demo test build bench crash-points fuzz lint format hooks install clean \
 	dependencies-build dependencies-demo dependencies-test dependencies-bench dependencies-develop \
 	build-plain build-address build-thread test-plain test-address test-thread house-check fuzz-short bench-once
 
@@ -76,6 +76,12 @@ fuzz-short: build-address
 ## make fuzz     the fuzzers, FUZZ_SECONDS each (120)
 fuzz: dependencies-build dependencies-test build-address
 	scripts/fuzz $(BUILD)/address $(FUZZ_SECONDS)
+
+## make crash-points  the agent killed, torn and refused at each of its system calls, one table at the end
+crash-points: dependencies-build dependencies-test
+	$(CMAKE) -Wno-dev -S . -B $(BUILD) -DCMAKE_BUILD_TYPE=Release -DZAL_TESTS=ON -DZAL_TESTS_FROM_OUTSIDE=ON
+	$(CMAKE) --build $(BUILD) --target crash_points -j $(JOBS)
+	scripts/crash-points $(BUILD)/tests/bin/crash_points $(JOBS)
 
 ## make bench    the benchmarks against their peers, one table at the end
 bench: dependencies-build dependencies-test dependencies-bench

@@ -118,6 +118,13 @@ void Aftermath::checkGatheredFile() {
   if (copies != 1) fail("the gathered file is there " + std::to_string(copies) + " times");
 }
 
+void Aftermath::checkSource(const std::string& path, const std::string& text) {
+  if (readFile(_sandbox / path) != text) fail("not as it was: " + path);
+  for (const GatheredText& file : _gathered(fs::path(path).filename().string())) {
+    if (file.text != text) fail("not whole: " + file.name);
+  }
+}
+
 void Aftermath::checkArchives() {
   for (const std::string& archive : _archives) {
     const Descriptor file(::open(archive.c_str(), O_RDONLY | O_CLOEXEC));

@@ -19,6 +19,8 @@ class Aftermath {
   void checkLogSet(const Told& told);
   /// The file that was to be collected is in one place, whole.
   void checkGatheredFile();
+  /// A file that is collected and stays: as it was, and in archives too if they have it.
+  void checkSource(const std::string& path, const std::string& text);
   /// Every archive is as it was made, and has no directory beside it; the newest is linked.
   void checkArchives();
   /// Nothing of what only a running agent needs.

@@ -1,11 +1,12 @@
 #include <cstdio>
 #include <cstdlib>
-#include <cstring>
+#include <ctime>
 
 #include <exception>
 #include <map>
 #include <string>
 
+#include "tests/crash_points/supervised_agent.h"
 #include "tests/crash_points/sweep.h"
 
 namespace {
@@ -15,6 +16,8 @@ using namespace zal::testing;
 constexpr const char* kUsage =
     "crash_points [call|dump] [kill|tear|fault] [--every N] [--start N] [--jobs N]\n"
     "             [--only NUMBER [--error N] [--keep DIRECTORY]]\n";
+
+constexpr int kSkipped = 77;
 
 const std::map<std::string, Harm> kHarms = {
     {"kill", Harm::kill}, {"tear", Harm::tear}, {"fault", Harm::fault}};
@@ -58,7 +61,18 @@ int run(int argc, char** argv) {
       return 2;
     }
   }
+  if (!SupervisedAgent::isPossible()) {
+    std::puts("skipped: this host lets nobody ask about another process's system calls");
+    return kSkipped;
+  }
   if (only > 0) return tryOne(options, only, error, keepIn);
+  if (options.start == 0) {
+    options.start = 1 + static_cast<std::uint64_t>(std::time(nullptr)) % options.every;
+    if (options.every > 1) {
+      std::printf("every %lluth point from %llu\n", static_cast<unsigned long long>(options.every),
+                  static_cast<unsigned long long>(options.start));
+    }
+  }
   const SweepFigures figures = sweep(options);
   std::printf("%s: %zu points, %zu confirmed by barriers, %zu points with something lost or left\n",
               options.scenario.c_str(), figures.points, figures.confirmed, figures.failures);

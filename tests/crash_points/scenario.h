@@ -23,6 +23,8 @@ struct Told {
   }
 };
 
+class Aftermath;
+
 /// What is played to an agent that may end at any moment.
 class Scenario {
  public:
@@ -31,11 +33,18 @@ class Scenario {
   virtual void prepare(AgentSandbox& sandbox) const = 0;
   /// Until everything is done or the agent has ended.
   virtual void play(const AgentSandbox& sandbox, PlayedClient& client, Told& told) const = 0;
+  /// What must be there once all agents have ended.
+  virtual void check(Aftermath& after, const Told& told) const = 0;
 
   /// "call" or "dump"; nullptr for others.
   static std::unique_ptr<Scenario> named(const std::string& name);
 };
 
+[[nodiscard]] std::unique_ptr<Scenario> makeCallScenario();
+[[nodiscard]] std::unique_ptr<Scenario> makeDumpScenario();
+
+/// One log record with that number.
+void tellRecord(PlayedClient& client, Told& told, int number);
 /// Whether the agent has made an archive, or said why not.
 [[nodiscard]] bool isCollectionOver(const AgentSandbox& sandbox);
 

@@ -36,6 +36,11 @@ std::vector<char*> asPointers(const std::vector<std::string>& words) {
   return result;
 }
 
+long listenTo(const sock_fprog& program) {
+  ::prctl(PR_SET_NO_NEW_PRIVS, 1, 0, 0, 0);
+  return ::syscall(SYS_seccomp, SECCOMP_SET_MODE_FILTER, SECCOMP_FILTER_FLAG_NEW_LISTENER, &program);
+}
+
 /// In the child: nothing that takes a lock.
 [[noreturn]] void becomeAgent(Handover& handover, const sock_fprog& program, const char* output,
                               char** arguments, char** environment) {
@@ -47,9 +52,7 @@ std::vector<char*> asPointers(const std::vector<std::string>& words) {
   ::dup2(out, 2);
   ::close(in);
   ::close(out);
-  ::prctl(PR_SET_NO_NEW_PRIVS, 1, 0, 0, 0);
-  const long listener =
-      ::syscall(SYS_seccomp, SECCOMP_SET_MODE_FILTER, SECCOMP_FILTER_FLAG_NEW_LISTENER, &program);
+  const long listener = listenTo(program);
   handover.listener = listener < 0 ? -errno : static_cast<int>(listener);
   while (!handover.taken) ::sched_yield();
   ::execve(arguments[0], arguments, environment);
@@ -102,9 +105,22 @@ SupervisedAgent::~SupervisedAgent() {
   constexpr std::chrono::seconds kPatience{10};
   if (!_status) signal(SIGKILL);
   waitForExit(kPatience);
+  // Its children end as well, or they would hold what it had open.
+  pollfd childrenGone{_listener.get(), 0, 0};
+  ::poll(&childrenGone, 1, static_cast<int>(std::chrono::milliseconds(kPatience).count()));
   const std::uint64_t one = 1;
   static_cast<void>(::write(_stop.get(), &one, sizeof one));
   _supervisor.join();
+}
+
+bool SupervisedAgent::isPossible() {
+  std::vector<sock_filter> filter = filterFor({});
+  const sock_fprog program{static_cast<unsigned short>(filter.size()), filter.data()};
+  const pid_t child = ::fork();
+  if (child == 0) ::_exit(listenTo(program) < 0 ? 1 : 0);
+  int status = 0;
+  ::waitpid(child, &status, 0);
+  return status == 0;
 }
 
 bool SupervisedAgent::hasEnded() const {

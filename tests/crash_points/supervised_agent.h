@@ -39,11 +39,13 @@ class SupervisedAgent {
       std::function<Judgement(std::uint64_t number, const WatchedCall& call, const seccomp_data& data)>;
 
   SupervisedAgent(const AgentSandbox& sandbox, const std::vector<WatchedCall>& calls, Judge judge);
-  /// Kills it if it still runs.
+  /// Kills it if it still runs, and lets its children end.
   ~SupervisedAgent();
   SupervisedAgent(const SupervisedAgent&) = delete;
   SupervisedAgent& operator=(const SupervisedAgent&) = delete;
 
+  /// Whether this host lets a process ask about another one's system calls.
+  [[nodiscard]] static bool isPossible();
   [[nodiscard]] bool hasEnded() const;
   [[nodiscard]] std::uint64_t calls() const { return _calls; }
   [[nodiscard]] pid_t processId() const { return _process; }

@@ -10,7 +10,7 @@ namespace zal::testing {
 struct SweepOptions {
   std::string scenario = "call";
   Harm harm = Harm::kill;
-  std::uint64_t start = 1;  ///< the first point
+  std::uint64_t start = 0;  ///< the first point, from 1; 0: another one each time
   std::uint64_t every = 1;  ///< 1: all points
   unsigned jobs = 1;        ///< processes
 };

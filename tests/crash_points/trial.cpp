@@ -138,9 +138,7 @@ class Trial {
 
   void _look() {
     Aftermath after(_sandbox);
-    after.checkSession(_told);
-    after.checkLogSet(_told);
-    after.checkGatheredFile();
+    _scenario.check(after, _told);
     after.checkArchives();
     after.checkStrays();
     for (const std::string& violation : after.violations()) _result.violations.push_back(violation);

@@ -73,6 +73,7 @@ void AgentSandbox::writeConfiguration() const {
       {"RootReportRoot", _directory / "root-reports"},
       {"SystemLogRoot", _directory / "system"},
       {"NetworkConfigRoot", _directory / "network"},
+      {"LocationCacheDir", _directory / "location"},
       {"TemporaryRoot", _directory / "tmp"},
       {"VarLogRoot", _directory / "var-log"},
       {"RuntimeRoot", _directory / "runtime"},

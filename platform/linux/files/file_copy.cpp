@@ -21,6 +21,7 @@ namespace {
 
 // Without set-user-id and set-group-id: the copy is ours, and would lend our rights to its reader.
 constexpr mode_t kPermissionBits = S_IRWXU | S_IRWXG | S_IRWXO;
+constexpr mode_t kOwnMode = S_IRUSR | S_IWUSR;
 constexpr int kOpenSource = O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC;
 constexpr int kOpenDirectory = O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC;
 
@@ -29,6 +30,22 @@ struct Place {
   int directory;
   const char* name;
 };
+
+/// A file beside the target that is gone with us unless it gets a name: whoever sees the target sees it
+/// whole. Some file systems have none.
+Descriptor openNameless(Place target) {
+  const std::string name = target.name;
+  const std::size_t slash = name.rfind('/');
+  const std::string parent = slash == std::string::npos ? "." : name.substr(0, slash + 1);
+  return Descriptor(::openat(target.directory, parent.c_str(), O_TMPFILE | O_WRONLY | O_CLOEXEC, kOwnMode));
+}
+
+/// A target that is there already stays as it is.
+std::error_code giveName(const Descriptor& file, Place target) {
+  const std::string nameless = "/proc/self/fd/" + std::to_string(file.get());
+  if (::linkat(AT_FDCWD, nameless.c_str(), target.directory, target.name, AT_SYMLINK_FOLLOW) == 0) return {};
+  return lastSystemError();
+}
 
 class TreeCopy {
  public:
@@ -73,13 +90,21 @@ class TreeCopy {
     if (::fstat(from.get(), &status) != 0) return lastSystemError();
     // Something else may have taken the name since it was looked at.
     if (!S_ISREG(status.st_mode)) return std::make_error_code(std::errc::operation_not_supported);
-    Descriptor to(
-        ::openat(target.directory, target.name, O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, S_IRUSR | S_IWUSR));
+    struct stat present {};
+    if (::fstatat(target.directory, target.name, &present, AT_SYMLINK_NOFOLLOW) == 0)
+      return std::make_error_code(std::errc::file_exists);
+    Descriptor to = openNameless(target);
+    const bool isNameless = to.isOpen();
+    if (!isNameless) {
+      to = Descriptor(
+          ::openat(target.directory, target.name, O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, kOwnMode));
+    }
     if (!to.isOpen()) return lastSystemError();
     std::error_code error = copyFileContent(from.get(), to.get());
     if (!error) error = _finish(to.get(), status);
+    if (!error && isNameless) error = giveName(to, target);
     if (::close(to.release()) != 0 && !error) error = lastSystemError();
-    if (error) ::unlinkat(target.directory, target.name, 0);
+    if (error && !isNameless) ::unlinkat(target.directory, target.name, 0);
     return error;
   }
 

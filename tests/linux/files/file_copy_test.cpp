@@ -2,6 +2,7 @@
 
 #include <fcntl.h>
 #include <gtest/gtest.h>
+#include <sys/inotify.h>
 #include <sys/socket.h>
 #include <sys/stat.h>
 #include <sys/un.h>
@@ -9,6 +10,7 @@
 
 #include <filesystem>
 #include <string>
+#include <vector>
 
 #include "platform/linux/files/descriptor.h"
 #include "platform/linux/files/file_content.h"
@@ -37,6 +39,27 @@ TEST_F(FileCopyTest, AFileKeepsContentModeAndTime) {
   EXPECT_FALSE(outcome.error) << outcome.error.message();
   EXPECT_EQ(readFile(directory / "b"), content);
   EXPECT_EQ(modeAndTime(directory / "b"), "640 1500000000123456789");
+}
+
+TEST_F(FileCopyTest, ACopyIsWholeFromTheMomentThatItsNameIsThere) {
+  const Descriptor nameless(
+      ::open(directory.path().c_str(), O_TMPFILE | O_WRONLY | O_CLOEXEC, S_IRUSR | S_IWUSR));
+  if (!nameless.isOpen()) GTEST_SKIP() << "the file system has no files without a name";
+  writeFile(directory / "from/a/b", std::string(1'000'003, 'x'));
+  writeFile(directory / "to/there", "");
+  const Descriptor watch(::inotify_init1(IN_NONBLOCK | IN_CLOEXEC));
+  ::inotify_add_watch(watch.get(), (directory / "to").c_str(), IN_CREATE | IN_MODIFY);
+  EXPECT_FALSE(copy("from/a/b", "to/b").error);
+  alignas(inotify_event) char events[4096];
+  const ssize_t length = ::read(watch.get(), events, sizeof events);
+  std::vector<std::uint32_t> seen;
+  for (ssize_t at = 0; at < length;) {
+    const auto& event = *reinterpret_cast<const inotify_event*>(events + at);
+    if (std::string(event.name) == "b") seen.push_back(event.mask);
+    at += static_cast<ssize_t>(sizeof event + event.len);
+  }
+  EXPECT_EQ(seen, std::vector<std::uint32_t>{IN_CREATE});
+  EXPECT_EQ(readFile(directory / "to/b").size(), 1'000'003U);
 }
 
 TEST_F(FileCopyTest, ACopyDoesNotLendItsOwnersRights) {
