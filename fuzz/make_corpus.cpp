@@ -160,6 +160,78 @@ void makeRecords() {
   keepFile("another_files", file.substr(0, 20) + file);
 }
 
+/// The first byte says how the text is read.
+void keepText(const std::string& name, char selector, const std::string& text) {
+  keep(name, std::string(1, selector) + text);
+}
+
+void makeConfigurations() {
+  keepText("configuration_fuzzer/empty", 0, "");
+  keepText("configuration_fuzzer/usual", 0,
+           "[roots]\nUserLogRoot = \"~/logs\"\n[log]\ncategories = [\"IPC\"]\nrotationSize = 8388608\n"
+           "[commands]\nprofile = \"literal\"\n\"console.top\" = \"top -b\"\n");
+  keepText("configuration_fuzzer/wrong_values", 0,
+           "[roots]\nStateRoot = \"there\"\nnone = 1\n[ipc]\nmaximumPayload = 12\n[log]\nrotationSize = 1e9\n"
+           "[commands]\nsystemLogReader = \"a/b\"\n[\"sec\\ntion\"]\n\"k\\u001b\" = 1\n");
+  keepText("configuration_fuzzer/broken", 0, "[log]\nrotationSize = \n[[[");
+  keepText("configuration_fuzzer/deep", 0, "a = " + std::string(300, '[') + std::string(300, ']'));
+  keepText("configuration_fuzzer/no_text", 0, "[log]\njournalSocket = \"/\xFF\xFE\"\n");
+  keepText("configuration_fuzzer/switches", 1, "# mine\nCallLogging = false # why\na=true\n[more]\nx = 1\n");
+  keepText("configuration_fuzzer/value_of_lines", 1, "a = [\n 1,\n 2 ]\nCallLogging.x = 1\n");
+  keepText("configuration_fuzzer/section_in_place", 1, "[CallLogging]\nx = 1\n[a.b]\n");
+  keepText("configuration_fuzzer/no_line_end", 1, "a = 1 # \xC3\xBC\r\n\"CallLogging\" = true");
+}
+
+void makePropertyLists() {
+  const std::string begin = "<?xml version=\"1.0\"?><plist version=\"1.0\"><dict>";
+  const std::string end = "</dict></plist>";
+  keep("property_list_fuzzer/version",
+       begin + "<key>ProductName</key><string>Phone</string><key>Build</key><string>1A2</string>" + end);
+  keep("property_list_fuzzer/other_values",
+       begin + "<key>n</key><integer>1</integer><key>t</key><true/><key>d</key><dict/><key>s</key><string/>" +
+           end);
+  keep("property_list_fuzzer/twice",
+       begin + "<key>k</key><string>1</string><key>k</key><string>2</string>" + end);
+  keep("property_list_fuzzer/references",
+       begin + "<key>&lt;&#13;&#x1;</key><string>&amp;&#xFFFE;<![CDATA[a]]>b</string>" + end);
+  keep("property_list_fuzzer/entities", "<!DOCTYPE p [<!ENTITY a \"aa\"><!ENTITY b \"&a;&a;\">]>" + begin +
+                                            "<key>k</key><string>&b;</string>" + end);
+  keep("property_list_fuzzer/torn", begin + "<key>k</key><str");
+  keep("property_list_fuzzer/no_list", "<dict><key>k</key><string>v</string></dict>");
+}
+
+void makeNames() {
+  keep("name_fuzzer/dashed", "log-baseband-2024-05-02-14-03-16-end.tar");
+  keep("name_fuzzer/compact", "system-2024-05-02-140316.logarchive");
+  keep("name_fuzzer/no_date", "log-2024-02-30-25-61-61-x");
+  keep("name_fuzzer/leap", "2024-02-29-235960 2023-02-29-000000");
+  keep("name_fuzzer/ends_early", "log-2024-05-02-14-03-1");
+  keep("name_fuzzer/first_and_last", "0001-01-01-00-00-00 9999-12-31-23-59-59 0000-00-00-000000");
+}
+
+void makeAlerts() {
+  const std::string record =
+      "title = \"T\"\nmessage = \"M\"\ndefaultButton = \"Yes\"\nalternateButton = \"No\"\nposted = "
+      "1714651396255\n"
+      "agentProcess = 77\nagentStart = 123456\n";
+  keepText("alert_fuzzer/waiting", 0, record + "state = \"waiting\"\n");
+  keepText(
+      "alert_fuzzer/answered", 0,
+      record +
+          "state = \"answered\"\ntimeout = 1e3\nlevel = 2\n[response]\nbutton = \"other\"\ntext = \"t\"\n"
+          "[textField]\ntitle = \"\"\n[information]\nk = \"v\"\n");
+  keepText("alert_fuzzer/out_of_range", 0,
+           "posted = 9223372036854775807\nagentProcess = -1\nagentStart = -1\nstate = \"waiting\"\n");
+  keepText("alert_fuzzer/answer", 1, "button = \"default\"\ntext = \"broken again\"\n");
+  keepText("alert_fuzzer/no_such_button", 1, "button = \"\\u001b[0m\"\n");
+  keepText("alert_fuzzer/text_is_none", 1, "button = \"cancel\"\ntext = 5\n");
+  keepText("alert_fuzzer/broken", 1, "button = \"cancel\n");
+  keepText("alert_fuzzer/dialog_ok", 2, "typed\n");
+  keepText("alert_fuzzer/dialog_label", 2 + 21, "Later\n");
+  keepText("alert_fuzzer/dialog_no_display", 2 + 1, std::string("\0cannot open Display :0\n", 24));
+  keepText("alert_fuzzer/dialog_killed", static_cast<char>(2 - 9), "");
+}
+
 }  // namespace
 
 int main(int count, char** arguments) {
@@ -171,4 +243,8 @@ int main(int count, char** arguments) {
   makeFrames();
   makeMessages();
   makeRecords();
+  makeConfigurations();
+  makePropertyLists();
+  makeNames();
+  makeAlerts();
 }

@@ -7,6 +7,7 @@
 
 #include <toml++/toml.h>
 
+#include "platform/linux/config/toml_error.h"
 #include "platform/linux/files/escaped_text.h"
 #include "platform/linux/files/unix_milliseconds.h"
 #include "platform/linux/wire/utf8.h"
@@ -64,7 +65,7 @@ std::optional<toml::table> parsed(std::string_view text, std::string& reason) {
   try {
     return toml::parse(text);
   } catch (const toml::parse_error& error) {
-    reason = "line " + std::to_string(error.source().begin.line) + ": " + std::string(error.description());
+    reason = "line " + lineAndReason(error);
     return std::nullopt;
   }
 }

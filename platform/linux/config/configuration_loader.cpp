@@ -8,9 +8,14 @@
 #include "platform/linux/config/configuration_keys.h"
 #include "platform/linux/config/host_paths.h"
 #include "platform/linux/config/text_file.h"
+#include "platform/linux/config/toml_error.h"
+#include "platform/linux/files/escaped_text.h"
 
 namespace zal {
 namespace {
+
+/// Keys can be of any size and hold what no terminal should be shown.
+constexpr std::size_t kLongestWarning = 400;
 
 bool isKnownSection(std::string_view section) {
   const auto keys = configurationKeys();
@@ -63,7 +68,9 @@ class Reader {
     }
   }
 
-  void _warn(toml::source_index line, std::string text) { _warnings.emplace_back(line, std::move(text)); }
+  void _warn(toml::source_index line, std::string_view text) {
+    _warnings.emplace_back(line, escapedLine(cutAtCharacter(text, kLongestWarning)));
+  }
 
   LoadedConfiguration& _result;
   const std::string& _home;
@@ -107,8 +114,7 @@ void ConfigurationLoader::_readFile(LoadedConfiguration& result) const {
   try {
     Reader(result, _environment.homeDirectory).readDocument(toml::parse(text, *file));
   } catch (const toml::parse_error& error) {
-    result.warnings.push_back(*file + ":" + std::to_string(error.source().begin.line) + ": " +
-                              std::string(error.description()));
+    result.warnings.push_back(*file + ":" + lineAndReason(error));
   }
 }
 

@@ -4,6 +4,8 @@
 
 #include <toml++/toml.h>
 
+#include "platform/linux/config/toml_error.h"
+
 namespace zal {
 namespace {
 
@@ -69,7 +71,7 @@ std::optional<std::string> withSwitch(const std::string& text, std::string_view 
     reason = std::to_string(node == nullptr ? 1 : node->source().begin.line) + ": the value of " +
              std::string(key) + " cannot be replaced; edit the file by hand";
   } catch (const toml::parse_error& error) {
-    reason = std::to_string(error.source().begin.line) + ": " + std::string(error.description());
+    reason = lineAndReason(error);
   }
   return std::nullopt;
 }

@@ -7,6 +7,7 @@
 
 #include "platform/linux/config/preference_text.h"
 #include "platform/linux/config/text_file.h"
+#include "platform/linux/config/toml_error.h"
 
 namespace zal {
 namespace {
@@ -58,8 +59,7 @@ TomlPreferenceStore::Domain& TomlPreferenceStore::_synchronized(std::string_view
   try {
     domain.switches = switchesOf(toml::parse(text, path));
   } catch (const toml::parse_error& error) {
-    _log.warning(path + ":" + std::to_string(error.source().begin.line) + ": " +
-                 std::string(error.description()));
+    _log.warning(path + ":" + lineAndReason(error));
   }
   return domain;
 }
