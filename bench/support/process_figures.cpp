@@ -33,6 +33,10 @@ double residentMebibytes(pid_t process) {
   return static_cast<double>(labelledNumber(processFolder(process) / "status", "VmRSS:")) / 1024;
 }
 
+double peakMebibytes(pid_t process) {
+  return static_cast<double>(labelledNumber(processFolder(process) / "status", "VmHWM:")) / 1024;
+}
+
 double proportionalMebibytes(pid_t process) {
   return static_cast<double>(labelledNumber(processFolder(process) / "smaps_rollup", "Pss:")) / 1024;
 }
