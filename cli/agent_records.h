@@ -2,6 +2,7 @@
 
 #include <chrono>
 #include <cstddef>
+#include <cstdint>
 #include <optional>
 #include <string>
 #include <vector>
@@ -24,6 +25,19 @@ struct PostedAlert {
   std::string answer;  ///< the button that was chosen; empty unless answered
 
   [[nodiscard]] bool waits() const { return state == "waiting"; }
+};
+
+/// What clients have of the agent's memory, as the agent shows it.
+struct MemoryView {
+  struct Client {
+    std::int64_t process = 0, user = 0;
+    std::uint64_t bytes = 0;
+    std::uint64_t delayedMessages = 0;
+    bool waits = false;
+  };
+  std::int64_t agent = 0;
+  std::uint64_t bytes = 0;  ///< of all of them, former ones included
+  std::vector<Client> clients;
 };
 
 /// A collection of the agent's, as its progress record tells it.

@@ -23,6 +23,7 @@
 #include "platform/linux/config/toml_preference_store.h"
 #include "platform/linux/files/descriptor.h"
 #include "platform/linux/files/system_error.h"
+#include "platform/linux/ipc/client_shares.h"
 #include "platform/linux/loop/linux_clock.h"
 #include "platform/linux/notifications/notification_file.h"
 #include "platform/linux/progress/progress_file.h"
@@ -176,6 +177,16 @@ class ThisMachine final : public ToolHost {
     for (ListedDumpProgress& listed : listDumpProgress(progressDirectory(settings().roots.RuntimeRoot)))
       result.push_back(dumpView(std::move(listed)));
     return result;
+  }
+  [[nodiscard]] std::optional<MemoryView> memory() override {
+    const auto shares = readClientShares(clientSharesPath(settings().roots.RuntimeRoot));
+    if (!shares) return std::nullopt;
+    MemoryView view{.agent = shares->agent, .bytes = shares->bytes, .clients = {}};
+    for (const ClientShare& client : shares->clients) {
+      view.clients.push_back(
+          {client.process, client.user, client.bytes, client.delayedMessages, client.isWaiting});
+    }
+    return view;
   }
   [[nodiscard]] bool isInteractive() const override {
     return outputIsTerminal() && ::isatty(STDIN_FILENO) != 0;

@@ -57,6 +57,39 @@ std::string milliseconds(double value) {
   return text;
 }
 
+/// Of the agent that answered, not of one that was killed.
+std::optional<MemoryView> memoryOf(ToolContext& tool, const Answer& answer) {
+  auto memory = tool.host.memory();
+  if (answer.result != LIRRA_OK || (memory && memory->agent != answer.process)) return std::nullopt;
+  return memory;
+}
+
+std::string mebibytes(std::uint64_t bytes) {
+  char text[32];
+  std::snprintf(text, sizeof text, "%.1f MiB", static_cast<double>(bytes) / (1U << 20U));
+  return text;
+}
+
+std::string clientText(const MemoryView::Client& client) {
+  return mebibytes(client.bytes) + " of it from process " + std::to_string(client.process) + " of user " +
+         std::to_string(client.user) + "; " + std::to_string(client.delayedMessages) +
+         " of its messages were delayed" + (client.waits ? "; it waits" : "");
+}
+
+std::string memoryJson(const MemoryView& memory) {
+  std::vector<std::string> clients;
+  for (const MemoryView::Client& client : memory.clients) {
+    clients.push_back(JsonObject()
+                          .add("process", client.process)
+                          .add("user", client.user)
+                          .add("bytes", client.bytes)
+                          .add("delayedMessages", client.delayedMessages)
+                          .add("waits", client.waits)
+                          .text());
+  }
+  return JsonObject().add("bytes", memory.bytes).addJson("clients", jsonArray(clients)).text();
+}
+
 void print(ToolContext& tool, const Answer& answer) {
   const ToolSettings& settings = tool.host.settings();
   const auto row = [&](std::string name, const std::string& value) {
@@ -68,6 +101,10 @@ void print(ToolContext& tool, const Answer& answer) {
                      milliseconds(answer.milliseconds) + " ms");
   } else {
     row("agent", "none answers");
+  }
+  if (const auto memory = memoryOf(tool, answer)) {
+    row("memory", mebibytes(memory->bytes) + " of lines");
+    for (const MemoryView::Client& client : memory->clients) row("", clientText(client));
   }
   const std::string socket = tool.socketPath();
   row("socket", socket.empty() ? "not known" : socket);
@@ -90,6 +127,7 @@ void printJson(ToolContext& tool, const Answer& answer) {
   status.add("running", answer.result == LIRRA_OK);
   if (answer.result == LIRRA_OK) {
     status.add("process", answer.process).addJson("answeredInMs", milliseconds(answer.milliseconds));
+    if (const auto memory = memoryOf(tool, answer)) status.addJson("memory", memoryJson(*memory));
   } else {
     status.add("trouble", lirra_result_text(answer.result)).add("reason", answer.trouble);
   }

@@ -43,6 +43,8 @@ class ToolHost {
                                                                const std::optional<std::string>& text) = 0;
   /// All collections of the agent that are recorded, the oldest first.
   [[nodiscard]] virtual std::vector<DumpView> dumps() = 0;
+  /// Nothing while it is not worth a word.
+  [[nodiscard]] virtual std::optional<MemoryView> memory() = 0;
 
   /// A person types, and sees what is printed.
   [[nodiscard]] virtual bool isInteractive() const = 0;

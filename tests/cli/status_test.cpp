@@ -33,6 +33,37 @@ TEST_F(StatusTest, RunningAgentIsShownWithItsProcess) {
   EXPECT_EQ(err, "");
 }
 
+TEST_F(StatusTest, ShowsWhatClientsHaveOfTheMemoryOfTheAgentThatAnswered) {
+  startAgent();
+  machine.agentMemory =
+      MemoryView{::getpid(), 5U << 20U, {{4711, 1000, 3U << 20U, 17, true}, {4712, 0, 1U << 19U, 0, false}}};
+  EXPECT_EQ(run({"status"}), 0);
+  EXPECT_EQ(
+      plain(out),
+      "agent                  process " + std::to_string(::getpid()) +
+          " answered in 0.0 ms\n"
+          "memory                 5.0 MiB of lines\n"
+          "                       3.0 MiB of it from process 4711 of user 1000; 17 of its messages were "
+          "delayed; it waits\n"
+          "                       0.5 MiB of it from process 4712 of user 0; 0 of its messages were "
+          "delayed\n" +
+          kRest);
+  machine.agentMemory->agent = ::getpid() + 1;
+  EXPECT_EQ(run({"status"}), 0);
+  EXPECT_EQ(plain(out).find("MiB"), std::string::npos);
+}
+
+TEST_F(StatusTest, ForProgramsMemoryIsAnObjectToo) {
+  startAgent();
+  machine.agentMemory = MemoryView{::getpid(), 500, {{4711, 1000, 300, 17, true}}};
+  EXPECT_EQ(run({"status", "--json"}), 0);
+  EXPECT_NE(
+      plain(out).find(
+          R"("answeredInMs": 0.0, "memory": {"bytes": 500, "clients": [{"process": 4711, "user": 1000, )"
+          R"("bytes": 300, "delayedMessages": 17, "waits": true}]}, "socket")"),
+      std::string::npos);
+}
+
 TEST_F(StatusTest, AgentThatIsNotRunningIsToldWithHowToStartIt) {
   EXPECT_EQ(run({"status"}), 1);
   EXPECT_EQ(plain(out), "agent                  none answers\n" + kRest);

@@ -65,6 +65,7 @@ class ScriptedMachine final : public ToolHost {
     return answerTrouble.empty() ? std::nullopt : std::optional(answerTrouble);
   }
   [[nodiscard]] std::vector<DumpView> dumps() override { return recordedDumps; }
+  [[nodiscard]] std::optional<MemoryView> memory() override { return agentMemory; }
   [[nodiscard]] bool isInteractive() const override { return terminal; }
   [[nodiscard]] std::size_t redrawWidth() const override { return terminal ? 60 : 0; }
   [[nodiscard]] bool outputIsTerminal() const override { return terminal; }
@@ -92,6 +93,7 @@ class ScriptedMachine final : public ToolHost {
   std::vector<std::string> answers;
   std::string answerTrouble;
   std::vector<DumpView> recordedDumps;
+  std::optional<MemoryView> agentMemory;
   std::string workingDirectory;
   bool terminal = false;
   std::chrono::steady_clock::time_point moment;

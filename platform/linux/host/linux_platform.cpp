@@ -63,7 +63,9 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
            {.path = socketPath(environment).value_or(""),
             .settings = _loaded.configuration.ipc,
             .flush = [this] { _logFiles.flush(); },
-            .confirm = [this] { _keepWhatCame(); }}),
+            .confirm = [this] { _keepWhatCame(); },
+            .memory = &_memory,
+            .sharesPath = clientSharesPath(_loaded.configuration.roots.RuntimeRoot)}),
       // Before the log files: what it has to say is in them when the loop sleeps.
       _sessionRecords(_mainLoop, _agentLog, _loaded.configuration.roots.StateRoot + "/BlackBox",
                       _loaded.configuration.blackBox),

@@ -1,11 +1,15 @@
 #include "platform/linux/ipc/unix_ipc_service.h"
 
+#include <unistd.h>
+
+#include <algorithm>
 #include <utility>
 #include <vector>
 
 #include "platform/linux/ipc/listening_socket.h"
 #include "platform/linux/ipc/unix_ipc_listener.h"
 #include "platform/linux/ipc/unix_peer_connection.h"
+#include "platform/linux/loop/steady_time.h"
 
 namespace zal {
 namespace {
@@ -22,10 +26,25 @@ UnixIpcService::UnixIpcService(asio::io_context& context, RunLoop& loop, AgentLo
       _path(std::move(options.path)),
       _passed(takePassedListener()),
       _context(std::make_shared<IpcContext>(context, log, std::move(options.settings),
-                                            std::move(options.flush), std::move(options.confirm))) {}
+                                            std::move(options.flush), std::move(options.confirm),
+                                            options.memory)),
+      _shares(std::move(options.sharesPath)) {
+  _context->showShares = [this] { _showShares(); };
+}
 
 UnixIpcService::~UnixIpcService() {
+  _context->showShares = [] {};
   for (const auto& peer : peersOf(*_context)) peer->cancel();
+}
+
+void UnixIpcService::_showShares() {
+  const SteadyTime now = roughSteadyTime();
+  if (!_shares.isDue(now) || _context->memory == nullptr) return;
+  ClientShares shares{.agent = ::getpid(), .bytes = _context->memory->total(), .clients = {}};
+  for (const auto& peer : _context->peers) shares.clients.push_back(peer->share());
+  std::sort(shares.clients.begin(), shares.clients.end(),
+            [](const ClientShare& a, const ClientShare& b) { return a.process < b.process; });
+  _shares.write(shares, now);
 }
 
 std::unique_ptr<IpcListener> UnixIpcService::makeListener(std::string serviceName) {
@@ -37,6 +56,9 @@ void UnixIpcService::terminationImminent() {
   for (const auto& peer : peersOf(*_context)) peer->deliverError(IpcError::terminationImminent);
 }
 
-void UnixIpcService::stopListening() { _context->stopListening(); }
+void UnixIpcService::stopListening() {
+  _context->stopListening();
+  _shares.remove();
+}
 
 }  // namespace zal

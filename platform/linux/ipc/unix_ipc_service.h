@@ -10,6 +10,7 @@
 #include "platform/configuration.h"
 #include "platform/ipc_listener.h"
 #include "platform/linux/files/descriptor.h"
+#include "platform/linux/ipc/client_shares_file.h"
 #include "platform/linux/ipc/ipc_context.h"
 #include "platform/run_loop.h"
 
@@ -30,6 +31,8 @@ class UnixIpcService final : public IpcService {
     std::function<void()> flush;      ///< brings all that was logged into the files
     std::function<void()> confirm{};  ///< keeps all that came as safe as is promised, before each barrier's
                                       ///< answer; none: flush
+    MemoryLedger* memory = nullptr;   ///< who has more than a share of it has to wait; null: nobody has
+    std::string sharesPath{};         ///< where it is shown what clients have of it; empty: nowhere
   };
 
   /// Takes the descriptor that a service manager passed, and its variables out of the environment:
@@ -46,10 +49,13 @@ class UnixIpcService final : public IpcService {
   [[nodiscard]] std::size_t peerCount() const { return _context->peers.size(); }
 
  private:
+  void _showShares();
+
   RunLoop& _loop;
   std::string _path;
   Descriptor _passed;
   std::shared_ptr<IpcContext> _context;
+  ClientSharesFile _shares;
 };
 
 }  // namespace zal

@@ -3,6 +3,8 @@
 #include <sys/socket.h>
 
 #include <cerrno>
+#include <chrono>
+#include <utility>
 
 #include <asio/post.hpp>
 
@@ -17,6 +19,26 @@ using asio::posix::descriptor_base;
 
 /// Of what one client says in a moment without being in a hurry.
 constexpr std::size_t kLargestLoneRead = 4096;
+
+/// A client over its share is read this often all the same: nobody else's memory, nor a disk that refuses,
+/// may shut it out.
+constexpr std::chrono::seconds kLongestWait{1};
+
+/// Has a client pay for what its requests make others keep.
+class PayingPeer {
+ public:
+  PayingPeer(MemoryLedger* memory, const std::shared_ptr<MemoryAccount>& account) : _memory(memory) {
+    if (_memory != nullptr) _memory->setPayer(account);
+  }
+  ~PayingPeer() {
+    if (_memory != nullptr) _memory->setPayer(nullptr);
+  }
+  PayingPeer(const PayingPeer&) = delete;
+  PayingPeer& operator=(const PayingPeer&) = delete;
+
+ private:
+  MemoryLedger* const _memory;
+};
 
 bool isRetryLater(int error) { return error == EAGAIN || error == EWOULDBLOCK; }
 
@@ -57,18 +79,65 @@ void UnixPeerConnection::_readTurn() {
   const std::shared_ptr<PeerConnection> keptAlive = shared_from_this();
   char* const buffer = _context->readBuffer.get();
   const auto size = ::recv(_socket->native_handle(), buffer, kReadBufferSize, MSG_DONTWAIT);
-  if (size < 0 && (isRetryLater(errno) || errno == EINTR)) return _awaitInput();
+  if (size < 0 && (isRetryLater(errno) || errno == EINTR)) {
+    _isDelayed = false;
+    return _awaitInput();
+  }
   if (size <= 0) return _becomeInvalid();
 
   _decoder.feed({buffer, static_cast<std::size_t>(size)});
-  _takeFrames(keptAlive);
-  if (!_socket) return;
-  _writeOutWhatCameAlone(static_cast<std::size_t>(size));
-  if (static_cast<std::size_t>(size) == kReadBufferSize) {
-    asio::post(_context->io, [self = shared_from_this()] { self->_readTurn(); });
-  } else {
-    _awaitInput();
+  {
+    const PayingPeer paying(_context->memory, _account);
+    _takeFrames(keptAlive);
   }
+  if (!_socket) return;
+  _isDelayed = false;
+  _writeOutWhatCameAlone(static_cast<std::size_t>(size));
+  _awaitTurn(static_cast<std::size_t>(size) == kReadBufferSize);
+}
+
+void UnixPeerConnection::_awaitTurn(bool hasMore) {
+  if (_hasTooMuch()) return _awaitMemory();
+  if (!hasMore) return _awaitInput();
+  asio::post(_context->io, [self = shared_from_this()] { self->_readTurn(); });
+}
+
+bool UnixPeerConnection::_hasTooMuch() const {
+  return _context->memory != nullptr && _context->memory->isOverShare(*_account);
+}
+
+/// What the client says meanwhile stays in the socket, until it fills and the client has to wait as well.
+void UnixPeerConnection::_awaitMemory() {
+  if (!std::exchange(_hearsOfMemory, true)) {
+    _context->memory->onRelease([weak = weak_from_this()] {
+      const auto self = weak.lock();
+      if (!self) return;
+      self->_hearsOfMemory = false;
+      if (!self->_waiting) return;
+      if (self->_hasTooMuch()) return self->_awaitMemory();
+      self->_endWaiting();
+    });
+  }
+  if (_waiting) return;
+  _waiting.emplace(_context->io, kLongestWait);
+  _waiting->async_wait([self = shared_from_this()](const std::error_code& error) {
+    if (!error) self->_endWaiting();
+  });
+}
+
+void UnixPeerConnection::_endWaiting() {
+  _waiting.reset();
+  if (!_socket) return;
+  _isDelayed = true;
+  asio::post(_context->io, [self = shared_from_this()] { self->_readTurn(); });
+}
+
+ClientShare UnixPeerConnection::share() const {
+  return {.process = _credentials.process,
+          .user = _credentials.user,
+          .bytes = _account->bytes,
+          .delayedMessages = _delayedMessages,
+          .isWaiting = _waiting.has_value()};
 }
 
 /// A record that comes alone is in its file before the loop asks the kernel for more, twice, only to
@@ -98,6 +167,7 @@ void UnixPeerConnection::_takeFrame(const std::shared_ptr<PeerConnection>& self,
       return _takeMessage(self, frame);
     case FrameKind::barrier: {
       if (_context->confirm) _context->confirm();
+      _context->showShares();
       FrameHeader passed;
       passed.kind = FrameKind::barrierPassed;
       passed.cookie = frame.header.cookie;
@@ -110,6 +180,7 @@ void UnixPeerConnection::_takeFrame(const std::shared_ptr<PeerConnection>& self,
 }
 
 void UnixPeerConnection::_takeMessage(const std::shared_ptr<PeerConnection>& self, const Frame& frame) {
+  if (_isDelayed) ++_delayedMessages;
   const auto message = WireMessage::fromFrame(frame);
   if (!message) return _skipFrame();
   if (_context->delivering) _context->handler(self, &*message);
@@ -188,6 +259,7 @@ void UnixPeerConnection::_close() {
   const auto keptAlive = shared_from_this();
   _context->peers.erase(keptAlive);
   _socket.reset();
+  _waiting.reset();
   std::string().swap(_backlog);
   _sent = 0;
 }

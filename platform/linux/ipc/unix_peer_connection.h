@@ -5,9 +5,11 @@
 #include <string>
 
 #include <asio/posix/stream_descriptor.hpp>
+#include <asio/steady_timer.hpp>
 
 #include "platform/linux/files/descriptor.h"
 #include "platform/linux/ipc/access_policy.h"
+#include "platform/linux/ipc/client_shares.h"
 #include "platform/linux/ipc/ipc_context.h"
 #include "platform/linux/wire/frame_decoder.h"
 
@@ -17,7 +19,8 @@ namespace zal {
 /// sends replies. What a handler throws passes through to the loop. Main thread only.
 ///
 /// At most one read of the shared buffer's size a turn: a client that fills it goes to the back of
-/// the loop's queue, one that does not has been drained.
+/// the loop's queue, one that does not has been drained. A client that has more than its share of the
+/// agent's memory waits until there is room again, or a second for each such read.
 class UnixPeerConnection final : public PeerConnection,
                                  public std::enable_shared_from_this<UnixPeerConnection> {
  public:
@@ -28,6 +31,7 @@ class UnixPeerConnection final : public PeerConnection,
   void start();
   /// Delivers an error that does not end the connection.
   void deliverError(IpcError error);
+  [[nodiscard]] ClientShare share() const;
 
   [[nodiscard]] pid_t processId() const override { return _credentials.process; }
   [[nodiscard]] bool isConnected() const override { return _socket.has_value(); }
@@ -37,6 +41,10 @@ class UnixPeerConnection final : public PeerConnection,
  private:
   void _deliver(const IpcEvent& event);
   void _awaitInput();
+  void _awaitTurn(bool hasMore);
+  [[nodiscard]] bool _hasTooMuch() const;
+  void _awaitMemory();
+  void _endWaiting();
   void _readTurn();
   void _writeOutWhatCameAlone(std::size_t size);
   void _takeFrames(const std::shared_ptr<PeerConnection>& self);
@@ -58,6 +66,11 @@ class UnixPeerConnection final : public PeerConnection,
   std::size_t _sent = 0;
   bool _awaitingOutput = false;
   bool _finished = false;  // no event is delivered any more
+  const std::shared_ptr<MemoryAccount> _account = std::make_shared<MemoryAccount>();
+  std::optional<asio::steady_timer> _waiting;  // for memory, not for the peer
+  bool _hearsOfMemory = false;
+  bool _isDelayed = false;  // what comes with the next read had to wait
+  std::uint64_t _delayedMessages = 0;
   std::uint64_t _skippedFrames = 0;
 };
 

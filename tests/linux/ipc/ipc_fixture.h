@@ -20,8 +20,10 @@ namespace zal {
 class IpcFixture : public ::testing::Test {
  protected:
   void startService() {
-    service = std::make_unique<UnixIpcService>(
-        loop.context(), loop, log, UnixIpcService::Options{path, settings, [this] { ++flushes; }});
+    options.path = path;
+    options.settings = settings;
+    options.flush = [this] { ++flushes; };
+    service = std::make_unique<UnixIpcService>(loop.context(), loop, log, options);
     listener = service->makeListener("com.vendel.lirra");
     listener->resume([this] { ++invalidations; },
                      [this](const std::shared_ptr<PeerConnection>& peer, const IpcEvent& event) {
@@ -73,6 +75,7 @@ class IpcFixture : public ::testing::Test {
   testing::TemporaryDirectory directory;
   const std::string path = directory / "com.vendel.lirra";
   IpcSettings settings;
+  UnixIpcService::Options options;  ///< the other ones
   testing::RecordingAgentLog log;
   LinuxRunLoop loop;
   std::unique_ptr<UnixIpcService> service;
