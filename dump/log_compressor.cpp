@@ -43,6 +43,16 @@ std::string temporarySuffix(std::string name) {
   return name.substr(start);
 }
 
+/// Once more where it fails: a signal or a moment without descriptors is enough for that.
+void removeTree(const std::string& path) {
+  constexpr int kMostTimes = 3;
+  std::error_code error;
+  for (int time = 0; time < kMostTimes; ++time) {
+    std::filesystem::remove_all(path, error);
+    if (!error) return;
+  }
+}
+
 /// Not to be written any more, it is no leftover of who made it. False when there is none.
 bool keepInTemporaryArea(const std::string& archive) {
   using std::filesystem::perms;
@@ -109,14 +119,13 @@ void _LirraLogCompressor::_settle(FileCopierJob& job, const std::string& tempora
   _services.queues.global(QueuePriority::standard)
       .async([this, &job, temporary, archive, completion = std::move(completion)]() mutable {
         const std::error_code error = _services.files.move(temporary, archive);
-        std::error_code ignored;
         const bool isKept = error && keepInTemporaryArea(temporary);
         if (isKept) {
           _services.log.warning("\"" + archive + "\" could not be put in its place (" + error.message() +
                                 "); for a day it is kept as \"" + temporary + '"');
         }
         // What is in no archive stays. Without a slash at the end: with one, a link would be followed.
-        if (!error || isKept) std::filesystem::remove_all(withoutEndSlashes(job.identifier()), ignored);
+        if (!error || isKept) removeTree(withoutEndSlashes(job.identifier()));
         _services.queues.main().async([this, &job, completion = std::move(completion)] {
           const auto released = _take(job);
           if (completion) completion();

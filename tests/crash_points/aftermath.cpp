@@ -60,6 +60,8 @@ std::vector<Aftermath::GatheredText> Aftermath::_gathered(const std::string& ofN
     }
   }
   for (const std::string& archive : _archives) {
+    // Kept because the archive has not all of it.
+    if (fs::exists(archive.substr(0, archive.size() - 4) + " (not archived)")) continue;
     for (const ZipEntry& entry : listZip(archive).value_or(std::vector<ZipEntry>())) {
       if (isWanted(entry.name))
         found.push_back({archive, entry.name, readZipEntry(archive, entry.name).value_or("")});

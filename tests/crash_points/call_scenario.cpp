@@ -41,7 +41,7 @@ class Call : public Scenario {
     for (int attempt = 0; attempt < 3 && !told.endIsConfirmed; ++attempt) {
       told.endIsConfirmed = client.tell([](MessageBuilder& message) { begin(message, 1, "sessionType"); });
     }
-    client.waitUntil([&] { return isCollectionOver(sandbox); });
+    waitForArchive(sandbox, client);
   }
 
   void check(Aftermath& after, const Told& told) const override {

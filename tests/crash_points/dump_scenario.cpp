@@ -36,7 +36,7 @@ class Dump : public Scenario {
       });
     }
     for (int number = kRecords / 2; number < kRecords; ++number) tellRecord(client, told, number);
-    client.waitUntil([&] { return isCollectionOver(sandbox); });
+    waitForArchive(sandbox, client);
   }
 
   void check(Aftermath& after, const Told& told) const override {

@@ -18,12 +18,21 @@ void tellRecord(PlayedClient& client, Told& told, int number) {
   if (isConfirmed) told.confirmedRecords.insert(number);
 }
 
+namespace {
+
 bool isCollectionOver(const AgentSandbox& sandbox) {
   for (const ListedDumpProgress& listed : listDumpProgress(progressDirectory(sandbox / "runtime"))) {
     if (listed.record.state != DumpProgressRecord::State::running) return true;
   }
   // Where the record itself failed.
   return readFile(sandbox.outputFile()).find("Done zipping log") != std::string::npos;
+}
+
+}  // namespace
+
+void waitForArchive(const AgentSandbox& sandbox, PlayedClient& client) {
+  client.waitUntil([&] { return isCollectionOver(sandbox); });
+  client.tell([](MessageBuilder& message) { message.setInt64("__ipc__event_code__", 10); });
 }
 
 std::unique_ptr<Scenario> Scenario::named(const std::string& name) {

@@ -45,7 +45,7 @@ class Scenario {
 
 /// One log record with that number.
 void tellRecord(PlayedClient& client, Told& told, int number);
-/// Whether the agent has made an archive, or said why not.
-[[nodiscard]] bool isCollectionOver(const AgentSandbox& sandbox);
+/// Until the agent has made an archive or said why not, and has done what follows from that.
+void waitForArchive(const AgentSandbox& sandbox, PlayedClient& client);
 
 }  // namespace zal::testing

@@ -173,7 +173,7 @@ void SupervisedAgent::_answer(const seccomp_notif& question) {
   const WatchedCall* const call = findCall(_watched, question.data.nr);
   if (call != nullptr && _isOurs(static_cast<pid_t>(question.pid))) {
     using Kind = Judgement::Kind;
-    const Judgement judgement = _judge(++_calls, *call, question.data);
+    const Judgement judgement = _judge(_process, *call, question.data);
     if (judgement.kind == Kind::fails) {
       answer.flags = 0;
       answer.error = -judgement.error;

@@ -34,9 +34,8 @@ struct Judgement {
 /// The real daemon, asked before each watched call of any of its threads. What its children call passes.
 class SupervisedAgent {
  public:
-  /// `number` counts from 1, over all threads. On a thread of the supervisor.
-  using Judge =
-      std::function<Judgement(std::uint64_t number, const WatchedCall& call, const seccomp_data& data)>;
+  /// On a thread of the supervisor.
+  using Judge = std::function<Judgement(pid_t process, const WatchedCall& call, const seccomp_data& data)>;
 
   SupervisedAgent(const AgentSandbox& sandbox, const std::vector<WatchedCall>& calls, Judge judge);
   /// Kills it if it still runs, and lets its children end.
@@ -47,7 +46,6 @@ class SupervisedAgent {
   /// Whether this host lets a process ask about another one's system calls.
   [[nodiscard]] static bool isPossible();
   [[nodiscard]] bool hasEnded() const;
-  [[nodiscard]] std::uint64_t calls() const { return _calls; }
   [[nodiscard]] pid_t processId() const { return _process; }
   void signal(int number) const;
   /// The exit status, or minus the signal that killed it; nothing when it runs beyond the deadline.
@@ -68,7 +66,6 @@ class SupervisedAgent {
   Descriptor _processDescriptor;
   Descriptor _listener;
   Descriptor _stop;
-  std::atomic<std::uint64_t> _calls{0};
   std::optional<int> _status;
   std::thread _supervisor;
 };

@@ -13,6 +13,7 @@ struct WatchedCall {
   const char* name;
   std::vector<int> errors;     ///< what it is made to fail with, where faults are injected
   bool onlyIfItMakes = false;  ///< only an open that may make or empty a file
+  bool ofFilesOnly = false;    ///< its first argument has to be a file or directory for that
   bool writes = false;         ///< descriptor, bytes and their number are its first three arguments
 };
 

@@ -1,5 +1,9 @@
 #include "tests/crash_points/trial.h"
 
+#include <sys/epoll.h>
+#include <sys/syscall.h>
+#include <sys/uio.h>
+
 #include <csignal>
 #include <cstring>
 
@@ -8,6 +12,7 @@
 #include <exception>
 #include <filesystem>
 #include <mutex>
+#include <string_view>
 #include <thread>
 
 #include "tests/crash_points/aftermath.h"
@@ -20,7 +25,7 @@ namespace zal::testing {
 namespace {
 
 /// A run takes a tenth of a second; who needs that long waits for something that does not come.
-constexpr std::chrono::seconds kLongestRun{30};
+constexpr std::chrono::seconds kLongestRun{10};
 
 /// Ends an agent that hangs, so that its client sees the end of the stream.
 class Watchdog {
@@ -54,6 +59,25 @@ class Watchdog {
   std::thread _thread;  // last: uses all others
 };
 
+/// What the process has there has a name on a disk.
+bool isFile(pid_t process, int descriptor) {
+  const std::string place = "/proc/" + std::to_string(process) + "/fd/" + std::to_string(descriptor);
+  std::error_code error;
+  return std::filesystem::read_symlink(place, error).string().starts_with('/');
+}
+
+/// A short text in the memory of the process.
+std::string textOf(pid_t process, std::uint64_t address) {
+  std::string text;
+  char character = 1;
+  iovec here{&character, 1};
+  for (; text.size() < 4096; text += character) {
+    iovec there{reinterpret_cast<void*>(address + text.size()), 1};
+    if (::process_vm_readv(process, &here, 1, &there, 1, 0) != 1 || character == 0) break;
+  }
+  return text;
+}
+
 class Trial {
  public:
   Trial(const Scenario& scenario, const TrialPoint& point) : _scenario(scenario), _point(point) {}
@@ -78,13 +102,20 @@ class Trial {
   }
 
  private:
-  Judgement _judge(std::uint64_t number, const WatchedCall& call, const seccomp_data& data) {
+  /// On the supervisor's thread.
+  Judgement _judge(pid_t process, const WatchedCall& call, const seccomp_data& data) {
     using Kind = Judgement::Kind;
     if (_point.harm == Harm::tear) {
       if (!call.writes || data.args[2] < 2) return {};
-      number = ++_writes;
+    } else if (_point.harm == Harm::fault && call.ofFilesOnly &&
+               !isFile(process, static_cast<int>(data.args[0]))) {
+      return {};
     }
-    if (number != _point.number) return {};
+    if (_point.harm == Harm::fault && !_isConfigured(process, call, data)) return {};
+    // Only what is added can be too much.
+    if (_point.harm == Harm::fault && call.number == SYS_epoll_ctl && data.args[1] != EPOLL_CTL_ADD)
+      return {};
+    if (++_counted != _point.number) return {};
     _result.isReached = true;
     _result.call = call.name;
     _result.errors = call.errors.size();
@@ -95,10 +126,18 @@ class Trial {
     return {.kind = Kind::fails, .error = call.errors[_point.error]};
   }
 
+  /// Faults begin when the configuration has been read: without it the agent would work elsewhere.
+  bool _isConfigured(pid_t process, const WatchedCall& call, const seccomp_data& data) {
+    if (_seenConfiguration && std::string_view(call.name) == "openat") _hasConfiguration = true;
+    if (!_hasConfiguration && std::string_view(call.name) == "openat")
+      _seenConfiguration |= textOf(process, data.args[1]).ends_with("/lirra.toml");
+    return _hasConfiguration;
+  }
+
   void _harm() {
     SupervisedAgent agent(_sandbox, _point.harm == Harm::fault ? callsThatMayFail() : callsThatChange(),
-                          [this](std::uint64_t number, const WatchedCall& call, const seccomp_data& data) {
-                            return _judge(number, call, data);
+                          [this](pid_t process, const WatchedCall& call, const seccomp_data& data) {
+                            return _judge(process, call, data);
                           });
     const Watchdog watchdog(agent);
     PlayedClient client(_sandbox.socketPath(), [&] { return agent.hasEnded(); });
@@ -149,7 +188,8 @@ class Trial {
   AgentSandbox _sandbox;
   Told _told;
   TrialResult _result;
-  std::uint64_t _writes = 0;  // on the supervisor's thread
+  bool _seenConfiguration = false, _hasConfiguration = false;
+  std::uint64_t _counted = 0;  // on the supervisor's thread
 };
 
 }  // namespace

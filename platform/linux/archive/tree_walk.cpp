@@ -5,6 +5,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <array>
 #include <cerrno>
 #include <climits>
 #include <filesystem>
@@ -21,6 +22,12 @@ namespace {
 
 constexpr int kOpenDirectory = O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC;
 constexpr int kOpenFile = O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_NOCTTY | O_CLOEXEC;
+
+/// Not that the file is closed to us, is gone, or has become something else.
+bool isTrouble(const std::error_code& error) {
+  constexpr std::array kExpected = {EACCES, EPERM, ENOENT, ENOTDIR, ELOOP, ENXIO};
+  return std::find(kExpected.begin(), kExpected.end(), error.value()) == kExpected.end();
+}
 
 const char* kindOf(mode_t mode) {
   if (S_ISFIFO(mode)) return "a pipe";
@@ -114,7 +121,7 @@ FoundEntry TreeWalk::_enter(Descriptor opened, const std::string& path, const st
   return found;
 }
 
-std::vector<std::string> TreeWalk::_list(int directory, const std::string& path) const {
+std::vector<std::string> TreeWalk::_list(int directory, const std::string& path) {
   std::vector<std::string> names;
   Descriptor again(::openat(directory, ".", kOpenDirectory));
   const std::unique_ptr<DIR, int (*)(DIR*)> listing(again.isOpen() ? ::fdopendir(again.get()) : nullptr,
@@ -137,12 +144,13 @@ void TreeWalk::_leaveOut(const std::string& path, const std::string& reason) con
   _leftOut('"' + path + "\" is left out of the archive: " + reason);
 }
 
-void TreeWalk::_leaveOutForError(const std::string& path) const {
+void TreeWalk::_leaveOutForError(const std::string& path) {
   const std::error_code error = lastSystemError();
   for (const auto ours : {std::errc::too_many_files_open, std::errc::too_many_files_open_in_system,
                           std::errc::not_enough_memory}) {
     if (error == ours) throw std::system_error(error);
   }
+  _hasMissed = _hasMissed || isTrouble(error);
   _leaveOut(path, error.message());
 }
 

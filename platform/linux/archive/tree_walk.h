@@ -34,6 +34,8 @@ class TreeWalk {
   /// The next one, nothing at the end. Throws std::system_error when this process, not the file, is at
   /// fault: without descriptors or memory nothing can be said about what is there.
   [[nodiscard]] std::optional<FoundEntry> next();
+  /// Whether something was left out though it was there to be read: the disk, or what lies between, failed.
+  [[nodiscard]] bool hasMissed() const { return _hasMissed; }
 
  private:
   struct Directory {
@@ -45,13 +47,14 @@ class TreeWalk {
   };
   [[nodiscard]] std::optional<FoundEntry> _look(const Directory& directory, std::size_t index);
   [[nodiscard]] FoundEntry _enter(Descriptor opened, const std::string& path, const std::string& entryPath);
-  [[nodiscard]] std::vector<std::string> _list(int directory, const std::string& path) const;
+  [[nodiscard]] std::vector<std::string> _list(int directory, const std::string& path);
   void _leaveOut(const std::string& path, const std::string& reason) const;
-  void _leaveOutForError(const std::string& path) const;
+  void _leaveOutForError(const std::string& path);
 
   const Line _leftOut, _renamed;
   std::vector<Directory> _open;  // from the outermost to the one being read
   std::optional<FoundEntry> _first;
+  bool _hasMissed = false;
 };
 
 }  // namespace zal

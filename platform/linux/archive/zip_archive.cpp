@@ -60,6 +60,9 @@ class ArchiveWriter {
     if (_ending.text && _content.remarks.size() < kMostRemarks) _content.remarks.push_back(line);
   }
 
+  /// Whether a file could not be read to its end, other than because it became shorter.
+  [[nodiscard]] bool hasMissed() const { return _hasMissed; }
+
   std::uint64_t write(TreeWalk& walk) {
     while (std::optional<FoundEntry> found = walk.next()) {
       while (_waiting.size() >= kMostWaiting) _writeOldest();
@@ -151,6 +154,7 @@ class ArchiveWriter {
   }
 
   void _writeChunk(const Waiting& waiting, const ChunkResult& result) {
+    if (result.error) _hasMissed = true;
     if (result.error && result.read == 0 && !_current.begun) {
       remark('"' + waiting.path + "\" is left out of the archive: " + result.error.message());
       _current.ended = true;
@@ -220,6 +224,7 @@ class ArchiveWriter {
   Sha256 _hash;
   ZipContainer _container;
   CompressionTrial _trial;
+  bool _hasMissed = false;
   std::deque<Waiting> _waiting;
   struct {
     std::uint64_t chunk = 0, size = 0;
@@ -252,6 +257,7 @@ ArchiveOutcome writeZipArchive(const std::string& directory, const std::string& 
     for (const std::string& text : early) archive.remark(text);
     writer = &archive;
     outcome.entries = archive.write(walk);
+    outcome.hasMissed = walk.hasMissed() || archive.hasMissed();
     file.sync();
     if (file.error()) throw std::system_error(file.error());
     // The archive's name as well; some file systems refuse, and it is there all the same.

@@ -14,6 +14,7 @@ struct ArchiveOutcome {
   std::string failure;  ///< empty: it is there, synced
   bool outputIsOurs = false;
   std::uint64_t entries = 0;
+  bool hasMissed = false;  ///< something could not be read that perhaps can be, another time
 };
 
 /// Writes the directory into a new zip archive at `output` and syncs it. `line` gets a line for

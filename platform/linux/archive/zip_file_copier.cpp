@@ -49,6 +49,8 @@ class ZipJob : public FileCopierJob, public std::enable_shared_from_this<ZipJob>
   void _check() {
     const std::string wrong = checkZipArchive(_description.output, _outcome.entries);
     if (!wrong.empty()) return _fail("the archive does not hold what was written: " + wrong);
+    // Who asked deletes what is archived.
+    if (_outcome.hasMissed) _setAside("has more than could be read for its archive");
     _complete();
   }
 
@@ -60,11 +62,17 @@ class ZipJob : public FileCopierJob, public std::enable_shared_from_this<ZipJob>
       _log.notice("There is no \"" + input + "\" to archive");
       return _complete();
     }
+    _setAside("could not be archived (" + reason + ")");
+    _complete();
+  }
+
+  void _setAside(const std::string& why) {
+    const std::string& input = _description.input;
+    std::error_code error;
     const std::string aside = keepAside(input, error);
-    _log.warning('"' + input + "\" could not be archived (" + reason + "); " +
+    _log.warning('"' + input + "\" " + why + "; " +
                  (error ? "it stays where it is, as it cannot be moved aside: " + error.message()
                         : "it is kept as \"" + aside + '"'));
-    _complete();
   }
 
   void _complete() {

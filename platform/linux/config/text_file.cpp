@@ -48,7 +48,10 @@ std::error_code writeAndSync(int descriptor, std::string_view content) {
 
 std::error_code readTextFile(const std::string& path, std::string& content, std::size_t mostBytes) {
   content.clear();
-  const int descriptor = ::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY);
+  int descriptor = -1;
+  do {
+    descriptor = ::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY);
+  } while (descriptor < 0 && errno == EINTR);
   if (descriptor < 0) return lastSystemError();
   const std::error_code error = readOpenFile(descriptor, content, mostBytes);
   ::close(descriptor);

@@ -2,6 +2,7 @@
 
 #include <cerrno>
 #include <system_error>
+#include <utility>
 
 #include <toml++/toml.h>
 
@@ -48,14 +49,18 @@ TomlPreferenceStore::Domain& TomlPreferenceStore::_synchronized(std::string_view
   const std::string path = filePath(_directory, name);
   const FileSignature signature = FileSignature::of(path);
   if (signature == domain.signature) return domain;
-  domain.signature = signature;
-  domain.switches.clear();
-  if (signature.error == ENOENT) return domain;
   std::string text;
-  if (const std::error_code error = readTextFile(path, text)) {
-    _log.warning(path + ":1: cannot be read: " + error.message());
-    return domain;
+  if (signature.error != ENOENT) {
+    if (const std::error_code error = readTextFile(path, text)) {
+      // Perhaps next time. A moment without descriptors must not switch off what is on.
+      if (std::exchange(domain.trouble, error) != error)
+        _log.warning(path + ":1: cannot be read: " + error.message());
+      return domain;
+    }
   }
+  domain.signature = signature;
+  domain.trouble.clear();
+  domain.switches.clear();
   try {
     domain.switches = switchesOf(toml::parse(text, path));
   } catch (const toml::parse_error& error) {

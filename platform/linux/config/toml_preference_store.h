@@ -33,6 +33,7 @@ class TomlPreferenceStore : public PreferenceStore {
  private:
   struct Domain {
     FileSignature signature;
+    std::error_code trouble;  ///< why it could not be read the last time
     std::map<std::string, bool, std::less<>> switches;
   };
   Domain& _synchronized(std::string_view domain);

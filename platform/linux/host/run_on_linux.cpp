@@ -1,6 +1,7 @@
 #include "platform/linux/host/run_on_linux.h"
 
 #include <cstdio>
+#include <exception>
 #include <string>
 #include <vector>
 
@@ -10,6 +11,7 @@
 namespace zal {
 namespace {
 
+constexpr int kCannotStart = 1;
 constexpr int kWrongCommandLine = 2;
 
 void overrideVariable(HostEnvironment& environment, const char* name,
@@ -36,11 +38,17 @@ int runOnLinux(int argc, char** argv, int (*agent)(Platform& platform)) {
   HostEnvironment environment = HostEnvironment::ofThisProcess();
   overrideVariable(environment, "LIRRA_CONFIG", line.configFile);
   overrideVariable(environment, "LIRRA_SOCKET", line.socketPath);
-  LinuxPlatform platform(environment);
-  const int status = agent(platform.services());
-  // Not by returning: jobs of other threads may be in the middle of using what would go.
-  platform.services().processExit.exit(status);
-  return status;
+  try {
+    LinuxPlatform platform(environment);
+    const int status = agent(platform.services());
+    // Not by returning: jobs of other threads may be in the middle of using what would go.
+    platform.services().processExit.exit(status);
+    return status;
+  } catch (const std::exception& exception) {
+    // The host has no descriptors or no memory for it. The service manager may try again.
+    std::fprintf(stderr, "zalloggingagent: cannot start: %s\n", exception.what());
+    return kCannotStart;
+  }
 }
 
 }  // namespace zal

@@ -223,7 +223,10 @@ void UnixPeerConnection::_sendBacklog() {
     } else if (isRetryLater(errno)) {
       return _awaitOutput();
     } else if (errno != EINTR) {
-      break;  // the peer is gone; reading will find what it still sent, and then the end
+      // The peer is gone; reading will find what it still sent, and then the end. Or the kernel has no room
+      // for an answer: the peer sees the end instead of waiting for it.
+      ::shutdown(_socket->native_handle(), SHUT_WR);
+      break;
     }
   }
   std::string().swap(_backlog);

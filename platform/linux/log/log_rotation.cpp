@@ -10,6 +10,7 @@
 #include <map>
 #include <optional>
 
+#include "platform/linux/files/rename_no_replace.h"
 #include "platform/linux/files/system_error.h"
 #include "platform/linux/log/rotation_names.h"
 #include "platform/linux/log/zip_file.h"
@@ -108,10 +109,9 @@ class Rotation {
   std::error_code _shiftGenerations() const {
     int freePlace = 1;
     std::error_code error;
-    while (freePlace < kGenerations &&
-           std::filesystem::exists(_path(generationName(_name, freePlace)), error)) {
+    while (freePlace < kGenerations && nameIsTaken(_path(generationName(_name, freePlace)), error))
       ++freePlace;
-    }
+    if (error) return error;  // what cannot be seen may be there, and would be overwritten
     for (int place = freePlace; place > 1; --place) {
       const std::string from = _path(generationName(_name, place - 1));
       if (const auto failure = renameFile(from, _path(generationName(_name, place)))) return failure;

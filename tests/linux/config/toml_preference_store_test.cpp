@@ -2,6 +2,7 @@
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <sys/resource.h>
 
 #include "tests/support/fake_services.h"
 #include "tests/support/temporary_directory.h"
@@ -89,6 +90,22 @@ TEST_F(TomlPreferenceStoreTest, WhatIsNoFileWarnsOnce) {
   EXPECT_EQ(freshly("CallLogging"), std::nullopt);
   EXPECT_EQ(freshly("CallLogging"), std::nullopt);
   EXPECT_THAT(log.lines, ElementsAre("warning: " + file + ":1: cannot be read: Is a directory"));
+}
+
+TEST_F(TomlPreferenceStoreTest, WhatCannotBeReadForAMomentStaysAsItWasAndIsReadTheNextTime) {
+  write("CallLogging = true\n");
+  EXPECT_EQ(freshly("CallLogging"), true);
+  write("CallLogging = true\nConsoleOutput = true\n");
+  rlimit before{};
+  ASSERT_EQ(::getrlimit(RLIMIT_NOFILE, &before), 0);
+  const rlimit none{0, before.rlim_max};
+  ASSERT_EQ(::setrlimit(RLIMIT_NOFILE, &none), 0);
+  const auto meanwhile = freshly("CallLogging");
+  EXPECT_EQ(freshly("ConsoleOutput"), std::nullopt);
+  ASSERT_EQ(::setrlimit(RLIMIT_NOFILE, &before), 0);
+  EXPECT_EQ(meanwhile, true);
+  EXPECT_THAT(log.lines, ElementsAre("warning: " + file + ":1: cannot be read: Too many open files"));
+  EXPECT_EQ(freshly("ConsoleOutput"), true);
 }
 
 TEST_F(TomlPreferenceStoreTest, SettingMakesFileAndDirectory) {
