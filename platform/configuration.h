@@ -56,6 +56,13 @@ struct MemorySettings {
   std::uint64_t total = 256ULL << 20U;
 };
 
+/// `[disk]`: how much of it the agent keeps for later.
+struct DiskSettings {
+  std::uint64_t size = 0;       ///< bytes at most; 0: the share decides
+  std::uint32_t share = 10;     ///< percent of the file system at most; 0: no limit by size
+  std::uint32_t keepFree = 15;  ///< percent of the file system that stay free; 0: it may fill up
+};
+
 /// `[log]`
 struct LogSettings {
   std::vector<std::string> categories;       ///< switched on; LIRRA_LOG_CATEGORIES adds to them
@@ -108,6 +115,7 @@ struct Configuration {
   BusSettings bus;
   BlackBoxSettings blackBox;
   MemorySettings memory;
+  DiskSettings disk;
   LogSettings log;
   CommandSettings commands;
   CollectionSettings collection;
