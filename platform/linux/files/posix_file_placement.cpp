@@ -56,13 +56,7 @@ PosixFilePlacement::PosixFilePlacement(std::string homeDirectory, std::string te
     : _home(std::move(homeDirectory)), _temporaryArea(std::move(temporaryArea)) {}
 
 std::string PosixFilePlacement::randomTemporaryPath(std::string_view suffix) {
-  std::string area = _temporaryArea;
-  if (!ensurePrivateDirectory(area)) {
-    area += '-' + randomName();
-    // Nobody could know the name to stand in its way; a full disk shows when the path is used.
-    [[maybe_unused]] const bool made = ensurePrivateDirectory(area);
-  }
-  return area + '/' + randomName() + std::string(suffix);
+  return _temporaryArea.path() + '/' + randomName() + std::string(suffix);
 }
 
 std::optional<std::string> PosixFilePlacement::uniqueSavePath(const std::string& path) {

@@ -3,6 +3,7 @@
 #include <string>
 
 #include "platform/file_placement.h"
+#include "platform/linux/files/temporary_area.h"
 
 namespace zal {
 
@@ -19,8 +20,7 @@ class PosixFilePlacement : public FilePlacement {
   PosixFilePlacement(std::string homeDirectory, std::string temporaryArea);
 
   [[nodiscard]] std::string homeDirectory() const override { return _home; }
-  /// When the area cannot be had for this user alone, the path lies in a fresh private directory
-  /// beside it; when that fails too, the path is given all the same and using it fails.
+  /// In TemporaryArea::path().
   [[nodiscard]] std::string randomTemporaryPath(std::string_view suffix) override;
   /// Tries 10,000 names.
   [[nodiscard]] std::optional<std::string> uniqueSavePath(const std::string& path) override;
@@ -31,7 +31,7 @@ class PosixFilePlacement : public FilePlacement {
 
  private:
   const std::string _home;
-  const std::string _temporaryArea;
+  TemporaryArea _temporaryArea;
 };
 
 }  // namespace zal

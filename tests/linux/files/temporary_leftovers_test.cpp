@@ -1,15 +1,13 @@
 #include "platform/linux/files/temporary_leftovers.h"
 
-#include <fcntl.h>
 #include <gtest/gtest.h>
-#include <sys/file.h>
 #include <unistd.h>
 
 #include <chrono>
 #include <filesystem>
 #include <string>
 
-#include "platform/linux/files/descriptor.h"
+#include "platform/linux/files/temporary_area.h"
 #include "tests/support/fake_services.h"
 #include "tests/support/manual_run_loop.h"
 #include "tests/support/manual_work_queues.h"
@@ -24,93 +22,73 @@ using namespace std::chrono_literals;
 
 class TemporaryLeftoversTest : public ::testing::Test {
  protected:
-  TemporaryLeftoversTest() { fs::create_directory(area); }
-  /// Makes an entry last changed that long before now.
-  void put(const std::string& name, std::chrono::microseconds age) {
-    writeFile(area + "/" + name, "content");
-    setAge(name, age);
-  }
-  void setAge(const std::string& name, std::chrono::microseconds age) {
-    const auto moment = (now - age).time_since_epoch();
-    const auto seconds = std::chrono::floor<std::chrono::seconds>(moment);
-    setTime(area + "/" + name, seconds.count(), std::chrono::nanoseconds(moment - seconds).count());
-  }
+  void leave(const std::string& file) { writeFile(area + file, "content"); }
+
   TemporaryDirectory directory;
   const std::string area = directory / "area";
   const WallTime now{1714651387251ms};
-  const WallTime started = now - 30h;
+  const std::string beside = "-0123456789abcdef0123456789abcdef";
 };
 
-TEST_F(TemporaryLeftoversTest, OnlyEntriesOlderThanADayGo) {
-  put("older.zip", 24h + 1us);
-  put("a day old.zip", 24h);
-  put("fresh.zip", 1s);
-  put("from the future.zip", -24h * 365);
-  EXPECT_EQ(removeTemporaryLeftovers(area, now, started), 1U);
-  EXPECT_EQ(listTree(area), "a day old.zip\nfresh.zip\nfrom the future.zip\n");
+TEST_F(TemporaryLeftoversTest, AllThatNobodyHoldsGoesOfTheAreaAndOfThoseBesideItHoweverFresh) {
+  leave("/half.zip");
+  leave("/tree/deep/file");
+  leave(beside + "/half.zip");
+  writeFile(directory / "area-of another", "content");
+  EXPECT_EQ(removeTemporaryLeftovers(area, now), 3U);
+  EXPECT_EQ(listTree(directory.path()), "area-of another\n");
 }
 
-TEST_F(TemporaryLeftoversTest, OfThisDayAFileGoesThatAnEarlierRunDidNotFinishAndNobodyWrites) {
-  for (const char* name : {"unfinished.zip", "written.zip", "kept.zip", "of this run.zip"}) put(name, 1h);
-  fs::permissions(area + "/kept.zip", fs::perms::owner_read);
-  setAge("of this run.zip", 59min);
-  const Descriptor writer(::open((area + "/written.zip").c_str(), O_RDONLY | O_CLOEXEC));
-  ASSERT_EQ(::flock(writer.get(), LOCK_EX), 0);
-  EXPECT_EQ(removeTemporaryLeftovers(area, now, now - 59min), 1U);
-  EXPECT_EQ(listTree(area), "kept.zip\nof this run.zip\nwritten.zip\n");
+TEST_F(TemporaryLeftoversTest, WhatALivingProcessHoldsStays) {
+  TemporaryArea held(area);
+  ASSERT_EQ(held.path(), area);
+  leave("/half.zip");
+  leave(beside + "/half.zip");
+  EXPECT_EQ(removeTemporaryLeftovers(area, now), 1U);
+  EXPECT_EQ(listTree(directory.path()), "area/\narea/half.zip\n");
 }
 
-TEST_F(TemporaryLeftoversTest, DirectoriesGoWithAllBelowThemByTheirOwnAge) {
-  put("old/deep/file", 1h);
-  put("fresh/deep/file", 48h);
-  setAge("old", 48h);
-  EXPECT_EQ(removeTemporaryLeftovers(area, now, started), 1U);
-  EXPECT_EQ(listTree(area), "fresh/\nfresh/deep/\nfresh/deep/file\n");
+TEST_F(TemporaryLeftoversTest, AnArchiveThatIsToBeKeptStaysForADay) {
+  leave("/half.zip");
+  leave("/kept.zip");
+  leave("/forgotten.zip");
+  for (const char* name : {"/kept.zip", "/forgotten.zip"}) fs::permissions(area + name, fs::perms::owner_read);
+  setTime(area + "/kept.zip", 1714651388 - 86'400, 0);
+  setTime(area + "/forgotten.zip", 1714651386 - 86'400, 0);
+  EXPECT_EQ(removeTemporaryLeftovers(area, now), 2U);
+  EXPECT_EQ(listTree(directory.path()), "area/\narea/kept.zip\n");
 }
 
 TEST_F(TemporaryLeftoversTest, LinksGoAndWhatTheyLeadToStays) {
   writeFile(directory / "elsewhere/file", "content");
-  setTime(directory / "elsewhere/file", 1, 0);
-  setTime(directory / "elsewhere", 1, 0);
+  leave("/tree/file");
   fs::create_directory_symlink(directory / "elsewhere", area + "/link");
-  setAge("link", 48h);
-  put("old/file", 48h);
-  fs::create_directory_symlink(directory / "elsewhere", area + "/old/link");
-  setAge("old", 48h);
-  EXPECT_EQ(removeTemporaryLeftovers(area, now, started), 2U);
-  EXPECT_EQ(listTree(directory.path()), "area/\nelsewhere/\nelsewhere/file\n");
-}
-
-TEST_F(TemporaryLeftoversTest, AFreshLinkToSomethingOldStays) {
-  writeFile(directory / "elsewhere", "content");
-  setTime(directory / "elsewhere", 1, 0);
-  fs::create_symlink(directory / "elsewhere", area + "/link");
-  setAge("link", 1h);
-  EXPECT_EQ(removeTemporaryLeftovers(area, now, started), 0U);
+  fs::create_directory_symlink(directory / "elsewhere", area + "/tree/link");
+  EXPECT_EQ(removeTemporaryLeftovers(area, now), 2U);
+  EXPECT_EQ(listTree(directory.path()), "elsewhere/\nelsewhere/file\n");
 }
 
 TEST_F(TemporaryLeftoversTest, AnAreaThatIsALinkIsNotTouched) {
-  put("old", 48h);
+  leave("/left");
   fs::create_directory_symlink(area, directory / "prepared");
-  EXPECT_EQ(removeTemporaryLeftovers(directory / "prepared", now, started), 0U);
-  EXPECT_EQ(listTree(area), "old\n");
+  EXPECT_EQ(removeTemporaryLeftovers(directory / "prepared", now), 0U);
+  EXPECT_EQ(listTree(area), "left\n");
 }
 
 TEST_F(TemporaryLeftoversTest, AnAreaOfSomebodyElseIsNotTouched) {
-  put("old", 48h);
+  leave("/left");
   if (::chown(area.c_str(), 65534, 65534) != 0) GTEST_SKIP() << "only the superuser gives files away";
-  EXPECT_EQ(removeTemporaryLeftovers(area, now, started), 0U);
-  EXPECT_EQ(listTree(area), "old\n");
+  EXPECT_EQ(removeTemporaryLeftovers(area, now), 0U);
+  EXPECT_EQ(listTree(area), "left\n");
 }
 
 TEST_F(TemporaryLeftoversTest, AMissingAreaHasNoLeftoversAndIsNotMade) {
-  EXPECT_EQ(removeTemporaryLeftovers(directory / "missing", now, started), 0U);
+  EXPECT_EQ(removeTemporaryLeftovers(directory / "missing", now), 0U);
   EXPECT_FALSE(fs::exists(directory / "missing"));
 }
 
 class TemporaryLeftoversLaterTest : public TemporaryLeftoversTest {
  protected:
-  TemporaryLeftoversLaterTest() { loop.setWall(now); }
   void start(const std::string& place) {
     removeTemporaryLeftoversLater(queues.global(QueuePriority::background), loop, log, place);
   }
@@ -124,22 +102,21 @@ class TemporaryLeftoversLaterTest : public TemporaryLeftoversTest {
 };
 
 TEST_F(TemporaryLeftoversLaterTest, TheyGoOneSecondAfterTheStartInTheBackgroundWithOneLine) {
-  put("one", 48h);
-  put("two", 48h);
-  put("fresh", -1h);
+  leave("/one");
+  leave("/two");
   start(area);
   pass(999ms);
-  EXPECT_EQ(listTree(area), "fresh\none\ntwo\n");
+  EXPECT_EQ(listTree(area), "one\ntwo\n");
   loop.advance(1ms);
   EXPECT_EQ(queues.readyJobs("global.background"), 1U);
   queues.runAll();
-  EXPECT_EQ(listTree(area), "fresh\n");
+  EXPECT_FALSE(fs::exists(area));
   EXPECT_EQ(log.lines,
             std::vector<std::string>{"notice: Leftovers of earlier runs removed from " + area + ": 2"});
 }
 
 TEST_F(TemporaryLeftoversLaterTest, WithoutLeftoversThereIsNoLine) {
-  put("fresh", -1h);
+  fs::create_directory(area);
   start(area);
   pass(1s);
   EXPECT_TRUE(log.lines.empty());

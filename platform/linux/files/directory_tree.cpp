@@ -1,0 +1,80 @@
+#include "platform/linux/files/directory_tree.h"
+
+#include <dirent.h>
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <memory>
+
+#include "platform/linux/files/system_error.h"
+
+namespace zal {
+namespace {
+
+constexpr int kDeepest = 100;
+constexpr std::uint64_t kBlock = 512;  // of st_blocks, on every file system
+
+struct CloseDirectory {
+  void operator()(DIR* directory) const { ::closedir(directory); }
+};
+
+std::uint64_t bytesAt(int parent, const std::string& name, int levels) {
+  struct stat status {};
+  if (::fstatat(parent, name.c_str(), &status, AT_SYMLINK_NOFOLLOW) != 0) return 0;
+  std::uint64_t bytes = static_cast<std::uint64_t>(status.st_blocks) * kBlock;
+  if (!S_ISDIR(status.st_mode)) return bytes / std::max<std::uint64_t>(status.st_nlink, 1);
+  if (levels == 0) return bytes;
+  const Descriptor directory = openDirectoryAt(parent, name);
+  for (const std::string& below : namesAt(directory.get()))
+    bytes += bytesAt(directory.get(), below, levels - 1);
+  return bytes;
+}
+
+std::error_code removeAt(int parent, const std::string& name, int levels) {
+  if (::unlinkat(parent, name.c_str(), 0) == 0 || errno == ENOENT) return {};
+  std::error_code error = lastSystemError();
+  // Some kernels say EPERM and some EISDIR of a directory.
+  if (error != std::errc::is_a_directory && error != std::errc::operation_not_permitted) return error;
+  const Descriptor directory = openDirectoryAt(parent, name);
+  if (!directory.isOpen()) return errno == ENOTDIR ? error : lastSystemError();
+  if (levels == 0) return std::make_error_code(std::errc::filename_too_long);
+  error.clear();
+  for (const std::string& below : namesAt(directory.get())) {
+    const std::error_code trouble = removeAt(directory.get(), below, levels - 1);
+    if (!error) error = trouble;
+  }
+  if (::unlinkat(parent, name.c_str(), AT_REMOVEDIR) != 0 && errno != ENOENT && !error) {
+    error = lastSystemError();
+  }
+  return error;
+}
+
+}  // namespace
+
+Descriptor openDirectoryAt(int parent, const std::string& name) {
+  return Descriptor(::openat(parent, name.c_str(), O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC));
+}
+
+std::vector<std::string> namesAt(int directory) {
+  std::vector<std::string> names;
+  // A handle of its own: its place in the directory is not the caller's.
+  Descriptor own(::openat(directory, ".", O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+  if (!own.isOpen()) return names;
+  const std::unique_ptr<DIR, CloseDirectory> listing(::fdopendir(own.get()));
+  if (!listing) return names;
+  static_cast<void>(own.release());
+  while (const dirent* entry = ::readdir(listing.get())) {
+    std::string name = entry->d_name;
+    if (name != "." && name != "..") names.push_back(std::move(name));
+  }
+  std::sort(names.begin(), names.end());
+  return names;
+}
+
+std::uint64_t diskBytesAt(int parent, const std::string& name) { return bytesAt(parent, name, kDeepest); }
+
+std::error_code removeTreeAt(int parent, const std::string& name) { return removeAt(parent, name, kDeepest); }
+
+}  // namespace zal
