@@ -5,8 +5,8 @@
 
 #include "cli/delivery.h"
 #include "cli/printable_text.h"
-#include "cli/table_text.h"
 #include "platform/json_text.h"
+#include "platform/size_text.h"
 
 namespace zal {
 namespace {

@@ -4,6 +4,7 @@
 
 #include "cli/printable_text.h"
 #include "cli/table_text.h"
+#include "platform/size_text.h"
 #include "platform/utf8_walk.h"
 
 namespace zal {

@@ -8,6 +8,7 @@
 #include "cli/table_text.h"
 #include "cli/tool_context.h"
 #include "platform/json_text.h"
+#include "platform/size_text.h"
 
 namespace zal {
 namespace {

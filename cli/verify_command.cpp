@@ -5,9 +5,9 @@
 
 #include "cli/archive_verdict.h"
 #include "cli/printable_text.h"
-#include "cli/table_text.h"
 #include "cli/tool_context.h"
 #include "platform/json_text.h"
+#include "platform/size_text.h"
 
 namespace zal {
 namespace {

@@ -10,6 +10,7 @@
 
 #include "collectors/collectors.h"
 #include "dump/archive_gaps.h"
+#include "dump/disk_budget_keeper.h"
 #include "dump/latest_link.h"
 #include "dump/log_compressor.h"
 #include "dump/manifest.h"
@@ -27,8 +28,12 @@ struct Step {
   CollectionFlags anyOf;
   std::string_view name;
   void (*run)(const Services& services, const ClosingWork& work);
+  bool isBig = false;
 
-  [[nodiscard]] bool isWanted(CollectionFlags flags) const { return anyOf == 0 || (flags & anyOf) != 0; }
+  [[nodiscard]] bool isAskedFor(CollectionFlags flags) const { return anyOf == 0 || (flags & anyOf) != 0; }
+  [[nodiscard]] bool isWanted(CollectionFlags flags, bool savesRoom) const {
+    return isAskedFor(flags) && !(savesRoom && isBig);
+  }
 };
 
 void collectPushLogs(const Services& services, const ClosingWork& work) {
@@ -97,16 +102,16 @@ constexpr Step kFirstStage[] = {
     {kAlways, "Thermal log", linkThermalLog},
     {kCollectStackshot, "Stackshot", takeStackshot},
     {kCollectBaseband, "Baseband snapshot", takeBasebandSnapshot},
-    {kCollectSystemLogs, "System logs", collectSystemLogs},
+    {kCollectSystemLogs, "System logs", collectSystemLogs, true},
     {kAlways, "Crash logs", collectCrashLogs},
     // The step goes on until the second stage begins.
     {kAlways, "Waiting for slow writers", stopCaptures},
 };
 
 constexpr Step kSecondStage[] = {
-    {kCollectBaseband, "Baseband logs", collectBasebandLogs},
+    {kCollectBaseband, "Baseband logs", collectBasebandLogs, true},
     {kAlways, "Snapshots", collectSnapshotLogs},
-    {kAnyNetwork, "Packet captures", linkFullPacketCapture},
+    {kAnyNetwork, "Packet captures", linkFullPacketCapture, true},
     // The step goes on until the archive is made.
     {kAlways, kArchiveStep, tellGaps},
 };
@@ -124,6 +129,7 @@ void finish(const Services& services, const ClosingWork& work, const std::string
   } else {
     work.record->failed("no archive was made; the log says why");
   }
+  if (services.disk != nullptr) services.disk->look();
   if (work.completion) work.completion();
 }
 
@@ -159,7 +165,7 @@ class ClosingRun : public std::enable_shared_from_this<ClosingRun> {
   template <std::size_t count>
   void _runSteps(const Step (&steps)[count]) {
     for (const Step& step : steps) {
-      if (!step.isWanted(_work.flags)) continue;
+      if (!step.isWanted(_work.flags, _work.savesRoom)) continue;
       _work.record->step(_nextStep++);
       step.run(_services, _work);
     }
@@ -264,6 +270,7 @@ void ClosingStages::finishCutOff() {
     ClosingWork work;
     work.service = dump.service;
     work.destination = dump.directory;
+    if (_services.disk != nullptr) work.held = _services.disk->hold(dump.directory);
     work.record = beginRecord(platform, _services.collectors.witnesses,
                               {.service = dump.service,
                                .directory = dump.directory,
@@ -279,11 +286,12 @@ void ClosingStages::finishCutOff() {
   }
 }
 
-std::vector<PlannedStep> ClosingStages::plan(CollectionFlags flags) {
+std::vector<PlannedStep> ClosingStages::plan(CollectionFlags flags, bool savesRoom) {
   std::vector<PlannedStep> planned;
   const auto add = [&](const auto& steps) {
     for (const Step& step : steps) {
-      planned.push_back({std::string(step.name), step.isWanted(flags), flagsNotSet(step.anyOf)});
+      planned.push_back({std::string(step.name), step.isWanted(flags, savesRoom),
+                         step.isAskedFor(flags) ? std::string(kOverBudget) : flagsNotSet(step.anyOf)});
     }
   };
   add(kFirstStage);

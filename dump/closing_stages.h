@@ -12,6 +12,7 @@
 namespace zal {
 
 class Collectors;
+class DiskBudgetKeeper;
 class _LirraLogCompressor;
 struct Platform;
 
@@ -28,6 +29,8 @@ struct ClosingWork {
   std::string pushLogs, networkStack, systemLogs, basebandLogs, snapshots, packetCaptures, power;
   std::optional<std::string> reason;
   CollectionFlags flags = 0;
+  bool savesRoom = false;                ///< the big steps are skipped
+  std::shared_ptr<void> held = nullptr;  ///< keeps destination and archive from being evicted
   WallTime startTime{};
   std::shared_ptr<CollectionRecord> record;  ///< never empty
   std::size_t firstStep = 1;                 ///< of these stages among the wanted ones
@@ -42,6 +45,7 @@ class ClosingStages {
     Platform& platform;
     Collectors& collectors;
     _LirraLogCompressor& compressor;
+    DiskBudgetKeeper* disk = nullptr;  ///< looks when an archive was made
   };
   explicit ClosingStages(const Services& services) : _services(services) {}
 
@@ -52,7 +56,7 @@ class ClosingStages {
   /// the start; the work itself goes on on the standard queue. Nobody is told, and the manifest says so.
   void finishCutOff();
   /// Their steps with these flags, those that are skipped too.
-  [[nodiscard]] static std::vector<PlannedStep> plan(CollectionFlags flags);
+  [[nodiscard]] static std::vector<PlannedStep> plan(CollectionFlags flags, bool savesRoom = false);
 
  private:
   Services _services;

@@ -18,8 +18,9 @@ Diagnostics::Diagnostics(Platform& platform, Collectors& collectors, const Sessi
                           .files = platform.files,
                           .queues = platform.queues},
       compressor(sharedCompressorOf(_compressorServices)),
-      closing({.platform = platform, .collectors = collectors, .compressor = compressor}),
-      collection({.platform = platform, .collectors = collectors, .closing = closing}),
+      disk(platform),
+      closing({.platform = platform, .collectors = collectors, .compressor = compressor, .disk = &disk}),
+      collection({.platform = platform, .collectors = collectors, .closing = closing, .disk = &disk}),
       logDump({.platform = platform,
                .collectors = collectors,
                .session = session,
@@ -32,6 +33,7 @@ Diagnostics::Diagnostics(Platform& platform, Collectors& collectors, const Sessi
                   .compressor = compressor,
                   .logDump = logDump}) {
   closing.finishCutOff();
+  disk.lookLater();
 }
 
 Diagnostics::~Diagnostics() { _LirraLogCompressor::lendServices(nullptr); }

@@ -2,6 +2,7 @@
 
 #include "dump/action_dispatcher.h"
 #include "dump/closing_stages.h"
+#include "dump/disk_budget_keeper.h"
 #include "dump/log_compressor.h"
 #include "dump/log_dump.h"
 #include "dump/service_collection.h"
@@ -22,6 +23,7 @@ class Diagnostics {
 
  public:
   _LirraLogCompressor& compressor;
+  DiskBudgetKeeper disk;
   ClosingStages closing;
   ServiceCollection collection;
   LogDump logDump;

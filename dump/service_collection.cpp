@@ -6,6 +6,7 @@
 #include "collectors/collectors.h"
 #include "collectors/directory_listing.h"
 #include "collectors/rotated_log_sets.h"
+#include "dump/disk_budget_keeper.h"
 #include "dump/planned_steps.h"
 #include "platform/open_directories.h"
 #include "platform/platform.h"
@@ -157,16 +158,24 @@ struct Step {
   CollectionFlags flag;
   std::string_view name;
   void (*run)(const Context& at);
+  bool isBig = false;  ///< what it takes lies on the disk already, and would be there once more
 
-  [[nodiscard]] bool isWanted(const CollectionRequest& request) const {
+  [[nodiscard]] bool isAskedFor(const CollectionRequest& request) const {
     return flag == 0 ? request.service == kVideoCalls : (request.flags & flag) != 0;
+  }
+  [[nodiscard]] bool isWanted(const CollectionRequest& request, bool savesRoom) const {
+    return isAskedFor(request) && !(savesRoom && isBig);
+  }
+  [[nodiscard]] std::string whyNot(const CollectionRequest& request) const {
+    if (isAskedFor(request)) return std::string(kOverBudget);
+    return flag == 0 ? "it belongs to video calls" : flagsNotSet(flag);
   }
 };
 
 constexpr Step kSteps[] = {
-    {kCollectMedia, "Media and radio logs", collectMedia},
+    {kCollectMedia, "Media and radio logs", collectMedia, true},
     {kCollectMedia, "Wi-Fi diagnostics", collectWifi},
-    {kCollectLocation, "Location", collectLocation},
+    {kCollectLocation, "Location", collectLocation, true},
     {kCollectCloudSync, "Cloud sync", collectCloudSync},
     {kCollectVideoCalls, "Video-call logs", collectVideoCalls},
     {kCollectProximity, "Proximity and Bluetooth", collectProximity},
@@ -189,13 +198,12 @@ void makeClosingDirectories(const Context& at) {
 
 }  // namespace
 
-std::vector<PlannedStep> ServiceCollection::plan(const CollectionRequest& request) {
+std::vector<PlannedStep> ServiceCollection::plan(const CollectionRequest& request, bool savesRoom) {
   std::vector<PlannedStep> planned;
   for (const Step& step : kSteps) {
-    planned.push_back({std::string(step.name), step.isWanted(request),
-                       step.flag == 0 ? "it belongs to video calls" : flagsNotSet(step.flag)});
+    planned.push_back({std::string(step.name), step.isWanted(request, savesRoom), step.whyNot(request)});
   }
-  for (PlannedStep& step : ClosingStages::plan(request.flags)) planned.push_back(std::move(step));
+  for (PlannedStep& step : ClosingStages::plan(request.flags, savesRoom)) planned.push_back(std::move(step));
   return planned;
 }
 
@@ -205,16 +213,22 @@ void ServiceCollection::CollectServiceLogs(const CollectionRequest& request,
   const WallTime startTime = platform.clock.wallNow();
   platform.agentLog.notice("Copying logs for service " + printable(request.service) + " into path " +
                            request.destination);
+  DiskBudgetKeeper* const disk = _services.disk;
+  const bool savesRoom = disk != nullptr && !disk->admits(request.service);
+  if (savesRoom) {
+    platform.agentLog.notice("The disk has no room for the big logs of service " +
+                             printable(request.service));
+  }
   const auto record = beginRecord(platform, _services.collectors.witnesses,
                                   {.service = request.service,
                                    .directory = request.destination,
                                    .flags = request.flags,
-                                   .steps = plan(request)});
+                                   .steps = plan(request, savesRoom)});
   const Context at{platform, _services.collectors, request,
                    *record,  _services.wait,       [this] { _dumpCoexistence(); }};
   std::size_t number = 0;
   for (const Step& step : kSteps) {
-    if (!step.isWanted(request)) continue;
+    if (!step.isWanted(request, savesRoom)) continue;
     record->step(++number);
     step.run(at);
   }
@@ -230,6 +244,8 @@ void ServiceCollection::CollectServiceLogs(const CollectionRequest& request,
                    .power = at.in("Power"),
                    .reason = request.reason,
                    .flags = request.flags,
+                   .savesRoom = savesRoom,
+                   .held = disk != nullptr ? disk->hold(request.destination) : nullptr,
                    .startTime = startTime,
                    .record = record,
                    .firstStep = number + 1,

@@ -11,6 +11,7 @@
 namespace zal {
 
 class Collectors;
+class DiskBudgetKeeper;
 struct Platform;
 
 /// Gathers into one directory the logs that belong to one service, step by step as the flags say,
@@ -22,6 +23,7 @@ class ServiceCollection {
     Collectors& collectors;
     ClosingStages& closing;
     SignalWait wait = waitInSteadyTime;
+    DiskBudgetKeeper* disk = nullptr;  ///< says whether there is room for the big steps
   };
   explicit ServiceCollection(const Services& services) : _services(services) {}
 
@@ -30,8 +32,10 @@ class ServiceCollection {
   /// Whether the destination may be written to is the caller's affair.
   void CollectServiceLogs(const CollectionRequest& request, std::function<void()> completion = {});
 
-  /// All steps of such a request, the closing ones and those that are skipped too.
-  [[nodiscard]] static std::vector<PlannedStep> plan(const CollectionRequest& request);
+  /// All steps of such a request, the closing ones and those that are skipped too: the big ones, to save
+  /// room, where they are asked for.
+  [[nodiscard]] static std::vector<PlannedStep> plan(const CollectionRequest& request,
+                                                     bool savesRoom = false);
 
  private:
   void _dumpCoexistence();

@@ -164,12 +164,9 @@ bool hasRoomFor(std::uint64_t bytes, const DiskLimits& limits, const DiskRoom& r
   return room.total == 0 || plus(room.free, use.mayGoHere) >= plus(limits.keepFree, bytes);
 }
 
-std::uint64_t expectedDump(const std::vector<KeptItem>& items, std::string_view type) {
-  std::uint64_t largest = 0;
-  for (const KeptItem& item : items) {
-    if (item.kind != KeptKind::stub && item.type == type) largest = std::max(largest, item.bytes);
-  }
-  return largest > 0 ? plus(largest, largest) : kUnknownDump;
+std::uint64_t expectedDump(std::uint64_t largest, const DiskLimits& limits) {
+  if (largest > 0) return plus(largest, largest);
+  return limits.most ? std::min(kUnknownDump, *limits.most / 2) : kUnknownDump;
 }
 
 }  // namespace zal

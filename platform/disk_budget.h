@@ -20,7 +20,7 @@ namespace zal {
 inline constexpr std::chrono::hours kStubLife{365 * 24};
 /// A directory that changed so lately is still being written.
 inline constexpr std::chrono::minutes kSettlingTime{10};
-/// What a dump is expected to take when none like it is known.
+/// What a dump of a type that there was none of is expected to take.
 inline constexpr std::uint64_t kUnknownDump = 8ULL << 20U;
 
 struct DiskLimits {
@@ -64,8 +64,8 @@ struct DiskUse {
 /// Whether that many bytes more keep the limits once everything has gone that may go.
 [[nodiscard]] bool hasRoomFor(std::uint64_t bytes, const DiskLimits& limits, const DiskRoom& room,
                               const DiskUse& use);
-/// What a dump of the type is expected to take while it is made: twice the largest one of the type, for its
-/// directory and its archive.
-[[nodiscard]] std::uint64_t expectedDump(const std::vector<KeptItem>& items, std::string_view type);
+/// What a dump is expected to take while it is made, from the largest one of its type: twice that, for its
+/// directory and its archive. Of a type without any (0), kUnknownDump or half of all that may be kept.
+[[nodiscard]] std::uint64_t expectedDump(std::uint64_t largest, const DiskLimits& limits);
 
 }  // namespace zal

@@ -11,6 +11,7 @@
 #include "platform/file_placement.h"
 #include "platform/host_signals.h"
 #include "platform/ipc_listener.h"
+#include "platform/kept_store.h"
 #include "platform/local_notifications.h"
 #include "platform/log_facility.h"
 #include "platform/memory_ledger.h"
@@ -67,6 +68,7 @@ struct Platform {
   SessionRecords& sessionRecords;
   MemoryLedger& memory;
   SpillFiles& spillFiles;
+  KeptStore& keptStore;
 };
 
 }  // namespace zal

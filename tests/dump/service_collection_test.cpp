@@ -2,6 +2,7 @@
 
 #include <sys/stat.h>
 
+#include "dump/disk_budget_keeper.h"
 #include "dump/planned_steps.h"
 #include "tests/dump/collection_fixture.h"
 #include "tests/dump/prepared_host.h"
@@ -49,6 +50,25 @@ class ServiceCollectionTest : public testing::CollectionFixture {
                                   return signal.try_acquire();
                                 }}};
   int completions = 0;
+
+  /// A collection that minds the disk.
+  struct Budgeted {
+    explicit Budgeted(ServiceCollectionTest& test)
+        : disk(test.host.platform),
+          stages({.platform = test.host.platform,
+                  .collectors = test.collectors,
+                  .compressor = test.compressor,
+                  .disk = &disk}),
+          budgeted({.platform = test.host.platform,
+                    .collectors = test.collectors,
+                    .closing = stages,
+                    .wait = [](std::binary_semaphore& signal,
+                               std::chrono::seconds) { return signal.try_acquire(); },
+                    .disk = &disk}) {}
+    DiskBudgetKeeper disk;
+    ClosingStages stages;
+    ServiceCollection budgeted;
+  };
 };
 
 TEST_F(ServiceCollectionTest, FirstLineOfTheLogNamesTheServiceAndTheDirectory) {
@@ -355,6 +375,39 @@ TEST_F(ServiceCollectionTest, TwoCollectionsAtOnceEachEndInTheirOwnArchive) {
   EXPECT_EQ(completions, 2);
   EXPECT_TRUE(exists("dump.zip"));
   EXPECT_TRUE(exists("other.zip"));
+}
+
+TEST_F(ServiceCollectionTest, WithoutRoomOnTheDiskTheBigStepsAreSkippedAndTheManifestSaysWhy) {
+  host.keptStore.disk = {100U << 20U, 16U << 20U};
+  Budgeted sparing(*this);
+  put("Logs/RadioMarshal.log");
+  sparing.budgeted.CollectServiceLogs(request("Vistel", kEveryStep & ~kCollectNetwork), {});
+  advance(8s);
+  Lines skipped;
+  for (const PlannedStep& step : ServiceCollection::plan(request("Vistel", kEveryStep), true)) {
+    if (!step.isWanted && step.whyNot == "over budget") skipped.push_back(step.name);
+  }
+  EXPECT_EQ(skipped,
+            (Lines{"Media and radio logs", "Location", "System logs", "Baseband logs", "Packet captures"}));
+  for (const std::string& line : host.dumpProgress.lines) {
+    for (const std::string& step : skipped)
+      EXPECT_FALSE(line.starts_with("STEP") && line.ends_with(" " + step)) << line;
+  }
+  EXPECT_FALSE(exists("dump/RadioMarshal"));
+  EXPECT_TRUE(exists("dump/Registration"));
+  EXPECT_EQ(linesWith("no room"), Lines{"notice: The disk has no room for the big logs of service Vistel"});
+  const std::string manifest = host.fileCopier.endings.at(0);
+  EXPECT_NE(manifest.find(R"("Location", "state": "skipped", "why": ["over budget"])"), std::string::npos)
+      << manifest;
+}
+
+TEST_F(ServiceCollectionTest, TheBudgetIsLookedAtWhenTheArchiveIsMade) {
+  Budgeted collecting(*this);
+  collecting.budgeted.CollectServiceLogs(request("Quillet", 0), {});
+  advance(8s);
+  ASSERT_EQ(host.keptStore.looks, 0);
+  finishArchives();
+  EXPECT_EQ(host.keptStore.looks, 1);
 }
 
 }  // namespace

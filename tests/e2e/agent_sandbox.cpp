@@ -81,6 +81,7 @@ void AgentSandbox::writeConfiguration() const {
   };
   for (const auto& [key, value] : roots) text << key << " = '" << value << "'\n";
   text << "[log]\n" << logSettings;
+  text << "[disk]\n" << diskSettings;
   text << "[commands]\n" << commandSettings << "toolDirectory = '" << (_directory / "tools") << "'\n";
   text << "[device]\nSystemVersionFile = '" << (_directory / "config/version.plist") << "'\n" << settings;
   writeFile(configurationFile(), text.str());

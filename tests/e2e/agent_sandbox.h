@@ -33,6 +33,8 @@ class AgentSandbox {
   /// Lines of its section `[commands]`. Other log readers on this machine, and those of tests beside this
   /// one, are left alone.
   std::string commandSettings = "\"captures.stop\" = 'true'\n";
+  /// Lines of its section `[disk]`. How full this machine is, or how small a test's disk, is no matter here.
+  std::string diskSettings = "share = 0\nkeepFree = 0\n";
   /// Where the log and report roots lie; another directory when a test wants another file system.
   std::string stateRoot;
 

@@ -232,13 +232,10 @@ TEST_F(DiskBudgetTest, ThereIsRoomForADumpWhenWhatMayGoMakesIt) {
   EXPECT_TRUE(hasRoomFor(751, {}, {}, use));
 }
 
-TEST_F(DiskBudgetTest, ADumpIsExpectedToTakeTwiceTheLargestOfItsType) {
-  EXPECT_EQ(expectedDump(items, "Vistel"), 8'388'608U);
-  add("a", "Vistel", 100, 2);
-  add("b", "Vistel", 300, 1);
-  add("c", "Nexa", 900, 1);
-  add("stub", "Vistel", 901, 1).kind = KeptKind::stub;
-  EXPECT_EQ(expectedDump(items, "Vistel"), 600U);
+TEST(ExpectedDumpTest, ItIsTwiceTheLargestOfItsTypeAndSomeMebibytesWhereThereWasNone) {
+  EXPECT_EQ(expectedDump(300, {100, 0}), 600U);
+  EXPECT_EQ(expectedDump(0, {}), 8'388'608U);
+  EXPECT_EQ(expectedDump(0, {1000, 0}), 500U);
 }
 
 }  // namespace

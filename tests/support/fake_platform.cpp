@@ -54,7 +54,8 @@ Platform FakePlatform::with(PreferenceStore& store) {
           .dumpProgress = dumpProgress,
           .sessionRecords = sessionRecords,
           .memory = memory,
-          .spillFiles = spillFiles};
+          .spillFiles = spillFiles,
+          .keptStore = keptStore};
 }
 
 // The ends of all fakes, and with each what the compiler makes once for a class: test files that use
@@ -81,6 +82,7 @@ FakeRadioCoexistence::~FakeRadioCoexistence() = default;
 FakePropertyListWriter::~FakePropertyListWriter() = default;
 RecordingDumpProgress::~RecordingDumpProgress() = default;
 FakeSessionRecords::~FakeSessionRecords() = default;
+FakeKeptStore::~FakeKeptStore() = default;
 FakeMessage::~FakeMessage() = default;
 FakePeer::~FakePeer() = default;
 FakeIpcService::~FakeIpcService() = default;

@@ -5,6 +5,7 @@
 #include "platform/platform.h"
 #include "tests/support/fake_dump_services.h"
 #include "tests/support/fake_ipc.h"
+#include "tests/support/fake_kept_store.h"
 #include "tests/support/fake_services.h"
 #include "tests/support/fake_session_records.h"
 #include "tests/support/fake_spill_files.h"
@@ -62,6 +63,7 @@ class FakePlatform {
   FakeSessionRecords sessionRecords;
   MemoryLedger memory{configuration.memory};
   FakeSpillFiles spillFiles;
+  FakeKeptStore keptStore;
 
   Platform platform = with(preferences);
 

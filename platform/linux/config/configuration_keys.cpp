@@ -176,6 +176,8 @@ std::string takeDuration(const toml::node& value, const std::string& /*home*/, C
 
 constexpr std::int64_t kLargestBlock = 1LL << 30;
 constexpr std::int64_t kLargestMemory = 1LL << 40;
+constexpr std::int64_t kLargestSize = 1LL << 50;
+constexpr std::int64_t kWhole = 100;  // percent
 
 constexpr ConfigurationKey kKeys[] = {
     {"roots", "UserLogRoot", takeRoot<&DirectoryRoots::UserLogRoot>},
@@ -221,6 +223,9 @@ constexpr ConfigurationKey kKeys[] = {
     {"memory", "session", takeCount<&Configuration::memory, &MemorySettings::session, 65536, kLargestMemory>},
     {"memory", "peer", takeCount<&Configuration::memory, &MemorySettings::peer, 65536, kLargestMemory>},
     {"memory", "total", takeCount<&Configuration::memory, &MemorySettings::total, 65536, kLargestMemory>},
+    {"disk", "size", takeCount<&Configuration::disk, &DiskSettings::size, 0, kLargestSize>},
+    {"disk", "share", takeCount<&Configuration::disk, &DiskSettings::share, 0, kWhole>},
+    {"disk", "keepFree", takeCount<&Configuration::disk, &DiskSettings::keepFree, 0, kWhole>},
     {"log", "categories", takeCategories},
     {"log", "rotationSize", takeCount<&Configuration::log, &LogSettings::rotationSize, 1024, kLargestBlock>},
     {"log", "maximumOpenFiles", takeCount<&Configuration::log, &LogSettings::maximumOpenFiles, 1, 65536>},

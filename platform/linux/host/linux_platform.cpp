@@ -7,6 +7,7 @@
 #include "platform/linux/alerts/alert_file.h"
 #include "platform/linux/bus_module/bus_addresses.h"
 #include "platform/linux/config/host_paths.h"
+#include "platform/linux/disk/kept_places.h"
 #include "platform/linux/files/root_parents.h"
 #include "platform/linux/files/temporary_leftovers.h"
 #include "platform/linux/log/journal_stream.h"
@@ -15,12 +16,6 @@
 
 namespace zal {
 namespace {
-
-/// For one user alone; the number keeps users of one machine apart. On the file system that archives
-/// go to in the end: moving one there then needs no room that a full disk would not have.
-std::string temporaryArea(const DirectoryRoots& roots, const HostEnvironment& environment) {
-  return roots.DiagnosticReportRoot + "/.com.vendel.lirra-" + std::to_string(environment.userId);
-}
 
 bool speaksToJournal(const HostEnvironment& environment) {
   return isJournalStream(environment.variable("JOURNAL_STREAM"), STDERR_FILENO);
@@ -67,9 +62,9 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
             .memory = &_memory,
             .sharesPath = clientSharesPath(_loaded.configuration.roots.RuntimeRoot)}),
       // Before the log files: what it has to say is in them when the loop sleeps.
-      _sessionRecords(_mainLoop, _agentLog, _loaded.configuration.roots.StateRoot + "/BlackBox",
+      _sessionRecords(_mainLoop, _agentLog, blackBoxDirectory(_loaded.configuration.roots),
                       _loaded.configuration.blackBox),
-      _spillFiles(_loaded.configuration.roots.StateRoot + "/BlackBox"),
+      _spillFiles(blackBoxDirectory(_loaded.configuration.roots)),
       _logFiles({_clock, _mainLoop, _queues, _agentLog}, _loaded.configuration.roots.UserLogRoot,
                 _loaded.configuration.log),
       _logMirror(_logFiles, {_clock, _mainLoop, _agentLog}, _loaded.configuration.log.journalSocket),
@@ -81,7 +76,8 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
       _crashReporter(_mainLoop.context(), _agentLog,
                      {.helper = helperProgram(_loaded.configuration, "lirra-stackshot"),
                       .reportDirectory = _loaded.configuration.roots.DiagnosticReportRoot}),
-      _files(environment.homeDirectory, temporaryArea(_loaded.configuration.roots, environment)),
+      _files(environment.homeDirectory, temporaryArea(_loaded.configuration.roots, environment.userId)),
+      _keptStore(keptPlaces(_loaded.configuration.roots, environment.userId), _files),
       _shell(_agentLog),
       _queueingShell(_shell, _queues),
       _systemVersion(_loaded.configuration.systemVersionFile),
@@ -156,7 +152,8 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
                 .dumpProgress = _dumpProgress,
                 .sessionRecords = _sessionRecords,
                 .memory = _memory,
-                .spillFiles = _spillFiles} {
+                .spillFiles = _spillFiles,
+                .keptStore = _keptStore} {
   std::signal(SIGPIPE, SIG_IGN);
   if (_loaded.configuration.alerts.screen) _userAlerts.showOn(_screens);
   makeRootParents(_loaded.configuration.roots);
@@ -164,7 +161,7 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
   _agentLog.setLogFacility(speaksToJournal(environment) ? &_logFiles : &_logFacility);
   for (const std::string& warning : _loaded.warnings) _agentLog.warning(warning);
   removeTemporaryLeftoversLater(_queues.global(QueuePriority::background), _clock, _agentLog,
-                                temporaryArea(_loaded.configuration.roots, environment));
+                                temporaryArea(_loaded.configuration.roots, environment.userId));
 }
 
 void LinuxPlatform::_keepWhatCame() {

@@ -20,6 +20,7 @@
 #include "platform/linux/crash/linux_crash_reporter.h"
 #include "platform/linux/device_support/linux_device_support.h"
 #include "platform/linux/dialog/dialog_screen.h"
+#include "platform/linux/disk/file_kept_store.h"
 #include "platform/linux/files/posix_file_placement.h"
 #include "platform/linux/host/loop_host_signals.h"
 #include "platform/linux/host_identity/linux_device_registry.h"
@@ -80,6 +81,7 @@ class LinuxPlatform {
   LocalNotifications _localNotifications;
   LinuxCrashReporter _crashReporter;
   PosixFilePlacement _files;
+  FileKeptStore _keptStore;
   PosixShell _shell;
   QueueingShell _queueingShell;
   ProcfsProcessTable _processes;

@@ -52,7 +52,8 @@ TEST_F(TemporaryLeftoversTest, AnArchiveThatIsToBeKeptStaysForADay) {
   leave("/half.zip");
   leave("/kept.zip");
   leave("/forgotten.zip");
-  for (const char* name : {"/kept.zip", "/forgotten.zip"}) fs::permissions(area + name, fs::perms::owner_read);
+  for (const char* name : {"/kept.zip", "/forgotten.zip"})
+    fs::permissions(area + name, fs::perms::owner_read);
   setTime(area + "/kept.zip", 1714651388 - 86'400, 0);
   setTime(area + "/forgotten.zip", 1714651386 - 86'400, 0);
   EXPECT_EQ(removeTemporaryLeftovers(area, now), 2U);
