@@ -16,6 +16,8 @@ using Finding = ArchiveVerdict::Finding;
 
 constexpr std::string_view kManifest = "Manifest.json";
 constexpr std::size_t kMostSourcesNamed = 3;
+/// Why a step was skipped that was asked for.
+constexpr std::string_view kOverBudget = "over budget";
 
 /// "Manifest.json", "Manifest.json-2" …
 bool isManifestName(std::string_view name) {
@@ -149,7 +151,9 @@ class Judge {
     for (const Json& step : rowsOf(manifest, "steps")) {
       const std::string name = textOf(step, "step"), state = textOf(step, "state");
       std::string why = reasonOf(step);
-      if (state == "skipped") {
+      if (state == "skipped" && why == kOverBudget) {
+        _missing(name, why);
+      } else if (state == "skipped") {
         _verdict.skipped.push_back(name);
       } else if (state == "partial") {
         if (!why.empty()) _missing(name, why);  // its parts have rows of their own

@@ -21,7 +21,9 @@
 #include "platform/linux/config/host_environment.h"
 #include "platform/linux/config/host_paths.h"
 #include "platform/linux/config/toml_preference_store.h"
+#include "platform/linux/disk/kept_places.h"
 #include "platform/linux/files/descriptor.h"
+#include "platform/linux/files/posix_file_placement.h"
 #include "platform/linux/files/system_error.h"
 #include "platform/linux/ipc/client_shares.h"
 #include "platform/linux/loop/linux_clock.h"
@@ -188,6 +190,10 @@ class ThisMachine final : public ToolHost {
     }
     return view;
   }
+  [[nodiscard]] KeptStore& kept() override {
+    if (!_kept) _kept.emplace(keptPlaces(settings().roots, _environment.userId), _files);
+    return *_kept;
+  }
   [[nodiscard]] bool isInteractive() const override {
     return outputIsTerminal() && ::isatty(STDIN_FILENO) != 0;
   }
@@ -212,6 +218,8 @@ class ThisMachine final : public ToolHost {
   [[nodiscard]] std::chrono::steady_clock::time_point now() const override {
     return std::chrono::steady_clock::now();
   }
+  [[nodiscard]] WallTime wallNow() const override { return _clock.wallNow(); }
+  [[nodiscard]] std::string timeText(WallTime moment) const override { return zal::timeText(_clock, moment); }
   void pause(std::chrono::milliseconds duration) override { std::this_thread::sleep_for(duration); }
 
  private:
@@ -223,6 +231,7 @@ class ThisMachine final : public ToolHost {
     settings.warnings = std::move(loaded.warnings);
     settings.preferenceFile = TomlPreferenceStore::filePath(_preferenceDirectory, kDomain);
     settings.roots = std::move(loaded.configuration.roots);
+    settings.disk = loaded.configuration.disk;
     return settings;
   }
 
@@ -233,6 +242,8 @@ class ThisMachine final : public ToolHost {
   TomlPreferenceStore _preferences;
   std::optional<ToolSettings> _settings;
   ZipReader _archives;
+  PosixFilePlacement _files{"", ""};  // the store asks it for nothing as long as nothing is removed
+  std::optional<FileKeptStore> _kept;
 };
 
 }  // namespace

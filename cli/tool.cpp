@@ -81,6 +81,7 @@ int runTool(const std::vector<std::string>& arguments, ToolHost& host, std::istr
   addPreferenceCommands(app, tool);
   addSessionTreeCommands(app, tool);
   addVerifyCommand(app, tool);
+  addDiskCommand(app, tool);
   addStatusCommand(app, tool);
 
   try {

@@ -68,6 +68,7 @@ void addAlertCommands(CLI::App& app, ToolContext& tool);
 void addPreferenceCommands(CLI::App& app, ToolContext& tool);
 void addSessionTreeCommands(CLI::App& app, ToolContext& tool);
 void addVerifyCommand(CLI::App& app, ToolContext& tool);
+void addDiskCommand(CLI::App& app, ToolContext& tool);
 void addStatusCommand(CLI::App& app, ToolContext& tool);
 
 }  // namespace zal

@@ -8,7 +8,10 @@
 
 #include "cli/agent_records.h"
 #include "cli/archive_reader.h"
+#include "platform/clock.h"
+#include "platform/configuration.h"
 #include "platform/directory_roots.h"
+#include "platform/kept_store.h"
 
 namespace zal {
 
@@ -19,6 +22,7 @@ struct ToolSettings {
   std::vector<std::string> warnings;  ///< what is wrong in the configuration file, one line each
   std::string preferenceFile;
   DirectoryRoots roots;  ///< absolute; no "~" is left
+  DiskSettings disk;
 };
 
 /// What the control tool needs of the machine besides the agent itself. Main thread only.
@@ -46,6 +50,9 @@ class ToolHost {
   /// Nothing while it is not worth a word.
   [[nodiscard]] virtual std::optional<MemoryView> memory() = 0;
 
+  /// What the agent keeps on the disk. The tool removes nothing of it.
+  [[nodiscard]] virtual KeptStore& kept() = 0;
+
   /// A person types, and sees what is printed.
   [[nodiscard]] virtual bool isInteractive() const = 0;
   /// Columns of the terminal that is printed to; 0 when there is none whose last line can be redrawn.
@@ -57,6 +64,9 @@ class ToolHost {
   [[nodiscard]] virtual std::int64_t processId() const = 0;
   [[nodiscard]] virtual std::string absolutePath(const std::string& path) const = 0;
   [[nodiscard]] virtual std::chrono::steady_clock::time_point now() const = 0;
+  [[nodiscard]] virtual WallTime wallNow() const = 0;
+  /// "2024-05-02 14:03:07", as the local calendar has it.
+  [[nodiscard]] virtual std::string timeText(WallTime moment) const = 0;
   virtual void pause(std::chrono::milliseconds duration) = 0;
 };
 

@@ -32,6 +32,12 @@ class ArchiveVerdictTest : public ::testing::Test {
       true, "", {{"Top/", 0, "", ""}, {"Top/a.log", 5, "11", ""}, {"Top/Manifest.json", 9, "22", ""}}, ""};
 };
 
+TEST_F(ArchiveVerdictTest, AStepThatWasLeftOutToSaveRoomIsMissing) {
+  steps = R"({"step": "Location", "state": "skipped", "why": ["over budget"]})";
+  EXPECT_EQ(missing(), Lines{"Location: over budget"});
+  EXPECT_EQ(judge().skipped, Lines{});
+}
+
 TEST_F(ArchiveVerdictTest, ArchiveAsItsManifestTellsItIsWhole) {
   steps = R"({"step": "Thermal log", "state": "done"}, {"step": "Location", "state": "skipped"})";
   const ArchiveVerdict verdict = judge();

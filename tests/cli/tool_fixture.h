@@ -11,6 +11,7 @@
 
 #include "cli/tool.h"
 #include "tests/client_support/scripted_agent.h"
+#include "tests/support/fake_kept_store.h"
 #include "tests/support/temporary_directory.h"
 
 namespace zal::testing {
@@ -66,6 +67,7 @@ class ScriptedMachine final : public ToolHost {
   }
   [[nodiscard]] std::vector<DumpView> dumps() override { return recordedDumps; }
   [[nodiscard]] std::optional<MemoryView> memory() override { return agentMemory; }
+  [[nodiscard]] KeptStore& kept() override { return keptStore; }
   [[nodiscard]] bool isInteractive() const override { return terminal; }
   [[nodiscard]] std::size_t redrawWidth() const override { return terminal ? 60 : 0; }
   [[nodiscard]] bool outputIsTerminal() const override { return terminal; }
@@ -77,6 +79,11 @@ class ScriptedMachine final : public ToolHost {
   }
   /// Stands still but for pauses.
   [[nodiscard]] std::chrono::steady_clock::time_point now() const override { return moment; }
+  [[nodiscard]] WallTime wallNow() const override { return wall; }
+  [[nodiscard]] std::string timeText(WallTime of) const override {
+    const auto days = std::chrono::floor<std::chrono::days>(wall - of).count();
+    return std::to_string(days) + " days ago";
+  }
   void pause(std::chrono::milliseconds duration) override {
     moment += duration;
     ++pauses;
@@ -94,6 +101,8 @@ class ScriptedMachine final : public ToolHost {
   std::string answerTrouble;
   std::vector<DumpView> recordedDumps;
   std::optional<MemoryView> agentMemory;
+  FakeKeptStore keptStore;
+  WallTime wall{std::chrono::seconds{1714651387}};
   std::string workingDirectory;
   bool terminal = false;
   std::chrono::steady_clock::time_point moment;
