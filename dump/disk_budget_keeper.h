@@ -25,7 +25,7 @@ struct Platform;
 class DiskBudgetKeeper {
  public:
   /// After a start, time for the sessions and collections of former agents to be taken up again.
-  static constexpr std::chrono::seconds kFirstLook{10};
+  static constexpr std::chrono::seconds kFirstLook{3};
 
   explicit DiskBudgetKeeper(Platform& platform);
   DiskBudgetKeeper(const DiskBudgetKeeper&) = delete;
