@@ -224,11 +224,25 @@ std::vector<PlannedStep> formerSteps(const CutOffDump& dump) {
   return steps;
 }
 
+/// Whether something of its own was written into the directory after the archive was made: a session's
+/// recovered logs. Linked logs are others'.
+bool holdsNewer(const std::string& directory, const std::string& archive) {
+  std::error_code error;
+  const auto made = std::filesystem::last_write_time(archive, error);
+  for (std::filesystem::directory_iterator entry(directory, error), end; !error && entry != end;
+       entry.increment(error)) {
+    if (entry->is_regular_file(error) && entry->hard_link_count(error) == 1 &&
+        entry->last_write_time(error) > made)
+      return true;
+  }
+  return false;
+}
+
 /// The archive had its name before the agent ended: it was whole. What was left to do then is done now.
 void tidyUpAfter(const CutOffDump& dump, const std::string& archive, Platform& platform) {
   platform.queues.global(QueuePriority::standard).async([dump, archive, &platform] {
     std::error_code ignored;
-    std::filesystem::remove_all(dump.directory, ignored);
+    if (!holdsNewer(dump.directory, archive)) std::filesystem::remove_all(dump.directory, ignored);
     platform.queues.main().async([service = dump.service, archive, &platform] {
       linkArchiveOfEarlier(logRoot(platform), service, archive, platform.agentLog);
     });

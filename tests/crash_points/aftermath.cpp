@@ -55,19 +55,32 @@ std::vector<Aftermath::GatheredText> Aftermath::_gathered(const std::string& ofN
     return fs::path(path).filename().string().starts_with(ofName);
   };
   for (const std::string& directory : _directories) {
+    // What could be written of a session whose logs were written whole by the next agent.
+    const std::size_t aside = directory.find(" (not archived)");
+    const bool isRewritten = aside != std::string::npos && _isRecovered(directory.substr(0, aside));
     for (const std::string& path : everythingBelow(directory)) {
+      if (isRewritten && fs::path(path).parent_path() == directory && ofName.ends_with("Log (")) continue;
       if (isWanted(path)) found.push_back({directory, path, readFile(path)});
     }
   }
   for (const std::string& archive : _archives) {
     // Kept because the archive has not all of it.
     if (fs::exists(archive.substr(0, archive.size() - 4) + " (not archived)")) continue;
+    if (ofName.ends_with("Log (") && _isRecovered(archive.substr(0, archive.size() - 4))) continue;
     for (const ZipEntry& entry : listZip(archive).value_or(std::vector<ZipEntry>())) {
       if (isWanted(entry.name))
         found.push_back({archive, entry.name, readZipEntry(archive, entry.name).value_or("")});
     }
   }
   return found;
+}
+
+bool Aftermath::_isRecovered(const std::string& directory) {
+  const std::vector<std::string> paths = everythingBelow(directory);
+  return std::any_of(paths.begin(), paths.end(), [](const std::string& path) {
+    return fs::path(path).filename().string().starts_with("Verbose Log (") &&
+           readFile(path).starts_with("[Recovered: ");
+  });
 }
 
 void Aftermath::_checkNumbers(const std::string& text, const std::string& mark, const std::set<int>& told,
@@ -88,11 +101,13 @@ void Aftermath::checkSession(const Told& told) {
   std::string verbose, simple;
   for (const GatheredText& log : _gathered("Verbose Log (")) {
     verbose += log.text;
-    if (log.text.find("] End Session") == std::string::npos) fail("without its end: " + log.name);
+    if (!told.mayLackEnds && log.text.find("] End Session") == std::string::npos)
+      fail("without its end: " + log.name);
   }
   for (const GatheredText& log : _gathered("Log (")) {
     simple += log.text;
-    if (log.text.find("] End Session") == std::string::npos) fail("without its end: " + log.name);
+    if (!told.mayLackEnds && log.text.find("] End Session") == std::string::npos)
+      fail("without its end: " + log.name);
   }
   _checkNumbers(verbose, kEntryMark, told.entries, told.confirmedEntries, "the session");
   for (const std::string& line : told.confirmedHeaders) {
@@ -134,6 +149,7 @@ void Aftermath::checkArchives() {
     if (!verdict.hasManifest) fail("without a manifest: " + archive);
     for (const auto& finding : verdict.damaged)
       fail(archive + ": damaged: " + finding.what + ": " + finding.why);
+    if (_isRecovered(archive.substr(0, archive.size() - 4))) continue;
     if (fs::exists(archive.substr(0, archive.size() - 4))) fail("beside its directory: " + archive);
   }
   const std::string link = _sandbox.logRoot() + "/" + kSessionType + "/Latest-" + kSessionType;

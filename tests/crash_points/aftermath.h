@@ -37,6 +37,8 @@ class Aftermath {
   };
   /// Of all collections, those in archives included.
   [[nodiscard]] std::vector<GatheredText> _gathered(const std::string& ofName) const;
+  /// Whether it has the logs of a session that the next agent wrote, as the disk had refused them before.
+  [[nodiscard]] static bool _isRecovered(const std::string& directory);
   void _checkNumbers(const std::string& text, const std::string& mark, const std::set<int>& told,
                      const std::set<int>& confirmed, const std::string& where);
 

@@ -14,13 +14,16 @@ namespace {
 using namespace zal::testing;
 
 constexpr const char* kUsage =
-    "crash_points [call|dump] [kill|tear|fault] [--every N] [--start N] [--jobs N]\n"
+    "crash_points [call|dump] [kill|tear|fault|disk|full] [--every N] [--start N] [--jobs N]\n"
     "             [--only NUMBER [--error N] [--keep DIRECTORY]]\n";
 
 constexpr int kSkipped = 77;
 
-const std::map<std::string, Harm> kHarms = {
-    {"kill", Harm::kill}, {"tear", Harm::tear}, {"fault", Harm::fault}};
+const std::map<std::string, Harm> kHarms = {{"kill", Harm::kill},
+                                            {"tear", Harm::tear},
+                                            {"fault", Harm::fault},
+                                            {"disk", Harm::disk},
+                                            {"full", Harm::full}};
 
 int tryOne(const SweepOptions& options, std::uint64_t number, std::size_t error, const std::string& keepIn) {
   const TrialResult result =
@@ -76,6 +79,10 @@ int run(int argc, char** argv) {
   const SweepFigures figures = sweep(options);
   std::printf("%s: %zu points, %zu confirmed by barriers, %zu points with something lost or left\n",
               options.scenario.c_str(), figures.points, figures.confirmed, figures.failures);
+  if (figures.told > 0) {
+    std::printf("  of them %zu where something found no room, which the log says; the last is %llu\n",
+                figures.told, static_cast<unsigned long long>(figures.lastTold));
+  }
   return figures.failures == 0 && figures.points > 0 ? 0 : 1;
 }
 

@@ -17,6 +17,7 @@ struct Told {
   std::set<int> records, confirmedRecords;  ///< numbers of log records
   std::set<std::string> confirmedHeaders;   ///< lines that have to be at the top of the session's logs
   bool endIsConfirmed = false;
+  bool mayLackEnds = false;  ///< session logs need not be whole
 
   [[nodiscard]] std::size_t confirmed() const {
     return confirmedEntries.size() + confirmedRecords.size() + confirmedHeaders.size();

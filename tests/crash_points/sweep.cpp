@@ -3,6 +3,7 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cstdio>
 #include <sstream>
 #include <stdexcept>
@@ -14,10 +15,11 @@ namespace {
 /// What a pipe takes in one piece.
 constexpr std::size_t kLongestLine = 4000;
 
-/// POINT TAB ERROR TAB CONFIRMED TAB CALL TAB VIOLATIONS
+/// POINT TAB ERROR TAB CONFIRMED TAB WHETHER A LOSS WAS TOLD TAB CALL TAB VIOLATIONS
 std::string lineOf(const TrialPoint& point, const TrialResult& result) {
   std::string line = std::to_string(point.number) + '\t' + std::to_string(point.error) + '\t' +
-                     std::to_string(result.confirmed) + '\t' + result.call + '\t';
+                     std::to_string(result.confirmed) + '\t' + (result.isLossTold ? "1" : "0") + '\t' +
+                     result.call + '\t';
   for (const std::string& violation : result.violations) line += violation + "; ";
   for (char& character : line) character = character == '\n' ? ' ' : character;
   return line.substr(0, kLongestLine) + '\n';
@@ -44,11 +46,15 @@ void work(const SweepOptions& options, unsigned worker, int output) {
 
 void take(const std::string& line, SweepFigures& figures) {
   std::istringstream fields(line);
-  std::string number, error, confirmed, call, violations;
-  for (std::string* field : {&number, &error, &confirmed, &call, &violations})
+  std::string number, error, confirmed, told, call, violations;
+  for (std::string* field : {&number, &error, &confirmed, &told, &call, &violations})
     std::getline(fields, *field, '\t');
   ++figures.points;
   figures.confirmed += std::stoul(confirmed);
+  if (told == "1") {
+    ++figures.told;
+    figures.lastTold = std::max(figures.lastTold, std::stoul(number));
+  }
   if (violations.empty()) return;
   ++figures.failures;
   std::printf("  point %s (error %s), %s: %s\n", number.c_str(), error.c_str(), call.c_str(),

@@ -16,9 +16,11 @@ struct SweepOptions {
 };
 
 struct SweepFigures {
-  std::size_t points = 0;     ///< where the agent was harmed
-  std::size_t confirmed = 0;  ///< of what clients told, over all points
-  std::size_t failures = 0;   ///< points with a violation
+  std::size_t points = 0;      ///< where the agent was harmed
+  std::size_t confirmed = 0;   ///< of what clients told, over all points
+  std::size_t failures = 0;    ///< points with a violation
+  std::size_t told = 0;        ///< points where something found no room and the log says so
+  std::uint64_t lastTold = 0;  ///< the last of them
 };
 
 /// Tries one point after the other until a run has none of that number. Prints each that fails.

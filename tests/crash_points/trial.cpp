@@ -12,12 +12,15 @@
 #include <exception>
 #include <filesystem>
 #include <mutex>
+#include <optional>
+#include <stdexcept>
 #include <string_view>
 #include <thread>
 
 #include "tests/crash_points/aftermath.h"
 #include "tests/crash_points/supervised_agent.h"
 #include "tests/e2e/agent_process.h"
+#include "tests/e2e/small_disk.h"
 #include "tests/support/child_program.h"
 #include "tests/support/temporary_directory.h"
 
@@ -26,6 +29,11 @@ namespace {
 
 /// A run takes a tenth of a second; who needs that long waits for something that does not come.
 constexpr std::chrono::seconds kLongestRun{10};
+
+constexpr std::size_t kBlock = 4096;
+constexpr std::size_t kRoom = std::size_t{32} << 20U;
+/// More than a call and its archive need, with what is reserved for its last minutes.
+constexpr std::uint64_t kMostBlocks = 400;
 
 /// Ends an agent that hangs, so that its client sees the end of the stream.
 class Watchdog {
@@ -59,11 +67,24 @@ class Watchdog {
   std::thread _thread;  // last: uses all others
 };
 
-/// What the process has there has a name on a disk.
-bool isFile(pid_t process, int descriptor) {
-  const std::string place = "/proc/" + std::to_string(process) + "/fd/" + std::to_string(descriptor);
+std::string nameOf(pid_t process, std::uint64_t descriptor) {
+  const std::string place =
+      "/proc/" + std::to_string(process) + "/fd/" + std::to_string(static_cast<int>(descriptor));
   std::error_code error;
-  return std::filesystem::read_symlink(place, error).string().starts_with('/');
+  return std::filesystem::read_symlink(place, error).string();
+}
+
+/// What the process has there has a name on a disk.
+bool isFile(pid_t process, std::uint64_t descriptor) {
+  const std::string name = nameOf(process, descriptor);
+  return name.starts_with('/') && !name.ends_with("/agent.output");
+}
+
+/// Whether epoll_ctl is to watch one more: not what the loop itself is made of, without which there is none.
+bool addsMore(pid_t process, const seccomp_data& data) {
+  const std::string name = nameOf(process, data.args[2]);
+  return data.args[1] == EPOLL_CTL_ADD && name != "anon_inode:[eventfd]" && name != "anon_inode:[timerfd]" &&
+         !name.starts_with("pipe:");
 }
 
 /// A short text in the memory of the process.
@@ -84,8 +105,10 @@ class Trial {
 
   TrialResult run(const std::string& keepIn) {
     try {
+      if (_point.harm == Harm::disk) _useSmallDisk();
       _scenario.prepare(_sandbox);
       _sandbox.writeConfiguration();
+      if (_disk) _disk->leaveFree(_point.number * kBlock);
       _harm();
       _recover();
       _look();
@@ -105,16 +128,15 @@ class Trial {
   /// On the supervisor's thread.
   Judgement _judge(pid_t process, const WatchedCall& call, const seccomp_data& data) {
     using Kind = Judgement::Kind;
+    if (_point.harm == Harm::disk) return {};
+    if (_point.harm == Harm::full) return _judgeFull(process, call, data);
     if (_point.harm == Harm::tear) {
       if (!call.writes || data.args[2] < 2) return {};
-    } else if (_point.harm == Harm::fault && call.ofFilesOnly &&
-               !isFile(process, static_cast<int>(data.args[0]))) {
+    } else if (_point.harm == Harm::fault && call.ofFilesOnly && !isFile(process, data.args[0])) {
       return {};
     }
     if (_point.harm == Harm::fault && !_isConfigured(process, call, data)) return {};
-    // Only what is added can be too much.
-    if (_point.harm == Harm::fault && call.number == SYS_epoll_ctl && data.args[1] != EPOLL_CTL_ADD)
-      return {};
+    if (_point.harm == Harm::fault && call.number == SYS_epoll_ctl && !addsMore(process, data)) return {};
     if (++_counted != _point.number) return {};
     _result.isReached = true;
     _result.call = call.name;
@@ -124,6 +146,25 @@ class Trial {
     if (_point.error >= call.errors.size()) return {};
     _result.call += std::string(" ") + ::strerrorname_np(call.errors[_point.error]);
     return {.kind = Kind::fails, .error = call.errors[_point.error]};
+  }
+
+  Judgement _judgeFull(pid_t process, const WatchedCall& call, const seccomp_data& data) {
+    using Kind = Judgement::Kind;
+    if (!call.writes || !isFile(process, data.args[0])) return {};
+    if (++_counted < _point.number) return {};
+    _result.isReached = true;
+    if (_counted > _point.number || data.args[2] < 2) return {.kind = Kind::fails, .error = ENOSPC};
+    _result.call = call.name;
+    return {.kind = Kind::shortens, .bytes = data.args[2] / 2};
+  }
+
+  /// Logs, reports and records of sessions on one disk.
+  void _useSmallDisk() {
+    _disk.emplace(_sandbox / "home/kept", "64m");
+    if (_disk->error() != 0) throw std::runtime_error("no tmpfs can be mounted");
+    _sandbox.stateRoot = _sandbox / "home/kept/state";
+    _result.isReached = _point.number <= kMostBlocks;
+    _result.call = "blocks";
   }
 
   /// Faults begin when the configuration has been read: without it the agent would work elsewhere.
@@ -150,7 +191,7 @@ class Trial {
 
   void _judgeEnd(int status) {
     _result.outcome = "status " + std::to_string(status);
-    const bool isKilled = _result.isReached && _point.harm != Harm::fault;
+    const bool isKilled = _result.isReached && (_point.harm == Harm::kill || _point.harm == Harm::tear);
     if (isKilled ? status != -SIGKILL : status < 0) {
       _result.violations.push_back("ended with " + std::to_string(status));
     } else if (!isKilled && status != 0) {
@@ -161,6 +202,8 @@ class Trial {
 
   /// The agent that the service manager would start next, until nothing is left to do for it.
   void _recover() {
+    if (_disk) _disk->leaveFree(kRoom);
+    _isTold = readFile(_sandbox.outputFile()).find("No space left on device") != std::string::npos;
     AgentProcess agent(_sandbox);
     eventually(
         [this] {
@@ -176,16 +219,32 @@ class Trial {
   }
 
   void _look() {
+    std::vector<std::string> violations = _violationsOf(_told);
+    if (!violations.empty() && _isTold && (_point.harm == Harm::disk || _point.harm == Harm::full)) {
+      Told less = _told;
+      less.confirmedEntries.clear();
+      less.confirmedRecords.clear();
+      less.confirmedHeaders.clear();
+      less.mayLackEnds = true;
+      violations = _violationsOf(less);
+      _result.isLossTold = violations.empty();
+    }
+    for (const std::string& violation : violations) _result.violations.push_back(violation);
+  }
+
+  [[nodiscard]] std::vector<std::string> _violationsOf(const Told& told) const {
     Aftermath after(_sandbox);
-    _scenario.check(after, _told);
+    _scenario.check(after, told);
     after.checkArchives();
     after.checkStrays();
-    for (const std::string& violation : after.violations()) _result.violations.push_back(violation);
+    return after.violations();
   }
 
   const Scenario& _scenario;
   const TrialPoint _point;
   AgentSandbox _sandbox;
+  std::optional<SmallDisk> _disk;
+  bool _isTold = false;
   Told _told;
   TrialResult _result;
   bool _seenConfiguration = false, _hasConfiguration = false;

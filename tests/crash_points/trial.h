@@ -13,6 +13,8 @@ enum class Harm {
   kill,   ///< it ends before the call
   tear,   ///< it ends in the middle of the write; only writes count
   fault,  ///< the call fails
+  disk,   ///< the disk has so many blocks of 4 KiB left
+  full,   ///< half of a write fits on the disk, then nothing any more; only writes count
 };
 
 /// One point of a sweep.
@@ -28,6 +30,8 @@ struct TrialResult {
   std::size_t errors = 0;  ///< how many the call can fail with
   std::size_t confirmed = 0;
   std::string outcome;  ///< how the harmed agent ended
+  /// Something confirmed did not find room on the disk, and the agent's log says that there was none.
+  bool isLossTold = false;
   std::vector<std::string> violations;
 };
 

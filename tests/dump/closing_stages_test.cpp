@@ -388,6 +388,16 @@ TEST_F(ClosingStagesTest, OfAnArchiveThatHadItsNameTheDirectoryGoesAndTheLinkIsM
   EXPECT_TRUE(host.fileCopier.started.empty());
 }
 
+TEST_F(ClosingStagesTest, WhatWasRecoveredIntoTheDirectoryOfAnArchiveStays) {
+  put("dump.zip");
+  put("dump/Log (14-03-07).log");
+  fs::last_write_time(host.home / "dump.zip", fs::last_write_time(host.home / "dump.zip") - 1h);
+  host.dumpProgress.cutOffDumps = {{"Vistel", host.home / "dump", {{"Archive", true}}}};
+  closing.finishCutOff();
+  host.queues.runAll();
+  EXPECT_TRUE(fs::exists(host.home / "dump/Log (14-03-07).log"));
+}
+
 TEST_F(ClosingStagesTest, WhatEndedThreeAgentsIsNotTriedAgain) {
   const CutOffDump dump{"Vistel", host.home / "dump", {}};
   host.dumpProgress.cutOffDumps = {dump, dump, dump, dump};

@@ -15,6 +15,8 @@ class SmallDisk {
   SmallDisk& operator=(const SmallDisk&) = delete;
 
   [[nodiscard]] int error() const { return _error; }
+  /// So many bytes free from now on; what is there stays.
+  void leaveFree(std::size_t bytes) const;
   /// Until not another block fits, or all but so many bytes.
   void fill(std::size_t bytesLeft = 0) const;
   void makeRoom() const;

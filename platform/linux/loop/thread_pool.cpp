@@ -86,10 +86,16 @@ void ThreadPool::submitAfter(std::chrono::nanoseconds delay, const asio::any_io_
 void ThreadPool::_startThread() {
   if (_closing || _threads.size() >= _options.maximumThreads) return;
   const AllSignalsBlocked blocked;
-  try {
-    _threads.emplace_back([this, number = _threads.size() + 1] { _runThread(number); });
-  } catch (const std::system_error&) {
-    if (_threads.empty()) throw;  // otherwise the others take the job, later
+  constexpr int kMostAttempts = 3;
+  for (int attempt = 1;; ++attempt) {
+    try {
+      _threads.emplace_back([this, number = _threads.size() + 1] { _runThread(number); });
+      return;
+    } catch (const std::system_error&) {
+      if (!_threads.empty()) return;  // the others take the job, later
+      // Without any the job's owner fails: not for a moment in which the host has no room.
+      if (attempt == kMostAttempts) throw;
+    }
   }
 }
 
