@@ -7,9 +7,10 @@ TEST_JOBS := $(shell expr 2 \* $(JOBS))
 CMAKE := cmake
 # Seconds that each fuzzer runs; `make test` gives them a short turn.
 FUZZ_SECONDS ?= 120
+SOAK_ROUNDS ?= 150
 TEST_FUZZ_SECONDS ?= 5
 
-.PHONY: help demo test build bench crash-points fuzz lint format hooks install clean \
+.PHONY: help demo test build bench crash-points fuzz soak lint format hooks install clean \
 	dependencies-build dependencies-demo dependencies-test dependencies-bench dependencies-develop \
 	build-plain build-address build-thread test-plain test-address test-thread house-check fuzz-short bench-once
 
@@ -82,6 +83,11 @@ crash-points: dependencies-build dependencies-test
 	$(CMAKE) -Wno-dev -S . -B $(BUILD) -DCMAKE_BUILD_TYPE=Release -DZAL_TESTS=ON -DZAL_TESTS_FROM_OUTSIDE=ON
 	$(CMAKE) --build $(BUILD) --target crash_points -j $(JOBS)
 	scripts/crash-points $(BUILD)/tests/bin/crash_points $(JOBS)
+
+## make soak     a week of an agent on the manual clock, and SOAK_ROUNDS (150) of calls, floods, dumps and kills for real
+soak: dependencies-build dependencies-test build-plain
+	ZAL_SOAK_DAYS=7 $(BUILD)/tests/bin/soak_tests
+	ZAL_SOAK_ROUNDS=$(SOAK_ROUNDS) $(BUILD)/tests/bin/e2e_tests --gtest_filter='SoakE2eTest.*'
 
 ## make bench    the benchmarks against their peers, one table at the end
 bench: dependencies-build dependencies-test dependencies-bench
