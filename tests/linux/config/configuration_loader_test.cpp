@@ -41,6 +41,9 @@ TEST_F(ConfigurationLoaderTest, AnEmptyFileLeavesTheDefaults) {
   EXPECT_EQ(loaded.configuration.log.maximumOpenFiles, 64U);
   EXPECT_EQ(loaded.configuration.ipc.maximumPayload, 16'777'216U);
   EXPECT_EQ(loaded.configuration.ipc.maximumReplyBacklog, 1'048'576U);
+  EXPECT_EQ(loaded.configuration.disk.size, 0U);
+  EXPECT_EQ(loaded.configuration.disk.share, 10U);
+  EXPECT_EQ(loaded.configuration.disk.keepFree, 15U);
   EXPECT_EQ(loaded.configuration.inactivityLimit, std::nullopt);
   EXPECT_EQ(loaded.configuration.roots.UserLogRoot, "/home/ann/.local/state/lirra/Logs");
 }
@@ -108,6 +111,10 @@ sync = true
 session = 65536
 peer = 131072
 total = 262144
+[disk]
+size = 1099511627776
+share = 20
+keepFree = 0
 [log]
 categories = ["IPC", "Ping"]
 rotationSize = 1024
@@ -175,6 +182,9 @@ delayedEnd = 0.5
   EXPECT_EQ(c.memory.session, 65536U);
   EXPECT_EQ(c.memory.peer, 131072U);
   EXPECT_EQ(c.memory.total, 262144U);
+  EXPECT_EQ(c.disk.size, 1'099'511'627'776U);
+  EXPECT_EQ(c.disk.share, 20U);
+  EXPECT_EQ(c.disk.keepFree, 0U);
   EXPECT_THAT(c.log.categories, ElementsAre("IPC", "Ping"));
   EXPECT_EQ(c.log.rotationSize, 1024U);
   EXPECT_EQ(c.log.maximumOpenFiles, 2U);
@@ -317,6 +327,15 @@ red = true
   EXPECT_EQ(loaded.configuration.roots.UserLogRoot, "/home/ann/.local/state/lirra/Logs");
   EXPECT_EQ(loaded.configuration.log.rotationSize, 4'194'304U);
   EXPECT_THAT(loaded.configuration.log.categories, IsEmpty());
+}
+
+TEST_F(ConfigurationLoaderTest, PercentagesOfTheDiskBeyondTheWholeAreRefused) {
+  const auto loaded = load("[disk]\nshare = 101\nkeepFree = -1\nsize = \"1 GiB\"\n");
+  EXPECT_THAT(loaded.warnings,
+              ElementsAre(file + ":2: disk.share wants a whole number from 0 to 100",
+                          file + ":3: disk.keepFree wants a whole number from 0 to 100",
+                          file + ":4: disk.size wants a whole number from 0 to 1125899906842624"));
+  EXPECT_EQ(loaded.configuration.disk.share, 10U);
 }
 
 TEST_F(ConfigurationLoaderTest, AKeyOutsideAnySectionAndASectionThatIsNoneAreNamed) {
