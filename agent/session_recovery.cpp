@@ -1,9 +1,8 @@
 #include "agent/session_recovery.h"
 
-#include <algorithm>
 #include <memory>
+#include <optional>
 #include <string>
-#include <vector>
 
 #include "agent/session_directory.h"
 #include "agent/session_type_key.h"
@@ -14,10 +13,11 @@
 namespace zal {
 namespace {
 
-/// A record whose pieces were understood.
+/// What a record is, as far as its pieces were understood. Not the entries themselves: there may be millions.
 struct CutOffSession {
   std::optional<std::string> type;
-  std::vector<SessionEntry> entries;
+  /// The clock may have been set back in the call: the last entry says when it was, not the latest.
+  std::optional<WallTime> lastHeardOf;
   std::uint64_t unreadableBytes = 0;
 };
 
@@ -31,19 +31,16 @@ CutOffSession understood(const UnfinishedRecord& record) {
     } else if (entry->kind == SessionEntryKind::opened) {
       session.type = std::string(entry->text.value_or(""));
     } else {
-      session.entries.push_back(*entry);
+      session.lastHeardOf = entry->at;
     }
   }
   return session;
 }
 
-/// The clock may have been set back in the call: the last entry says when it was, not the latest.
-WallTime lastHeardOf(const CutOffSession& session) { return session.entries.back().at; }
-
 std::string recoveryNote(const CutOffSession& session, SessionServices& services) {
   EntryTimeText time(services.clock, services.timeZone);
   std::string note = "the agent was cut off after ";
-  note += time.text(lastHeardOf(session));
+  note += time.text(*session.lastHeardOf);
   if (session.unreadableBytes > 0) {
     note += "; " + std::to_string(session.unreadableBytes) + " bytes of its record could not be read";
   }
@@ -54,7 +51,7 @@ std::string recoveryNote(const CutOffSession& session, SessionServices& services
 bool recover(const UnfinishedRecord& record, Platform& platform, SessionServices& services) {
   const CutOffSession cutOff = understood(record);
   const std::string key = sessionTypeKey(cutOff.type);
-  if (cutOff.entries.empty()) {
+  if (!cutOff.lastHeardOf) {
     if (cutOff.unreadableBytes > 0) {
       platform.agentLog.warning("Nothing of a session of type " + key + " could be read from the black box");
     }
@@ -64,8 +61,11 @@ bool recover(const UnfinishedRecord& record, Platform& platform, SessionServices
       std::make_shared<ZalLoggingAgentVistelSession>(key, sessionDirectory(platform, key), services);
   const std::string note = recoveryNote(cutOff, services);
   session->setRecoveryNote(note);
-  for (const SessionEntry& entry : cutOff.entries) session->replay(entry);
-  const bool isWritten = session->endReplay(lastHeardOf(cutOff));
+  for (const std::string_view piece : record.pieces) {
+    const auto entry = decodeEntry(piece);
+    if (entry && entry->kind != SessionEntryKind::opened) session->replay(*entry);
+  }
+  const bool isWritten = session->endReplay(*cutOff.lastHeardOf);
   platform.agentLog.notice("Recovered a session of type " + key + ": " + note);
   return isWritten;
 }

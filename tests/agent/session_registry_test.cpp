@@ -52,6 +52,21 @@ TEST_F(SessionRegistryTest, ASecondBeginEndsTheFirstSessionAtOnceWithTheSecondSe
               HasSubstr("[Sender: second] End Session  [14:03:07.251  (2024-05-02) (CEST)]\n"));
 }
 
+TEST_F(SessionRegistryTest, TheEndOfTheProcessWaitsForTheFilesOfALargeSession) {
+  createLogging();
+  begin("Vistel");
+  for (int line = 0; line < 5; ++line) {
+    server->logDescription(std::string(1U << 20U, 'x'), "", "Vistel", "caller", 1714651388.0);
+  }
+  server->endAllSessions();
+  EXPECT_THAT(calls, ElementsAre("StartSessionCaptures 0"));
+  server->stop();
+  ASSERT_EQ(calls.size(), 2U);
+  EXPECT_THAT(calls[1], HasSubstr("CollectServiceLogs Vistel"));
+  EXPECT_THAT(report("Vistel/2024-05-02 at 14-03-07 (CEST) (Receiver)/Verbose Log (14-03-07).log"),
+              HasSubstr("[Sender: ENDALL] End Session  [14:03:07.251  (2024-05-02) (CEST)]\n"));
+}
+
 TEST_F(SessionRegistryTest, CapturesAreStartedBeforeTheEarlierSessionIsWritten) {
   createLogging();
   begin("Vistel", "first", 3, 11);
