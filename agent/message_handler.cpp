@@ -5,6 +5,7 @@
 #include <string>
 
 #include "agent/request_table.h"
+#include "platform/main_thread_watch.h"
 
 namespace zal {
 namespace {
@@ -57,6 +58,7 @@ void MessageHandler::_handleMessage(const std::shared_ptr<PeerConnection>& peer,
   const auto code = static_cast<std::uint64_t>(message.int64(kEventCodeKey));
   const auto table = requestTable();
   if (code >= table.size()) return;
+  const MainThreadWatch::Span span("request", table[code].name);
   table[code].carryOut({*_server, *_clock, peer, message});
 }
 

@@ -3,6 +3,7 @@
 #include <memory>
 
 #include "dump/collection_record.h"
+#include "platform/main_thread_watch.h"
 #include "platform/open_directories.h"
 #include "platform/platform.h"
 #include "platform/standard_path.h"
@@ -19,6 +20,7 @@ struct Outcome {
 }  // namespace
 
 bool waitInSteadyTime(std::binary_semaphore& signal, std::chrono::seconds limit) {
+  const MainThreadWatch::WantedWait wait;
   return signal.try_acquire_for(limit);
 }
 

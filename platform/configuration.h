@@ -63,6 +63,18 @@ struct DiskSettings {
   std::uint32_t keepFree = 15;  ///< percent of the file system that stay free; 0: it may fill up
 };
 
+#ifndef NDEBUG
+inline constexpr std::uint32_t kUsualHoldLimit = 50;
+#else
+inline constexpr std::uint32_t kUsualHoldLimit = 0;
+#endif
+
+/// `[watchdog]`
+struct WatchdogSettings {
+  std::uint32_t limit =
+      kUsualHoldLimit;  ///< milliseconds that one thing may hold the main thread; 0: any time
+};
+
 /// `[log]`
 struct LogSettings {
   std::vector<std::string> categories;       ///< switched on; LIRRA_LOG_CATEGORIES adds to them
@@ -116,6 +128,7 @@ struct Configuration {
   BlackBoxSettings blackBox;
   MemorySettings memory;
   DiskSettings disk;
+  WatchdogSettings watchdog;
   LogSettings log;
   CommandSettings commands;
   CollectionSettings collection;

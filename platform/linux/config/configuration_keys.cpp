@@ -226,6 +226,7 @@ constexpr ConfigurationKey kKeys[] = {
     {"disk", "size", takeCount<&Configuration::disk, &DiskSettings::size, 0, kLargestSize>},
     {"disk", "share", takeCount<&Configuration::disk, &DiskSettings::share, 0, kWhole>},
     {"disk", "keepFree", takeCount<&Configuration::disk, &DiskSettings::keepFree, 0, kWhole>},
+    {"watchdog", "limit", takeCount<&Configuration::watchdog, &WatchdogSettings::limit, 0, 60000>},
     {"log", "categories", takeCategories},
     {"log", "rotationSize", takeCount<&Configuration::log, &LogSettings::rotationSize, 1024, kLargestBlock>},
     {"log", "maximumOpenFiles", takeCount<&Configuration::log, &LogSettings::maximumOpenFiles, 1, 65536>},

@@ -10,6 +10,7 @@
 #include "platform/linux/disk/kept_places.h"
 #include "platform/linux/files/root_parents.h"
 #include "platform/linux/files/temporary_leftovers.h"
+#include "platform/linux/host/held_text.h"
 #include "platform/linux/log/journal_stream.h"
 #include "platform/linux/notifications/notification_file.h"
 #include "platform/linux/progress/progress_file.h"
@@ -155,6 +156,11 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
                 .spillFiles = _spillFiles,
                 .keptStore = _keptStore} {
   std::signal(SIGPIPE, SIG_IGN);
+  if (const std::chrono::milliseconds limit{_loaded.configuration.watchdog.limit}; limit.count() > 0) {
+    _watchdog.emplace(_clock, limit, [this](auto kind, auto name, auto held) {
+      _agentLog.warning(heldText(kind, name, held));
+    });
+  }
   if (_loaded.configuration.alerts.screen) _userAlerts.showOn(_screens);
   makeRootParents(_loaded.configuration.roots);
   // Where standard error goes to the journal, each line is there already.

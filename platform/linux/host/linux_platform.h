@@ -42,6 +42,7 @@
 #include "platform/linux/progress/runtime_dump_progress.h"
 #include "platform/linux/property_list/pugixml_property_list_writer.h"
 #include "platform/linux/wifi/linux_wifi_diagnostics.h"
+#include "platform/main_thread_watch.h"
 #include "platform/platform.h"
 
 namespace zal {
@@ -68,6 +69,7 @@ class LinuxPlatform {
   LinuxClock _clock;
   LinuxRunLoop _mainLoop;
   LinuxAgentLog _agentLog;
+  std::optional<MainThreadWatch> _watchdog;
   LinuxWorkQueues _queues;
   MemoryLedger _memory;
   UnixIpcService _ipc;

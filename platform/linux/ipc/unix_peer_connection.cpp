@@ -11,6 +11,7 @@
 #include "platform/linux/loop/steady_time.h"
 #include "platform/linux/wire/message_builder.h"
 #include "platform/linux/wire/wire_message.h"
+#include "platform/main_thread_watch.h"
 
 namespace zal {
 namespace {
@@ -75,6 +76,7 @@ void UnixPeerConnection::_awaitInput() {
 
 void UnixPeerConnection::_readTurn() {
   _context->mainThread.check("UnixPeerConnection");
+  const MainThreadWatch::Span span("reading a client");
   if (!_socket) return;
   const std::shared_ptr<PeerConnection> keptAlive = shared_from_this();
   char* const buffer = _context->readBuffer.get();
@@ -166,6 +168,7 @@ void UnixPeerConnection::_takeFrame(const std::shared_ptr<PeerConnection>& self,
     case FrameKind::messageExpectingReply:
       return _takeMessage(self, frame);
     case FrameKind::barrier: {
+      const MainThreadWatch::Span span("barrier");
       if (_context->confirm) _context->confirm();
       _context->showShares();
       FrameHeader passed;

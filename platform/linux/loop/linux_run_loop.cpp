@@ -11,6 +11,7 @@
 #include <asio/post.hpp>
 
 #include "platform/linux/loop/steady_time.h"
+#include "platform/main_thread_watch.h"
 
 namespace zal {
 
@@ -26,6 +27,12 @@ int makeAlarm() {
   const int alarm = ::timerfd_create(CLOCK_BOOTTIME, TFD_NONBLOCK | TFD_CLOEXEC);
   if (alarm < 0) throw std::system_error(errno, std::generic_category(), "timerfd_create");
   return alarm;
+}
+
+/// Under the type of what runs, which says where it was written.
+void runWatched(std::string_view kind, const RunLoop::Task& task) {
+  const MainThreadWatch::Span span(kind, task.target_type().name());
+  task();
 }
 
 }  // namespace
@@ -52,7 +59,9 @@ void LinuxRunLoop::run() {
 
 void LinuxRunLoop::stop() { _context.stop(); }
 
-void LinuxRunLoop::post(Task task) { asio::post(_context, std::move(task)); }
+void LinuxRunLoop::post(Task task) {
+  asio::post(_context, [task = std::move(task)] { runWatched("task", task); });
+}
 
 TimerId LinuxRunLoop::callAfter(std::chrono::nanoseconds delay, Task task) {
   return _addTimer(std::max(delay, std::chrono::nanoseconds{0}), {{}, std::move(task)});
@@ -93,11 +102,11 @@ bool LinuxRunLoop::_fireDueTimers() {
     auto due = _timers.extract(_timers.begin());
     if (due.mapped().interval.count() == 0) {
       _deadlines.erase(due.key().second);
-      due.mapped().task();
+      runWatched("timer", due.mapped().task);
       continue;
     }
     try {
-      due.mapped().task();
+      runWatched("timer", due.mapped().task);
     } catch (...) {
       _armNextBeat(std::move(due));
       throw;
@@ -119,12 +128,17 @@ void LinuxRunLoop::_armNextBeat(Timers::node_type&& timer) {
 
 bool LinuxRunLoop::_runReadyHandlers() {
   int count = 0;
-  while (count < kHandlersPerTurn && _context.poll_one() > 0) ++count;
+  for (; count < kHandlersPerTurn; ++count) {
+    const MainThreadWatch::Span span("handler");
+    if (_context.poll_one() == 0) break;
+  }
   return count > 0;
 }
 
 void LinuxRunLoop::_runSleepObservers() {
-  for (std::size_t i = 0; i < _sleepObservers.size(); ++i) _sleepObservers[i]();
+  for (std::size_t i = 0; i < _sleepObservers.size(); ++i) {
+    runWatched("before sleep", _sleepObservers[i]);
+  }
 }
 
 void LinuxRunLoop::_setAlarm() {
@@ -165,7 +179,7 @@ void LinuxRunLoop::_awaitSignal(SignalWatch& watch) {
   watch.signals.async_wait([this, &watch](const std::error_code& error, int /*signal*/) {
     if (error) return;
     _awaitSignal(watch);
-    watch.task();
+    runWatched("signal", watch.task);
   });
 }
 

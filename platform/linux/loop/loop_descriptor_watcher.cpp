@@ -8,6 +8,8 @@
 
 #include <asio/posix/stream_descriptor.hpp>
 
+#include "platform/main_thread_watch.h"
+
 namespace zal {
 namespace {
 
@@ -43,6 +45,7 @@ class LoopDescriptorWatch : public DescriptorWatch {
       const auto handler = onReady.lock();
       if (error == asio::error::operation_aborted || !handler || round != _round) return;
       awaited = false;
+      const MainThreadWatch::Span span("descriptor", handler->target_type().name());
       (*handler)();
     });
   }

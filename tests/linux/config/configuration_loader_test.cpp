@@ -115,6 +115,8 @@ total = 262144
 size = 1099511627776
 share = 20
 keepFree = 0
+[watchdog]
+limit = 40
 [log]
 categories = ["IPC", "Ping"]
 rotationSize = 1024
@@ -185,6 +187,7 @@ delayedEnd = 0.5
   EXPECT_EQ(c.disk.size, 1'099'511'627'776U);
   EXPECT_EQ(c.disk.share, 20U);
   EXPECT_EQ(c.disk.keepFree, 0U);
+  EXPECT_EQ(c.watchdog.limit, 40U);
   EXPECT_THAT(c.log.categories, ElementsAre("IPC", "Ping"));
   EXPECT_EQ(c.log.rotationSize, 1024U);
   EXPECT_EQ(c.log.maximumOpenFiles, 2U);
