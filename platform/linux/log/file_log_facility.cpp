@@ -3,6 +3,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <exception>
 #include <utility>
 
 #include "platform/linux/log/log_set_name.h"
@@ -182,10 +183,16 @@ void FileLogFacility::_schedule(const UnfinishedRotation& rotation, std::chrono:
                    ": its rotation cannot be ended: " + error.message());
     }
   };
-  if (delay > 0ns) {
-    _rotations->asyncAfter(delay, std::move(job));
-  } else {
-    _rotations->async(std::move(job));
+  try {
+    if (delay > 0ns) {
+      _rotations->asyncAfter(delay, std::move(job));
+    } else {
+      _rotations->async(std::move(job));
+    }
+  } catch (const std::exception& exception) {
+    // The file's next rotation takes it along, or the next start. The record that asked for it goes on.
+    _messages.push_back(rotation.directory + "/" + rotation.fileName +
+                        ": its rotation waits: " + exception.what());
   }
 }
 
