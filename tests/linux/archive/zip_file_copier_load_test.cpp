@@ -27,8 +27,8 @@ INSTANTIATE_TEST_SUITE_P(Compression, ZipFileCopierLoadTest,
                          ::testing::Values(ArchiveCompression::small, ArchiveCompression::fast),
                          compressionName);
 
-TEST_P(ZipFileCopierLoadTest, TwentyThousandSmallFiles) {
-  const int count = isSanitized() ? 2'000 : 20'000;
+TEST_P(ZipFileCopierLoadTest, ThousandsOfSmallFiles) {
+  const int count = isSanitized() || GetParam() == ArchiveCompression::small ? 2'000 : 20'000;
   for (int i = 0; i < count; ++i) {
     const std::string name = input("set" + std::to_string(i % 100));
     if (i < 100) std::filesystem::create_directories(name);
@@ -44,12 +44,12 @@ TEST_P(ZipFileCopierLoadTest, TwentyThousandSmallFiles) {
 }
 
 /// What does not depend on the level is tried once.
-class ManyEntriesArchiveTest : public ArchiveFixture {};
+class LargeArchiveTest : public ArchiveFixture {};
 
-INSTANTIATE_TEST_SUITE_P(Compression, ManyEntriesArchiveTest, ::testing::Values(ArchiveCompression::fast),
+INSTANTIATE_TEST_SUITE_P(Compression, LargeArchiveTest, ::testing::Values(ArchiveCompression::fast),
                          compressionName);
 
-TEST_P(ManyEntriesArchiveTest, MoreThanTheOldFormatCounts) {
+TEST_P(LargeArchiveTest, MoreThanTheOldFormatCounts) {
   if (isSanitized())
     GTEST_SKIP() << "70,000 files take a sanitizer's build too long; the ordinary one does it";
   for (int i = 0; i < 70'000; ++i) std::ofstream(input(std::to_string(i)));
@@ -58,9 +58,9 @@ TEST_P(ManyEntriesArchiveTest, MoreThanTheOldFormatCounts) {
   EXPECT_EQ(complaintsAbout(output()), "");
 }
 
-TEST_P(ZipFileCopierLoadTest, AFileOfFiveGigabytes) {
-  if (isSanitized()) GTEST_SKIP() << "5 GB take a sanitizer's build too long; the ordinary one does it";
-  constexpr std::uint64_t kSize = 5'000'000'000;
+TEST_P(LargeArchiveTest, AFileLargerThanTheOldFormatCounts) {
+  if (isSanitized()) GTEST_SKIP() << "4 GiB take a sanitizer's build too long; the ordinary one does it";
+  constexpr std::uint64_t kSize = (std::uint64_t{4} << 30U) + 4321;
   writeFile(input("a small one"), "before");
   writeFile(input("sparse"), "its beginning");
   std::filesystem::resize_file(input("sparse"), kSize);
@@ -74,10 +74,7 @@ TEST_P(ZipFileCopierLoadTest, AFileOfFiveGigabytes) {
   EXPECT_EQ(printed("python3 -c 'import sys, zipfile; z = zipfile.ZipFile(sys.argv[1]); "
                     "print([i.file_size for i in z.infolist()], z.read(\"Dump/z\"))' " +
                     quoted),
-            "[0, 6, 5000000000, 9] b'behind it'\n");
-  // The others take their time for so much: one of the two archives is enough.
-  if (GetParam() == ArchiveCompression::small) return;
-  EXPECT_EQ(printed("7z t -bd " + quoted + " > '" + files() + "/said' || cat '" + files() + "/said'"), "");
+            "[0, 6, 4294971617, 9] b'behind it'\n");
   EXPECT_EQ(printed("unzip -p " + quoted + " Dump/sparse | cmp - '" + input("sparse") + "'"), "");
 }
 
