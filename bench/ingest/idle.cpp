@@ -25,7 +25,7 @@ IdleWatch::IdleWatch(const std::filesystem::path& programs) : _state(new State(p
   if (!_state->server.warmUp()) _state->missing = "the agent stores nothing";
   _state->client = _state->server.connect(1);
   _state->client->send(1);
-  pauseMilliseconds(1000);
+  pauseMilliseconds(5000);  // three seconds after its start it looks at the disk, once
   _state->before = contextSwitches(_state->server.processId());
   _state->since = Stopwatch();
 }
