@@ -1,5 +1,6 @@
 #include "platform/linux/archive/zip_file_copier.h"
 
+#include <malloc.h>
 #include <unistd.h>
 
 #include <utility>
@@ -76,6 +77,8 @@ class ZipJob : public FileCopierJob, public std::enable_shared_from_this<ZipJob>
   }
 
   void _complete() {
+    // A collection is over: what it and its session had is free, in the heaps of many threads, which keep it.
+    ::malloc_trim(0);
     _queue.async([self = shared_from_this()] { std::exchange(self->_completion, nullptr)(*self); });
   }
 
