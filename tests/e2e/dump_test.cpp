@@ -115,7 +115,7 @@ TEST_F(DumpE2eTest, ADumpDuringACallLeavesTheCallAlone) {
 
 TEST_F(DumpE2eTest, TheStackshotOfThisDumpIsInItsArchiveAndNoOlderOne) {
   if (std::system((testing::ownProcessIds() + " true 2>/dev/null").c_str()) != 0)
-    GTEST_SKIP() << "no process ids of one's own";
+    GTEST_SKIP() << "unshare cannot give a process ids of its own here";
   writeFile(sandbox.reportRoot() + "/Homeframe+2024-05-02-140307.stackshot", "of an earlier dump");
   start();
   lirra::Client client = makeClient();
