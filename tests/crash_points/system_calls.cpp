@@ -47,6 +47,7 @@ const std::vector<WatchedCall>& callsThatChange() {
       {.number = SYS_splice, .name = "splice", .errors = {}},
       {.number = SYS_copy_file_range, .name = "copy_file_range", .errors = {}},
       {.number = SYS_openat, .name = "openat", .errors = {}, .onlyIfItMakes = true},
+      {.number = SYS_renameat, .name = "renameat", .errors = {}},
       {.number = SYS_renameat2, .name = "renameat2", .errors = {}},
       {.number = SYS_linkat, .name = "linkat", .errors = {}},
       {.number = SYS_symlinkat, .name = "symlinkat", .errors = {}},
@@ -83,6 +84,7 @@ const std::vector<WatchedCall>& callsThatMayFail() {
       {.number = SYS_access, .name = "access", .errors = {EIO}},
 #endif
       {.number = SYS_openat, .name = "openat", .errors = {EIO, ENOSPC, EMFILE, EINTR}},
+      {.number = SYS_openat2, .name = "openat2", .errors = {EIO, EMFILE, EINTR}},
       {.number = SYS_read, .name = "read", .errors = {EIO, EINTR}, .ofFilesOnly = true},
       {.number = SYS_pread64, .name = "pread", .errors = {EIO, EINTR}, .ofFilesOnly = true},
       {.number = SYS_write,
@@ -105,6 +107,7 @@ const std::vector<WatchedCall>& callsThatMayFail() {
        .name = "copy_file_range",
        .errors = {EIO, ENOSPC, EINTR},
        .ofFilesOnly = true},
+      {.number = SYS_renameat, .name = "renameat", .errors = {EIO, ENOSPC}},
       {.number = SYS_renameat2, .name = "renameat2", .errors = {EIO, ENOSPC}},
       {.number = SYS_linkat, .name = "linkat", .errors = {EIO, ENOSPC}},
       {.number = SYS_symlinkat, .name = "symlinkat", .errors = {EIO, ENOSPC}},

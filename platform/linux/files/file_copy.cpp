@@ -157,14 +157,24 @@ class TreeCopy {
 }  // namespace
 
 CopyOutcome copyTree(const std::string& source, const std::string& target, CopyOptions options) {
+  return copyTreeTo(AT_FDCWD, source, target, options);
+}
+
+CopyOutcome copyTreeTo(int directory, const std::string& source, const std::string& target,
+                       CopyOptions options) {
   TreeCopy copy(options);
-  copy.copy({AT_FDCWD, source.c_str()}, {AT_FDCWD, target.c_str()});
+  copy.copy({AT_FDCWD, source.c_str()}, {directory, target.c_str()});
   return copy.outcome();
 }
 
 std::error_code syncDirectory(const std::string& directory) {
-  const Descriptor opened(::open(directory.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
-  if (!opened.isOpen() || ::fsync(opened.get()) != 0) return lastSystemError();
+  const Descriptor opened(::open(directory.c_str(), O_PATH | O_DIRECTORY | O_CLOEXEC));
+  return opened.isOpen() ? syncDirectoryAt(opened.get()) : lastSystemError();
+}
+
+std::error_code syncDirectoryAt(int directory) {
+  const Descriptor listed(::openat(directory, ".", O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+  if (!listed.isOpen() || ::fsync(listed.get()) != 0) return lastSystemError();
   return {};
 }
 

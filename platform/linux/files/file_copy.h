@@ -21,8 +21,13 @@ struct CopyOutcome {
 /// not be copied whole leaves nothing behind; a directory leaves what could be copied. A source that is no
 /// file, link or directory is an error; a target inside the source does not contain itself.
 [[nodiscard]] CopyOutcome copyTree(const std::string& source, const std::string& target, CopyOptions options);
+/// The same with the target relative to an open directory.
+[[nodiscard]] CopyOutcome copyTreeTo(int directory, const std::string& source, const std::string& target,
+                                     CopyOptions options);
 
 /// Brings a directory's own entries to the disk.
 [[nodiscard]] std::error_code syncDirectory(const std::string& directory);
+/// The handle may be one to look things up by.
+[[nodiscard]] std::error_code syncDirectoryAt(int directory);
 
 }  // namespace zal

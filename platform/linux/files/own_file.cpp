@@ -21,15 +21,17 @@ bool isAsItShouldBe(const Descriptor& file) {
 
 }  // namespace
 
-Descriptor openOwnFile(const std::string& path, mode_t mode) {
-  Descriptor present(::open(path.c_str(), kWithoutWaiting));
+Descriptor openOwnFile(const std::string& path, mode_t mode) { return openOwnFileAt(AT_FDCWD, path, mode); }
+
+Descriptor openOwnFileAt(int directory, const std::string& path, mode_t mode) {
+  Descriptor present(::openat(directory, path.c_str(), kWithoutWaiting));
   if (present.isOpen() && isAsItShouldBe(present)) return present;
-  if (::unlink(path.c_str()) != 0 && errno != ENOENT) {
+  if (::unlinkat(directory, path.c_str(), 0) != 0 && errno != ENOENT) {
     // Some kernels say EPERM and some EISDIR of a directory.
     if (errno == EISDIR) errno = EEXIST;
     return {};
   }
-  return Descriptor(::open(path.c_str(), kWithoutWaiting | O_CREAT | O_EXCL, mode));
+  return Descriptor(::openat(directory, path.c_str(), kWithoutWaiting | O_CREAT | O_EXCL, mode));
 }
 
 }  // namespace zal

@@ -15,5 +15,7 @@ namespace zal {
 /// In a sticky directory nobody else can change any of this afterwards. Any thread. Not open: errno says why;
 /// EEXIST or EPERM when what somebody else put there cannot be removed.
 [[nodiscard]] Descriptor openOwnFile(const std::string& path, mode_t mode);
+/// The same with the path relative to an open directory.
+[[nodiscard]] Descriptor openOwnFileAt(int directory, const std::string& path, mode_t mode);
 
 }  // namespace zal

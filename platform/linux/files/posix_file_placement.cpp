@@ -7,6 +7,7 @@
 #include <filesystem>
 #include <utility>
 
+#include "platform/linux/files/directory_tree.h"
 #include "platform/linux/files/file_copy.h"
 #include "platform/linux/files/own_file.h"
 #include "platform/linux/files/private_directory.h"
@@ -19,41 +20,32 @@ namespace {
 
 constexpr int kMostSaveNames = 10'000;
 
-std::string parentOf(const std::string& path) {
-  const std::string parent = std::filesystem::path(path).parent_path().string();
-  return parent.empty() ? "." : parent;
-}
-
 /// Not through a link.
 bool isFile(const std::string& path) {
   std::error_code error;
   return std::filesystem::is_regular_file(std::filesystem::symlink_status(path, error));
 }
 
-void removeTree(const std::string& path) {
-  std::error_code ignored;  // the error that led here is the one to report
-  std::filesystem::remove_all(path, ignored);
-}
-
 /// Copies to a hidden name first, so that the target's own name never shows a half file.
-std::error_code copyIntoPlace(const std::string& source, const std::string& target) {
-  const std::string directory = parentOf(target);
-  const std::string temporary = directory + "/.zal-" + randomName();
-  const CopyOutcome copied = copyTree(source, temporary, {.sync = true});
+std::error_code copyIntoPlace(const std::string& source, const RootedPlace& target) {
+  const int directory = target.directory.get();
+  const std::string temporary = ".zal-" + randomName();
+  const CopyOutcome copied = copyTreeTo(directory, source, temporary, {.sync = true});
   std::error_code error = copied.error;
   if (!error && copied.skipped > 0) error = std::make_error_code(std::errc::operation_not_supported);
-  if (!error) error = renameNoReplace(temporary, target);
+  if (!error) error = renameNoReplaceAt(directory, temporary, directory, target.name);
   if (error) {
-    removeTree(temporary);
+    removeTreeAt(directory, temporary);
     return error;
   }
-  return syncDirectory(directory);
+  return syncDirectoryAt(directory);
 }
 
 }  // namespace
 
-PosixFilePlacement::PosixFilePlacement(std::string homeDirectory, std::string temporaryArea)
-    : _home(std::move(homeDirectory)), _temporaryArea(std::move(temporaryArea)) {}
+PosixFilePlacement::PosixFilePlacement(std::string homeDirectory, std::string temporaryArea,
+                                       const std::vector<std::string>& roots)
+    : _home(std::move(homeDirectory)), _temporaryArea(std::move(temporaryArea)), _paths(roots, _home) {}
 
 std::string PosixFilePlacement::randomTemporaryPath(std::string_view suffix) {
   return _temporaryArea.path() + '/' + randomName() + std::string(suffix);
@@ -76,19 +68,23 @@ std::optional<std::string> PosixFilePlacement::uniqueSavePath(const std::string&
 }
 
 std::error_code PosixFilePlacement::link(const std::string& source, const std::string& target) {
-  if (::linkat(AT_FDCWD, source.c_str(), AT_FDCWD, target.c_str(), 0) == 0) return {};
+  const RootedPlace to = _paths.placeOf(target);
+  if (to.error) return to.error;
+  if (::linkat(AT_FDCWD, source.c_str(), to.directory.get(), to.name.c_str(), 0) == 0) return {};
   const std::error_code error = lastSystemError();
   if (error != std::errc::cross_device_link || !isFile(source)) return error;
-  return copyTree(source, target, {}).error;
+  return copyTreeTo(to.directory.get(), source, to.name, {}).error;
 }
 
 std::error_code PosixFilePlacement::move(const std::string& source, const std::string& target) {
-  std::error_code error = renameNoReplace(source, target);
+  const RootedPlace to = _paths.placeOf(target);
+  if (to.error) return to.error;
+  std::error_code error = renameNoReplaceAt(AT_FDCWD, source, to.directory.get(), to.name);
   if (error != std::errc::cross_device_link) return error;
   // Across file systems the kernel says so before it looks at the target.
-  if (nameIsTaken(target, error)) return std::make_error_code(std::errc::file_exists);
+  if (nameIsTakenAt(to.directory.get(), to.name, error)) return std::make_error_code(std::errc::file_exists);
   if (error) return error;
-  error = copyIntoPlace(source, target);
+  error = copyIntoPlace(source, to);
   if (!error) std::filesystem::remove_all(source, error);
   return error;
 }
@@ -96,12 +92,16 @@ std::error_code PosixFilePlacement::move(const std::string& source, const std::s
 std::error_code PosixFilePlacement::prepareOutput(const std::string& path) {
   // The mode that a shell gives its outputs.
   constexpr mode_t kMode = 0666;
-  if (openOwnFile(path, kMode).isOpen() || errno == ENOENT || errno == ENOTDIR) return {};
-  return lastSystemError();
+  const RootedPlace to = _paths.placeOf(path);
+  std::error_code error = to.error;
+  if (!error && !openOwnFileAt(to.directory.get(), to.name, kMode).isOpen()) error = lastSystemError();
+  const bool isNowhere = error == std::errc::no_such_file_or_directory || error == std::errc::not_a_directory;
+  return isNowhere ? std::error_code{} : error;
 }
 
 std::error_code PosixFilePlacement::copy(const std::string& source, const std::string& target) {
-  return copyTree(source, target, {}).error;
+  const RootedPlace to = _paths.placeOf(target);
+  return to.error ? to.error : copyTreeTo(to.directory.get(), source, to.name, {}).error;
 }
 
 }  // namespace zal

@@ -1,13 +1,18 @@
 #pragma once
 
 #include <string>
+#include <vector>
 
 #include "platform/file_placement.h"
+#include "platform/linux/files/rooted_paths.h"
 #include "platform/linux/files/temporary_area.h"
 
 namespace zal {
 
 /// Places files with the kernel's own means. Any thread.
+///
+/// What is written lies below one of the roots, and no symbolic link on the way to it from there is followed:
+/// that is an error, too_many_symbolic_link_levels. Sources may lie anywhere.
 ///
 /// What a directory copy cannot take along, it leaves out and reports the first reason; pipes,
 /// sockets and devices are left out without an error. A move across file systems takes all or
@@ -17,7 +22,9 @@ namespace zal {
 class PosixFilePlacement : public FilePlacement {
  public:
   /// The temporary area need not exist: it is made, for this user alone, when first needed.
-  PosixFilePlacement(std::string homeDirectory, std::string temporaryArea);
+  /// Roots as RootedPaths takes them; without any, links on the way are followed.
+  PosixFilePlacement(std::string homeDirectory, std::string temporaryArea,
+                     const std::vector<std::string>& roots = {});
 
   [[nodiscard]] std::string homeDirectory() const override { return _home; }
   /// In TemporaryArea::path().
@@ -32,6 +39,7 @@ class PosixFilePlacement : public FilePlacement {
  private:
   const std::string _home;
   TemporaryArea _temporaryArea;
+  const RootedPaths _paths;
 };
 
 }  // namespace zal

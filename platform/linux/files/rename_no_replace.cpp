@@ -12,29 +12,42 @@
 namespace zal {
 
 std::error_code renameNoReplace(const std::string& source, const std::string& target) {
-  if (::renameat2(AT_FDCWD, source.c_str(), AT_FDCWD, target.c_str(), RENAME_NOREPLACE) == 0) return {};
-  if (errno == EINVAL || errno == ENOSYS) return renameNoReplaceInSteps(source, target);
+  return renameNoReplaceAt(AT_FDCWD, source, AT_FDCWD, target);
+}
+
+std::error_code renameNoReplaceAt(int sourceDirectory, const std::string& source, int targetDirectory,
+                                  const std::string& target) {
+  if (::renameat2(sourceDirectory, source.c_str(), targetDirectory, target.c_str(), RENAME_NOREPLACE) == 0)
+    return {};
+  if (errno == EINVAL || errno == ENOSYS)
+    return renameNoReplaceInSteps(sourceDirectory, source, targetDirectory, target);
   return lastSystemError();
 }
 
-std::error_code renameNoReplaceInSteps(const std::string& source, const std::string& target) {
-  if (::linkat(AT_FDCWD, source.c_str(), AT_FDCWD, target.c_str(), 0) == 0) {
-    if (::unlink(source.c_str()) == 0) return {};
+std::error_code renameNoReplaceInSteps(int sourceDirectory, const std::string& source, int targetDirectory,
+                                       const std::string& target) {
+  if (::linkat(sourceDirectory, source.c_str(), targetDirectory, target.c_str(), 0) == 0) {
+    if (::unlinkat(sourceDirectory, source.c_str(), 0) == 0) return {};
     const std::error_code error = lastSystemError();
-    ::unlink(target.c_str());
+    ::unlinkat(targetDirectory, target.c_str(), 0);
     return error;
   }
   if (errno != EPERM && errno != EOPNOTSUPP && errno != EMLINK) return lastSystemError();
   std::error_code error;
-  if (nameIsTaken(target, error)) return std::make_error_code(std::errc::file_exists);
+  if (nameIsTakenAt(targetDirectory, target, error)) return std::make_error_code(std::errc::file_exists);
   if (error) return error;
-  return ::rename(source.c_str(), target.c_str()) == 0 ? std::error_code{} : lastSystemError();
+  if (::renameat(sourceDirectory, source.c_str(), targetDirectory, target.c_str()) == 0) return {};
+  return lastSystemError();
 }
 
 bool nameIsTaken(const std::string& path, std::error_code& error) {
+  return nameIsTakenAt(AT_FDCWD, path, error);
+}
+
+bool nameIsTakenAt(int directory, const std::string& path, std::error_code& error) {
   struct stat status {};
   error.clear();
-  if (::lstat(path.c_str(), &status) == 0) return true;
+  if (::fstatat(directory, path.c_str(), &status, AT_SYMLINK_NOFOLLOW) == 0) return true;
   if (errno != ENOENT && errno != ENOTDIR) error = lastSystemError();
   return false;
 }

@@ -1,5 +1,6 @@
 #include "platform/linux/files/posix_file_placement.h"
 
+#include <fcntl.h>
 #include <gtest/gtest.h>
 #include <sys/stat.h>
 
@@ -40,6 +41,46 @@ class PosixFilePlacementTest : public ::testing::Test {
 };
 
 TEST_F(PosixFilePlacementTest, SaysWhereHomeIs) { EXPECT_EQ(files.homeDirectory(), directory / "home"); }
+
+// Roots
+
+class PlacementBelowRootsTest : public PosixFilePlacementTest {
+ protected:
+  PlacementBelowRootsTest() {
+    fs::create_directories(directory / "root/real");
+    fs::create_directory(directory / "elsewhere");
+    fs::create_directory_symlink(directory / "elsewhere", directory / "root/planted");
+    writeFile(directory / "file", "content");
+  }
+  void expectRefused(const std::error_code& error) const {
+    EXPECT_EQ(error, std::errc::too_many_symbolic_link_levels);
+    EXPECT_EQ(listTree(directory / "elsewhere"), "");
+    EXPECT_EQ(readFile(directory / "file"), "content");
+  }
+  const std::string behindTheLink = directory / "root/planted/file";
+  PosixFilePlacement rooted{directory / "home", directory / "temporary", {directory / "root"}};
+};
+
+TEST_F(PlacementBelowRootsTest, NothingIsPlacedThroughALinkBelowARoot) {
+  expectRefused(rooted.link(directory / "file", behindTheLink));
+  expectRefused(rooted.move(directory / "file", behindTheLink));
+  expectRefused(rooted.copy(directory / "file", behindTheLink));
+  expectRefused(rooted.copy(directory / "root/real", behindTheLink));
+  expectRefused(rooted.prepareOutput(behindTheLink));
+}
+
+TEST_F(PlacementBelowRootsTest, AnotherUsersFileBehindALinkIsNotReplacedByAnOutput) {
+  writeFile(directory / "elsewhere/file", "old");
+  EXPECT_EQ(rooted.prepareOutput(behindTheLink), std::errc::too_many_symbolic_link_levels);
+  EXPECT_EQ(readFile(directory / "elsewhere/file"), "old");
+}
+
+TEST_F(PlacementBelowRootsTest, SourcesMayBeReachedThroughLinks) {
+  writeFile(directory / "elsewhere/source", "content");
+  EXPECT_FALSE(rooted.link(directory / "root/planted/source", directory / "root/real/a"));
+  EXPECT_FALSE(rooted.move(directory / "root/planted/source", directory / "root/real/b"));
+  EXPECT_EQ(listTree(directory / "root/real"), "a\nb\n");
+}
 
 // Links
 
@@ -161,7 +202,7 @@ TEST_F(PosixFilePlacementTest, AFileSystemWithoutSuchARenameGetsTheSameInSteps) 
   writeFile(directory / "dir/below", "content");
   fs::create_directory(directory / "empty");
   const auto inSteps = [&](const std::string& source, const std::string& target) {
-    return renameNoReplaceInSteps(directory / source, directory / target);
+    return renameNoReplaceInSteps(AT_FDCWD, directory / source, AT_FDCWD, directory / target);
   };
   EXPECT_EQ(inSteps("file", "taken"), std::errc::file_exists);
   EXPECT_EQ(inSteps("dir", "empty"), std::errc::file_exists);
