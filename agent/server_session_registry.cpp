@@ -6,7 +6,6 @@
 #include "agent/session_directory.h"
 #include "agent/session_type_key.h"
 #include "agent/zal_logging_agent_server.h"
-#include "platform/open_directories.h"
 
 namespace zal {
 namespace {
@@ -106,7 +105,7 @@ void ZalLoggingAgentServer::forceNetworkDump() {
       _sessionServices, _platform.clock.wallNow(),
       _platform.configuration.roots.DiagnosticReportRoot + "/Vistel", false);
   // One that cannot be made is the dump's own affair: it says what it could not write.
-  createDirectoriesWithMode0777(directory);
+  _platform.files.makeDirectories(directory);
   _hooks.ForceNetworkDump(directory, true);
   _notePoorNetworkConditions();
   _noteActivity();

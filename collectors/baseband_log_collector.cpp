@@ -7,7 +7,6 @@
 #include "collectors/name_timestamp.h"
 #include "platform/agent_log.h"
 #include "platform/configuration.h"
-#include "platform/open_directories.h"
 
 namespace zal {
 namespace {
@@ -34,7 +33,7 @@ void LogCollectors::CollectBasebandLogs(const std::string& dumpDirectory, WallTi
   const std::string destination = dumpDirectory + "/Baseband";
   walkLogs(_services.log, "baseband logs", [&] {
     const auto names = sortedNames(source, _services.placement);
-    createDirectoriesWithMode0777(destination);
+    _services.files.MakeDirectory(destination);
     _services.log.notice("Processing baseband logs");
     const auto chosen = chosenSet(names, dumpLimit(startTime), _services.clock);
     if (!chosen) return;

@@ -6,7 +6,6 @@
 #include "collectors/gathering_witness.h"
 #include "platform/agent_log.h"
 #include "platform/file_placement.h"
-#include "platform/open_directories.h"
 #include "platform/standard_path.h"
 
 namespace zal {
@@ -15,11 +14,6 @@ namespace {
 bool fileExists(const std::string& path) {
   std::error_code error;
   return std::filesystem::exists(path, error);
-}
-
-void makeParent(const std::string& target) {
-  const std::string parent = std::filesystem::path(target).parent_path().string();
-  if (!fileExists(parent)) createDirectoriesWithMode0777(parent);
 }
 
 std::string nameOf(const std::string& path) { return std::filesystem::path(path).filename().string(); }
@@ -51,6 +45,14 @@ void FileCollector::_tell(const std::string& source, const std::string& director
                      isThere ? "" : error.message());
 }
 
+std::error_code FileCollector::MakeDirectory(const std::string& directory) {
+  return _files.makeDirectories(directory);
+}
+
+void FileCollector::_makeParent(const std::string& target) {
+  MakeDirectory(std::filesystem::path(target).parent_path().string());
+}
+
 std::string FileCollector::_source(const std::string& path, const std::string& directory) const {
   std::string resolved = _resolved(path);
   if (!fileExists(resolved)) {
@@ -69,7 +71,7 @@ bool FileCollector::LinkFileIntoDirectory(const std::string& source, const std::
   const std::string resolved = _source(source, directory);
   if (resolved.empty()) return false;
   const std::string target = directory + "/" + nameOf(resolved) + suffix;
-  makeParent(target);
+  _makeParent(target);
   const std::error_code error = _files.link(resolved, target);
   _tell(resolved, directory, error);
   return !error;
@@ -112,7 +114,7 @@ bool FileCollector::MoveFileIntoDirectory(const std::string& source, const std::
   if (name.empty()) return false;  // "/" has no name to go under
   const std::string wanted = directory + "/" + name + suffix;
   const auto target = _files.uniqueSavePath(wanted);
-  makeParent(target.value_or(wanted));
+  _makeParent(target.value_or(wanted));
   if (target) {
     const std::error_code error = _files.move(resolved, *target);
     _tell(resolved, directory, error);

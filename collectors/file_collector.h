@@ -43,6 +43,9 @@ class FileCollector {
   bool MoveFileIntoDirectory(const std::string& source, const std::string& directory,
                              const std::string& suffix);
 
+  /// Makes the directory with all missing parents, with mode 0777. Returned: why it is not there.
+  std::error_code MakeDirectory(const std::string& directory);
+
   /// Copies files and directories of a directory into another, which must exist; hidden ones and
   /// compressed older logs stay out, those of "beacond" excepted. Failures are logged; after the
   /// first, every later entry is logged as well, with the error that came last.
@@ -56,6 +59,7 @@ class FileCollector {
   /// The source as a path without links; empty, and told, when there is nothing to take.
   [[nodiscard]] std::string _source(const std::string& path, const std::string& directory) const;
   bool _linkEntry(const std::string& sourceDirectory, const std::string& name, const std::string& directory);
+  void _makeParent(const std::string& target);
   void _copy(const std::string& source, const std::string& target, std::error_code& errorSlot);
   void _tell(const std::string& source, const std::string& directory, SourceOutcome outcome) const;
   /// A name that is taken already counts as no failure: what lies there is the same source, or came first.

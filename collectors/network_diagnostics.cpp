@@ -10,7 +10,6 @@
 #include "platform/agent_log.h"
 #include "platform/configuration.h"
 #include "platform/device_support.h"
-#include "platform/open_directories.h"
 #include "platform/preference_store.h"
 #include "platform/system_shell.h"
 #include "platform/work_queue.h"
@@ -42,10 +41,10 @@ struct DumpDirectories {
 };
 
 // What is aimed at a directory that cannot be made is lost, so the log says why.
-void makeDirectories(const DumpDirectories& paths, AgentLog& log) {
+void makeDirectories(const DumpDirectories& paths, FileCollector& files, AgentLog& log) {
   for (const std::string& path :
        {paths.top, paths.other, paths.cellular, paths.wifi, paths.statistics, paths.console}) {
-    if (const std::error_code error = createDirectoriesWithMode0777(path)) {
+    if (const std::error_code error = files.MakeDirectory(path)) {
       log.warning("Failed to make the directory " + path + ": " + error.message());
     }
   }
@@ -102,7 +101,7 @@ void NetworkDiagnostics::ForceNetworkDump(const std::string& directory, bool inc
 void NetworkDiagnostics::CollectNetworkLogs(const std::string& directory, bool includePing) {
   _services.log.notice("**** Generating network logs ****");
   const DumpDirectories paths(directory);
-  makeDirectories(paths, _services.log);
+  makeDirectories(paths, _services.files, _services.log);
   _runCommands(CommandGroup::networkConsole, paths.console);
   CollectWiFiFiles(paths.wifi);
   _services.cellular.WriteCellularState(paths.cellular);

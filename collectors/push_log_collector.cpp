@@ -4,7 +4,6 @@
 #include "collectors/file_collector.h"
 #include "collectors/log_collectors.h"
 #include "platform/configuration.h"
-#include "platform/open_directories.h"
 
 namespace zal {
 namespace {
@@ -34,7 +33,7 @@ void LogCollectors::LinkFullPacketCapture(const std::string& destination) {
 void LogCollectors::DumpPushServiceState(const std::string& destination) {
   const std::string& source = _services.configuration.collection.pushLogDirectory;
   if (destination.empty() || source.empty()) return;
-  createDirectoriesWithMode0777(destination);
+  _services.files.MakeDirectory(destination);
   _services.files.CopyDirectoryContents(source, destination);
   _services.table.runInBackground(_services.commands, CommandGroup::pushService, destination);
 }

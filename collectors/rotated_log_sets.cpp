@@ -1,15 +1,12 @@
 #include "collectors/rotated_log_sets.h"
 
-#include <filesystem>
 #include <span>
 #include <string_view>
-#include <system_error>
 
 #include "collectors/file_collector.h"
 #include "collectors/plain_name.h"
 #include "platform/agent_log.h"
 #include "platform/directory_roots.h"
-#include "platform/open_directories.h"
 
 namespace zal {
 namespace {
@@ -37,8 +34,7 @@ void linkFiles(FileCollector& collector, const DirectoryRoots& roots, const std:
 void LinkRotatedLogSets(FileCollector& collector, const DirectoryRoots& roots, AgentLog& log,
                         const std::vector<std::string>& names, const std::string& destination,
                         bool includeAllGenerations) {
-  std::error_code error;
-  if (!std::filesystem::exists(destination, error)) createDirectoriesWithMode0777(destination);
+  collector.MakeDirectory(destination);
   for (const auto& name : names) {
     if (!isPlainName(name)) {
       log.warning("Refused the log set \"" + name + "\": its name leads out of the log directory");

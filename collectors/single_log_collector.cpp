@@ -1,7 +1,6 @@
 #include "collectors/file_collector.h"
 #include "collectors/log_collectors.h"
 #include "platform/configuration.h"
-#include "platform/open_directories.h"
 
 namespace zal {
 
@@ -14,7 +13,7 @@ void LogCollectors::CopyDiagnosticAndSyncLogs(const std::string& destination) {
   const DirectoryRoots& roots = _services.configuration.roots;
   for (const std::string& source :
        {roots.MobileLogRoot + "/Cirrel", roots.DiagnosticReportRoot + "/DiagnosticLogs"}) {
-    createDirectoriesWithMode0777(destination);
+    _services.files.MakeDirectory(destination);
     _services.files.CopyDirectoryContents(source, destination);
   }
 }

@@ -14,7 +14,6 @@
 #include "dump/problem_prompt.h"
 #include "dump/service_collection.h"
 #include "dump/user_info.h"
-#include "platform/open_directories.h"
 #include "platform/platform.h"
 #include "platform/standard_path.h"
 #include "session/vistel_session.h"
@@ -83,7 +82,7 @@ std::string ActionDispatcher::_makeSessionDirectory() {
   std::string directory = ZalLoggingAgentVistelSession::logPathForDate(
       _services.session, _services.platform.clock.wallNow(), _reportRoot() + "/Vistel", false);
   // One that cannot be made stays empty: the collectors pass over what they cannot write.
-  createDirectoriesWithMode0777(directory);
+  _services.platform.files.makeDirectories(directory);
   return directory;
 }
 

@@ -122,7 +122,7 @@ std::string logRoot(Platform& platform) {
 
 void finish(const Services& services, const ClosingWork& work, const std::string& archive) {
   Platform& platform = services.platform;
-  linkLatestArchive(logRoot(platform), work.service, archive, platform.agentLog);
+  linkLatestArchive(platform.files, logRoot(platform), work.service, archive, platform.agentLog);
   std::error_code error;
   if (std::filesystem::exists(archive, error)) {
     work.record->done(archive);
@@ -241,10 +241,9 @@ bool holdsNewer(const std::string& directory, const std::string& archive) {
 /// The archive had its name before the agent ended: it was whole. What was left to do then is done now.
 void tidyUpAfter(const CutOffDump& dump, const std::string& archive, Platform& platform) {
   platform.queues.global(QueuePriority::standard).async([dump, archive, &platform] {
-    std::error_code ignored;
-    if (!holdsNewer(dump.directory, archive)) std::filesystem::remove_all(dump.directory, ignored);
+    if (!holdsNewer(dump.directory, archive)) platform.files.remove(dump.directory);
     platform.queues.main().async([service = dump.service, archive, &platform] {
-      linkArchiveOfEarlier(logRoot(platform), service, archive, platform.agentLog);
+      linkArchiveOfEarlier(platform.files, logRoot(platform), service, archive, platform.agentLog);
     });
   });
 }

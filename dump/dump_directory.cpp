@@ -59,11 +59,13 @@ std::optional<std::string> dumpDirectoryPath(const std::string& reportRoot, cons
     ending += " (" + withoutControls(utf16Prefix(*description, kDescriptionInName)) + ")";
   }
   const std::string joined = reportRoot + "/" + fittingPath(type) + "/" + namedAfter(type, ending);
-  std::string path = resolveAndStandardize(joined, home);
+  std::string path = standardizeBelowRoot(joined, reportRoot, home);
   const std::string root = resolveAndStandardize(reportRoot, home);
   if (!path.starts_with(root == "/" ? root : root + "/") || path.size() > kLongestDumpPath) {
     return std::nullopt;
   }
+  // What differs is a link below the root.
+  if (path != resolveAndStandardize(path, home)) return std::nullopt;
   return path;
 }
 

@@ -20,7 +20,8 @@ inline constexpr std::size_t kLongestDumpPath = 3500;
 /// resolved and standardised; the last part only with a description that is more than white space.
 /// Slashes in type and description make directories; control characters become "_", and names that
 /// no file system takes are cut at a character's border, the time text excepted. Nothing when the
-/// path would not lie below the root or is too long. A leading "~" of the root is the home.
+/// path would not lie below the root, when a symbolic link stands in it there, or when it is too long. A
+/// leading "~" of the root is the home.
 [[nodiscard]] std::optional<std::string> dumpDirectoryPath(const std::string& reportRoot,
                                                            const std::string& home,
                                                            const DumpRequest& request,

@@ -1,12 +1,26 @@
 #include "dump/dump_texts.h"
 
+#include <cerrno>
 #include <cstdio>
-#include <filesystem>
 #include <system_error>
 
-#include "platform/fresh_file.h"
+#include "platform/agent_log.h"
+#include "platform/file_placement.h"
 
 namespace zal {
+namespace {
+
+std::error_code writeFresh(FilePlacement& files, const std::string& path, std::string_view text) {
+  const auto failure = [] { return std::error_code(errno != 0 ? errno : EIO, std::generic_category()); };
+  std::FILE* const file = files.openFresh(path);
+  if (file == nullptr) return failure();
+  std::error_code error;
+  if (std::fwrite(text.data(), 1, text.size(), file) != text.size()) error = failure();
+  if (std::fclose(file) != 0 && !error) error = failure();
+  return error;
+}
+
+}  // namespace
 
 std::string deviceInfoText(std::string_view deviceName, std::string_view deviceDescription) {
   std::string text;
@@ -15,16 +29,13 @@ std::string deviceInfoText(std::string_view deviceName, std::string_view deviceD
   return text;
 }
 
-void writeWholeFile(const std::string& path, std::string_view text) {
+void writeWholeFile(FilePlacement& files, AgentLog& log, const std::string& path, std::string_view text) {
   const std::string unfinished = path + ".unfinished";
-  std::FILE* const file = openFreshFile(unfinished);
-  if (file == nullptr) return;
-  const bool isWhole = std::fwrite(text.data(), 1, text.size(), file) == text.size();
-  const bool isClosed = std::fclose(file) == 0;
-  std::error_code error;
-  if (!isWhole || !isClosed) error = std::make_error_code(std::errc::io_error);
-  if (!error) std::filesystem::rename(unfinished, path, error);
-  if (error) std::filesystem::remove(unfinished, error);
+  std::error_code error = writeFresh(files, unfinished, text);
+  if (!error) error = files.replace(unfinished, path);
+  if (!error) return;
+  log.warning("Could not write " + path + ": " + error.message());
+  files.remove(unfinished);
 }
 
 }  // namespace zal

@@ -44,12 +44,10 @@ std::string temporarySuffix(std::string name) {
 }
 
 /// Once more where it fails: a signal or a moment without descriptors is enough for that.
-void removeTree(const std::string& path) {
+void removeTree(FilePlacement& files, const std::string& path) {
   constexpr int kMostTimes = 3;
-  std::error_code error;
   for (int time = 0; time < kMostTimes; ++time) {
-    std::filesystem::remove_all(path, error);
-    if (!error) return;
+    if (!files.remove(path)) return;
   }
 }
 
@@ -125,7 +123,7 @@ void _LirraLogCompressor::_settle(FileCopierJob& job, const std::string& tempora
                                 "); for a day it is kept as \"" + temporary + '"');
         }
         // What is in no archive stays. Without a slash at the end: with one, a link would be followed.
-        if (!error || isKept) removeTree(withoutEndSlashes(job.identifier()));
+        if (!error || isKept) removeTree(_services.files, withoutEndSlashes(job.identifier()));
         _services.queues.main().async([this, &job, completion = std::move(completion)] {
           const auto released = _take(job);
           if (completion) completion();

@@ -35,9 +35,9 @@ void LogDump::run(const DumpRequest& request, const std::optional<std::string>& 
   const auto directory =
       dumpDirectoryPath(roots.DiagnosticReportRoot, platform.files.homeDirectory(), request, reason);
   if (!directory) {
-    platform.agentLog.warning("Refused a dump of \"" +
-                              printable(utf16Prefix(request.sessionType, kTypeInWarning)) +
-                              "\": its directory would not lie below the report root");
+    platform.agentLog.warning(
+        "Refused a dump of \"" + printable(utf16Prefix(request.sessionType, kTypeInWarning)) +
+        "\": its directory would not lie below the report root, or only through a link");
     _complete(request, reason, std::nullopt, server);
     return;
   }
@@ -58,8 +58,8 @@ void LogDump::run(const DumpRequest& request, const std::optional<std::string>& 
                                                               _services.platform.agentLog, directory,
                                                               std::nullopt, complete);
                                           });
-  if (reason) writeWholeFile(*directory + "/Reason.txt", *reason);
-  writeWholeFile(*directory + "/Device_Info.txt", _deviceInfo());
+  if (reason) writeWholeFile(platform.files, platform.agentLog, *directory + "/Reason.txt", *reason);
+  writeWholeFile(platform.files, platform.agentLog, *directory + "/Device_Info.txt", _deviceInfo());
 }
 
 std::string LogDump::_deviceInfo() {

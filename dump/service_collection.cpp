@@ -8,7 +8,6 @@
 #include "collectors/rotated_log_sets.h"
 #include "dump/disk_budget_keeper.h"
 #include "dump/planned_steps.h"
-#include "platform/open_directories.h"
 #include "platform/platform.h"
 #include "platform/standard_path.h"
 #include "session/collected_files.h"
@@ -35,10 +34,10 @@ struct Context {
   }
   std::string make(std::string_view name) const {
     std::string directory = in(name);
-    createDirectoriesWithMode0777(directory);
+    platform.files.makeDirectories(directory);
     return directory;
   }
-  void makeDestination() const { createDirectoriesWithMode0777(request.destination); }
+  void makeDestination() const { platform.files.makeDirectories(request.destination); }
   void linkSets(const std::vector<std::string>& names, const std::string& directory,
                 bool includeAllGenerations = false) const {
     LinkRotatedLogSets(collectors.files, roots(), platform.agentLog, names, directory, includeAllGenerations);

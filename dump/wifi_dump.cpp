@@ -4,7 +4,6 @@
 
 #include "dump/collection_record.h"
 #include "platform/main_thread_watch.h"
-#include "platform/open_directories.h"
 #include "platform/platform.h"
 #include "platform/standard_path.h"
 
@@ -26,9 +25,13 @@ bool waitInSteadyTime(std::binary_semaphore& signal, std::chrono::seconds limit)
 
 void takeWifiDump(Platform& platform, const std::string& service, const std::optional<std::string>& reason,
                   const SignalWait& wait, CollectionRecord& record) {
-  const std::string directory = resolveAndStandardize(platform.configuration.roots.SystemReportRoot + "/WiFi",
-                                                      platform.files.homeDirectory());
-  createDirectoriesWithMode0777(directory);
+  const std::string& root = platform.configuration.roots.SystemReportRoot;
+  const std::string directory = standardizeBelowRoot(root + "/WiFi", root, platform.files.homeDirectory());
+  // The service would follow a link there.
+  if (const std::error_code error = platform.files.makeDirectories(directory)) {
+    platform.agentLog.warning("No Wi-Fi dump is taken into " + directory + ": " + error.message());
+    return record.stepGives(PartState::failed, error.message());
+  }
   const auto outcome = std::make_shared<Outcome>();
   platform.wifiDiagnostics.takeDump(directory, reason.value_or("WiFi log dump for service: " + service),
                                     [outcome, &log = platform.agentLog](int result) {

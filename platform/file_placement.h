@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cstdio>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -7,7 +8,9 @@
 
 namespace zal {
 
-/// What placing files needs from the host. Any thread; may wait for a disk. Paths are plain UTF-8.
+/// What placing files needs from the host. Any thread; may wait for a disk. Paths are plain UTF-8. What is
+/// made, replaced or removed below one of the configured roots is reached from there through directories
+/// alone: a symbolic link on the way is an error, and nothing happens behind it.
 class FilePlacement {
  public:
   virtual ~FilePlacement() = default;
@@ -32,6 +35,20 @@ class FilePlacement {
   /// Copies a file, or a directory with all below it, with modes and modification times; symbolic
   /// links as links. An existing target is an error.
   virtual std::error_code copy(const std::string& source, const std::string& target) = 0;
+  /// Makes the directory with all missing parents. Each one that was made gets mode 0777 whatever the
+  /// umask says, for several users' daemons write there; one that existed keeps its mode. Returned: no
+  /// error when the directory is there at the end.
+  virtual std::error_code makeDirectories(const std::string& path) = 0;
+  /// Opens a new file for writing, for names that others know beforehand in directories that they write
+  /// to. The file or link that had the name loses it; what a link leads to stays as it is. A device is
+  /// opened as it is. The caller closes it. nullptr: errno says why.
+  [[nodiscard]] virtual std::FILE* openFresh(const std::string& path) = 0;
+  /// Rename onto whatever file or link has the name; both on one file system.
+  virtual std::error_code replace(const std::string& source, const std::string& target) = 0;
+  /// Makes a symbolic link to the text; an existing name is an error.
+  virtual std::error_code linkSymbolically(const std::string& text, const std::string& path) = 0;
+  /// Removes the file or link, or the directory with all below it. That there is none is no error.
+  virtual std::error_code remove(const std::string& path) = 0;
 };
 
 }  // namespace zal

@@ -12,4 +12,9 @@ namespace zal {
 /// Any thread; asks the file system.
 [[nodiscard]] std::string resolveAndStandardize(std::string_view path, std::string_view home);
 
+/// The same for a path below a root, with only the root's own links followed: what stands below it is text
+/// alone, so that a link there shows when the path is used. One that is not below the root is resolved whole.
+[[nodiscard]] std::string standardizeBelowRoot(std::string_view path, std::string_view root,
+                                               std::string_view home);
+
 }  // namespace zal

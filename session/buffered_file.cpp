@@ -5,7 +5,7 @@
 
 #include <utility>
 
-#include "platform/fresh_file.h"
+#include "platform/file_placement.h"
 
 namespace zal {
 
@@ -16,7 +16,7 @@ constexpr std::size_t kBufferSize = 256U * 1024U;
 constexpr std::size_t kLargePiece = 64U * 1024U;
 }  // namespace
 
-BufferedFile::BufferedFile(const std::string& path) : _file(openFreshFile(path)) {
+BufferedFile::BufferedFile(FilePlacement& files, const std::string& path) : _file(files.openFresh(path)) {
   if (_file == nullptr) {
     _error = errno;
     return;

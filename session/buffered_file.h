@@ -8,11 +8,13 @@
 
 namespace zal {
 
+class FilePlacement;
+
 /// A fresh file that takes pieces of any size in few writes. After the first failure it takes nothing more.
 /// Any thread, one at a time.
 class BufferedFile {
  public:
-  explicit BufferedFile(const std::string& path);
+  BufferedFile(FilePlacement& files, const std::string& path);
   BufferedFile(const BufferedFile&) = delete;
   BufferedFile& operator=(const BufferedFile&) = delete;
   ~BufferedFile() { close(); }

@@ -5,7 +5,6 @@
 
 #include "collectors/file_collector.h"
 #include "platform/agent_log.h"
-#include "platform/open_directories.h"
 
 namespace zal {
 
@@ -52,7 +51,10 @@ void placeCollectedFiles(const FilesByCategory& files, const std::string& direct
     }
     const std::string destination = directory + "/" + *contained;
     log.notice("category:" + destination + " files=" + fileSetText(paths));
-    if (createDirectoriesWithMode0777(destination)) continue;
+    if (const std::error_code error = collector.MakeDirectory(destination)) {
+      log.warning("No files are moved into " + destination + ": " + error.message());
+      continue;
+    }
     for (const std::string& path : paths) collector.MoveFileIntoDirectory(path, destination, "");
   }
 }

@@ -31,8 +31,8 @@ std::string_view writtenPart(std::string_view line, bool isPlain) {
   return {line.data(), units + 1};
 }
 
-bool writeStrings(const LogLines& strings, const std::string& path, AgentLog& log) {
-  BufferedFile file(path);
+bool writeStrings(const LogLines& strings, FilePlacement& files, const std::string& path, AgentLog& log) {
+  BufferedFile file(files, path);
   // Neighbours in the file are mostly neighbours in the arena too, newline included; they go together.
   const bool plain = !strings.texts || strings.texts->isAscii();
   const char* begin = nullptr;

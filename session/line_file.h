@@ -20,6 +20,6 @@ bool closeOrWarn(BufferedFile& file, const std::string& path, AgentLog& log);
 /// as the line, newline included, has UTF-16 units: text beyond ASCII costs the line its end. The
 /// readers of these files expect exactly that. What the disk refuses is logged in one warning. Returned:
 /// whether it took everything.
-bool writeStrings(const LogLines& strings, const std::string& path, AgentLog& log);
+bool writeStrings(const LogLines& strings, FilePlacement& files, const std::string& path, AgentLog& log);
 
 }  // namespace zal

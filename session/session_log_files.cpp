@@ -5,7 +5,6 @@
 #include "collectors/rotated_log_sets.h"
 #include "platform/agent_log.h"
 #include "platform/file_placement.h"
-#include "platform/open_directories.h"
 #include "platform/session_records.h"
 #include "platform/standard_path.h"
 #include "session/date_text.h"
@@ -19,12 +18,6 @@ namespace {
 
 /// A log of fewer lines says nothing but that there was a session.
 constexpr std::size_t kFewestLines = 4;
-
-void createIfMissing(const std::string& directory) {
-  std::error_code error;
-  // A failure shows in the files that cannot be written then.
-  if (!std::filesystem::exists(directory, error)) createDirectoriesWithMode0777(directory);
-}
 
 }  // namespace
 
@@ -40,7 +33,7 @@ std::string ZalLoggingAgentVistelSession::logPathForDate(const SessionServices& 
                                                          std::string_view basePath, bool isInitiator) {
   const std::string joined = std::string(basePath) + "/" + logStringForDate(services, date) +
                              (isInitiator ? " (Initiator)" : " (Receiver)");
-  return resolveAndStandardize(joined, services.files.homeDirectory());
+  return standardizeBelowRoot(joined, services.roots.DiagnosticReportRoot, services.files.homeDirectory());
 }
 
 void ZalLoggingAgentVistelSession::writeSessionLog(bool endedByEndAll) {
@@ -61,9 +54,9 @@ void ZalLoggingAgentVistelSession::writeSessionLog(bool endedByEndAll) {
     return;
   }
 
-  createIfMissing(resolveAndStandardize(_logBasePath, _services.files.homeDirectory()));
   const std::string directory = logPathForDate(_services, *_dateStarted, _logBasePath, _initiator);
-  createIfMissing(directory);
+  // A failure shows in the files that cannot be written then.
+  _services.files.makeDirectories(directory);
   const std::string fileEnding = "Log (" + fileTimeText(_services.clock.localTime(*_dateStarted)) + ").log";
   LinkRecentLogSets(_services.fileCollector, _services.roots, log, {_sessionType}, directory);
 

@@ -120,14 +120,14 @@ template <class List>
 SessionLogWriting::File SessionLogs::_fileOf(Log<List>& log, std::string path) {
   // Shared, as a function is copied.
   const auto taken = std::make_shared<Log<List>>(std::exchange(log, {}));
-  return [taken, path = std::move(path), &agentLog = _services.agentLog] {
+  return [taken, path = std::move(path), &files = _services.files, &agentLog = _services.agentLog] {
     if (!taken->spilled) {
       const LogLines lines = allOf(taken->lines);
       taken->lines.removeAllObjects();
-      return writeStrings(lines, path, agentLog);
+      return writeStrings(lines, files, path, agentLog);
     }
     const LinePart rest = taken->lines.takeLines();
-    return taken->spilled->write(headerOf(taken->lines), rest, path);
+    return taken->spilled->write(headerOf(taken->lines), rest, files, path);
   };
 }
 

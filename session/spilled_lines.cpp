@@ -78,9 +78,10 @@ std::vector<std::unique_ptr<LineRunReader>> SpilledLines::_readers(const LinePar
   return readers;
 }
 
-bool SpilledLines::write(const LogLines& header, const LinePart& rest, const std::string& path) {
+bool SpilledLines::write(const LogLines& header, const LinePart& rest, FilePlacement& files,
+                         const std::string& path) {
   const std::scoped_lock lock(_working, _adding);
-  BufferedFile file(path);
+  BufferedFile file(files, path);
   const bool isPlain = !header.texts || header.texts->isAscii();
   for (const std::string_view line : header.lines) file.append(writtenPart(line, isPlain));
   const bool isRead = mergeRuns(_readers(rest), [&file](std::string_view bytes) { file.append(bytes); });

@@ -17,6 +17,8 @@
 
 namespace zal {
 
+class FilePlacement;
+
 /// What of one log is too much for memory. Its parts, in order of arrival, go to the disk as sorted runs and
 /// come together again when the log is written. A part that the disk refuses stays where it is, is tried
 /// again with the next one, and is logged once. Any thread.
@@ -35,7 +37,8 @@ class SpilledLines {
 
   /// Writes the log: the header lines, and in the order of one sorted list all that was added and the rest,
   /// which came after it. Returned: whether everything is in the file.
-  [[nodiscard]] bool write(const LogLines& header, const LinePart& rest, const std::string& path);
+  [[nodiscard]] bool write(const LogLines& header, const LinePart& rest, FilePlacement& files,
+                           const std::string& path);
 
  private:
   struct Waiting {

@@ -89,7 +89,8 @@ class ZalLoggingAgentVistelSession : public std::enable_shared_from_this<ZalLogg
   /// large session are there later, and what follows them follows then.
   void writeSessionLog(bool endedByEndAll);
 
-  /// Where the files of a session that started at that moment go: absolute, without links or dots.
+  /// Where the files of a session that started at that moment go: absolute, without dots, and without links
+  /// down to the report root. One below that shows when it is written.
   [[nodiscard]] static std::string logPathForDate(const SessionServices& services, WallTime date,
                                                   std::string_view basePath, bool isInitiator);
   /// The same moment as a directory name without a role.

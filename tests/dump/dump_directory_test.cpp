@@ -98,10 +98,13 @@ TEST_F(DumpDirectoryTest, ANeighbourWhoseNameBeginsAsTheRootsIsOutside) {
   EXPECT_EQ(directoryOf("V", "/../../../Reportsx"), "(none)");
 }
 
-TEST_F(DumpDirectoryTest, ALinkOutOfTheRootIsNotFollowed) {
+TEST_F(DumpDirectoryTest, NoLinkBelowTheRootIsFollowed) {
   std::filesystem::create_directories(home + "/elsewhere");
+  std::filesystem::create_directories(root + "/Other");
   std::filesystem::create_directory_symlink(home + "/elsewhere", root + "/V");
+  std::filesystem::create_directory_symlink("Other", root + "/W");
   EXPECT_EQ(directoryOf("V", "x"), "(none)");
+  EXPECT_EQ(directoryOf("W", "x"), "(none)");
 }
 
 TEST_F(DumpDirectoryTest, ARootThatIsALinkIsTheDirectoryItLeadsTo) {

@@ -3,6 +3,7 @@
 #include <gtest/gtest.h>
 
 #include "tests/support/fake_services.h"
+#include "tests/support/plain_file_placement.h"
 #include "tests/support/temporary_directory.h"
 
 namespace zal {
@@ -13,11 +14,12 @@ namespace fs = std::filesystem;
 class LatestLinkTest : public ::testing::Test {
  protected:
   void link(const std::string& service, const std::string& archive = "/dumps/Log.zip") {
-    linkLatestArchive(home / "Logs", service, archive, log);
+    linkLatestArchive(files, home / "Logs", service, archive, log);
   }
 
   testing::TemporaryDirectory home;
   testing::RecordingAgentLog log;
+  testing::PlainFilePlacement files{home.path()};
 };
 
 TEST_F(LatestLinkTest, LinksTheArchiveBesideTheServicesLogs) {
@@ -49,7 +51,7 @@ TEST_F(LatestLinkTest, AnArchiveOfEarlierTakesTheLinkOnlyFromNoneOrAnOlderOne) {
   fs::last_write_time(home / "middle.zip", now - std::chrono::hours(1));
   fs::last_write_time(home / "older.zip", now - std::chrono::hours(2));
   const auto linkedAfter = [&](const std::string& archive) {
-    linkArchiveOfEarlier(home / "Logs", "Vistel", home / archive, log);
+    linkArchiveOfEarlier(files, home / "Logs", "Vistel", home / archive, log);
     return fs::read_symlink(place).filename();
   };
   EXPECT_EQ(linkedAfter("middle.zip"), "middle.zip");

@@ -218,8 +218,9 @@ TEST_F(LogDumpTest, ADirectoryOutsideTheReportRootIsRefusedWithOneWarningAndARep
     run(everything, type);
     finish();
     EXPECT_EQ(testing::listTree(fake.home.path()), before);
-    EXPECT_THAT(fake.agentLog.lines, ElementsAre("warning: Refused a dump of \"" + type +
-                                                 "\": its directory would not lie below the report root"));
+    EXPECT_THAT(fake.agentLog.lines,
+                ElementsAre("warning: Refused a dump of \"" + type +
+                            "\": its directory would not lie below the report root, or only through a link"));
     EXPECT_THAT(fakePeer->replies, ElementsAre(std::pair(kToken, replyWithoutPath())));
   }
   EXPECT_THAT(fake.fileCopier.started, IsEmpty());
@@ -231,7 +232,7 @@ TEST_F(LogDumpTest, ADirectoryOutsideTheReportRootIsRefusedWithOneWarningAndARep
 TEST_F(LogDumpTest, ARefusalShowsAtMostALineOfTheType) {
   run(request("../../" + std::string(4096, 'x') + "\nwarning: forged"), std::nullopt);
   run(request("..\n/../.."), std::nullopt);
-  const std::string end = "\": its directory would not lie below the report root";
+  const std::string end = "\": its directory would not lie below the report root, or only through a link";
   EXPECT_THAT(warnings(), ElementsAre("warning: Refused a dump of \"../../" + std::string(94, 'x') + end,
                                       "warning: Refused a dump of \"..?/../.." + end));
 }

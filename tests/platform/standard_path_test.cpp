@@ -44,6 +44,18 @@ TEST_F(StandardPathTest, CircleOfLinksIsStandardisedAsText) {
   EXPECT_EQ(resolveAndStandardize("~/a/./x", home), home + "/a/x");
 }
 
+TEST_F(StandardPathTest, BelowARootOnlyTheRootsOwnLinksAreFollowed) {
+  std::filesystem::create_directories(home + "/real/a");
+  std::filesystem::create_directory_symlink("real", home + "/root");
+  std::filesystem::create_directory_symlink("a", home + "/real/link");
+  EXPECT_EQ(standardizeBelowRoot("~/root/link//./new/", "~/root", home), home + "/real/link/new");
+  EXPECT_EQ(standardizeBelowRoot(home + "/real/link/new", "~/root", home), home + "/real/link/new");
+  EXPECT_EQ(standardizeBelowRoot("~/root/../real/link/x", "~/root", home), home + "/real/link/x");
+  EXPECT_EQ(standardizeBelowRoot("~/real/link/x", "~/other", home), home + "/real/a/x");
+  EXPECT_EQ(standardizeBelowRoot("~/root", "~/root", home), home + "/real");
+  EXPECT_EQ(standardizeBelowRoot("~/real/link", "", home), home + "/real/a");
+}
+
 TEST_F(StandardPathTest, EmptyPathStaysEmpty) { EXPECT_EQ(resolveAndStandardize("", home), ""); }
 
 }  // namespace

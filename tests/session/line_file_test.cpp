@@ -6,6 +6,7 @@
 
 #include "session/quality_log_list.h"
 #include "tests/support/fake_services.h"
+#include "tests/support/plain_file_placement.h"
 #include "tests/support/temporary_directory.h"
 
 namespace zal {
@@ -15,17 +16,18 @@ class LineFileTest : public ::testing::Test {
  protected:
   testing::TemporaryDirectory directory;
   testing::RecordingAgentLog log;
+  testing::PlainFilePlacement files{directory / "home"};
   std::string path = directory / "Log.log";
   void write(const std::vector<std::string_view>& lines) {
     QualityLogList list;
     for (const auto line : lines) list.append(line);
-    writeStrings(list.copy(), path, log);
+    writeStrings(list.copy(), files, path, log);
   }
   /// Written last line first, so that no two lines are neighbours in memory as they are in the file.
   void writeReversed(const std::vector<std::string_view>& lines) {
     QualityLogList list;
     for (const auto line : lines) list.insertAtFront(line);
-    writeStrings(list.copy(), path, log);
+    writeStrings(list.copy(), files, path, log);
   }
   [[nodiscard]] std::string written() const { return testing::readFile(path); }
 };

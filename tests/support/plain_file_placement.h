@@ -1,11 +1,13 @@
 #pragma once
 
+#include <cstdio>
 #include <filesystem>
 #include <functional>
 #include <string>
 #include <utility>
 
 #include "platform/file_placement.h"
+#include "platform/open_directories.h"
 
 namespace zal::testing {
 
@@ -54,6 +56,30 @@ class PlainFilePlacement : public FilePlacement {
           source, target,
           std::filesystem::copy_options::recursive | std::filesystem::copy_options::copy_symlinks, error);
     }
+    return error;
+  }
+  std::error_code makeDirectories(const std::string& path) override {
+    return createDirectoriesWithMode0777(path);
+  }
+  [[nodiscard]] std::FILE* openFresh(const std::string& path) override {
+    std::error_code error;
+    if (std::filesystem::is_character_file(path, error)) return std::fopen(path.c_str(), "wb");
+    if (!std::filesystem::is_directory(path, error)) std::filesystem::remove(path, error);
+    return std::fopen(path.c_str(), "wbx");
+  }
+  std::error_code replace(const std::string& source, const std::string& target) override {
+    std::error_code error;
+    std::filesystem::rename(source, target, error);
+    return error;
+  }
+  std::error_code linkSymbolically(const std::string& text, const std::string& path) override {
+    std::error_code error;
+    std::filesystem::create_symlink(text, path, error);
+    return error;
+  }
+  std::error_code remove(const std::string& path) override {
+    std::error_code error;
+    std::filesystem::remove_all(path, error);
     return error;
   }
 

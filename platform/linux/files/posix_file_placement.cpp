@@ -1,6 +1,8 @@
 #include "platform/linux/files/posix_file_placement.h"
 
 #include <fcntl.h>
+#include <stdio.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include <cerrno>
@@ -19,6 +21,17 @@ namespace zal {
 namespace {
 
 constexpr int kMostSaveNames = 10'000;
+
+Descriptor openFreshAt(int directory, const std::string& name) {
+  constexpr int kForWriting = O_WRONLY | O_NOFOLLOW | O_CLOEXEC;
+  constexpr mode_t kMode = 0666;
+  struct stat status {};
+  const bool isThere = ::fstatat(directory, name.c_str(), &status, AT_SYMLINK_NOFOLLOW) == 0;
+  if (isThere && S_ISCHR(status.st_mode)) return Descriptor(::openat(directory, name.c_str(), kForWriting));
+  if (isThere && (S_ISREG(status.st_mode) || S_ISLNK(status.st_mode))) ::unlinkat(directory, name.c_str(), 0);
+  // Exclusive: who lays another link there in between makes it fail.
+  return Descriptor(::openat(directory, name.c_str(), kForWriting | O_CREAT | O_EXCL, kMode));
+}
 
 /// Not through a link.
 bool isFile(const std::string& path) {
@@ -102,6 +115,41 @@ std::error_code PosixFilePlacement::prepareOutput(const std::string& path) {
 std::error_code PosixFilePlacement::copy(const std::string& source, const std::string& target) {
   const RootedPlace to = _paths.placeOf(target);
   return to.error ? to.error : copyTreeTo(to.directory.get(), source, to.name, {}).error;
+}
+
+std::error_code PosixFilePlacement::makeDirectories(const std::string& path) {
+  return _paths.makeDirectories(path);
+}
+
+std::FILE* PosixFilePlacement::openFresh(const std::string& path) {
+  const RootedPlace at = _paths.placeOf(path);
+  errno = at.error.value();
+  Descriptor file = at.error ? Descriptor() : openFreshAt(at.directory.get(), at.name);
+  std::FILE* const opened = file.isOpen() ? ::fdopen(file.get(), "wb") : nullptr;
+  if (opened != nullptr) static_cast<void>(file.release());
+  return opened;
+}
+
+std::error_code PosixFilePlacement::replace(const std::string& source, const std::string& target) {
+  const RootedPlace from = _paths.placeOf(source);
+  const RootedPlace to = _paths.placeOf(target);
+  if (from.error || to.error) return from.error ? from.error : to.error;
+  if (::renameat(from.directory.get(), from.name.c_str(), to.directory.get(), to.name.c_str()) == 0)
+    return {};
+  return lastSystemError();
+}
+
+std::error_code PosixFilePlacement::linkSymbolically(const std::string& text, const std::string& path) {
+  const RootedPlace at = _paths.placeOf(path);
+  if (at.error) return at.error;
+  if (::symlinkat(text.c_str(), at.directory.get(), at.name.c_str()) == 0) return {};
+  return lastSystemError();
+}
+
+std::error_code PosixFilePlacement::remove(const std::string& path) {
+  const RootedPlace at = _paths.placeOf(path);
+  if (at.error == std::errc::no_such_file_or_directory) return {};
+  return at.error ? at.error : removeTreeAt(at.directory.get(), at.name);
 }
 
 }  // namespace zal

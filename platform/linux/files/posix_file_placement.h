@@ -35,6 +35,11 @@ class PosixFilePlacement : public FilePlacement {
   std::error_code move(const std::string& source, const std::string& target) override;
   std::error_code prepareOutput(const std::string& path) override;
   std::error_code copy(const std::string& source, const std::string& target) override;
+  std::error_code makeDirectories(const std::string& path) override;
+  [[nodiscard]] std::FILE* openFresh(const std::string& path) override;
+  std::error_code replace(const std::string& source, const std::string& target) override;
+  std::error_code linkSymbolically(const std::string& text, const std::string& path) override;
+  std::error_code remove(const std::string& path) override;
 
  private:
   const std::string _home;

@@ -67,6 +67,21 @@ TEST_F(PlacementBelowRootsTest, NothingIsPlacedThroughALinkBelowARoot) {
   expectRefused(rooted.copy(directory / "file", behindTheLink));
   expectRefused(rooted.copy(directory / "root/real", behindTheLink));
   expectRefused(rooted.prepareOutput(behindTheLink));
+  expectRefused(rooted.makeDirectories(behindTheLink));
+  expectRefused(rooted.replace(directory / "file", behindTheLink));
+  expectRefused(rooted.linkSymbolically("text", behindTheLink));
+  EXPECT_EQ(rooted.openFresh(behindTheLink), nullptr);
+  expectRefused({errno, std::generic_category()});
+}
+
+TEST_F(PlacementBelowRootsTest, NothingIsRemovedOrTakenAwayBehindALink) {
+  writeFile(directory / "elsewhere/file", "old");
+  EXPECT_EQ(rooted.remove(behindTheLink), std::errc::too_many_symbolic_link_levels);
+  EXPECT_EQ(rooted.replace(behindTheLink, directory / "root/real/file"),
+            std::errc::too_many_symbolic_link_levels);
+  EXPECT_FALSE(rooted.remove(directory / "root/planted"));
+  EXPECT_EQ(listTree(directory / "elsewhere"), "file\n");
+  EXPECT_EQ(listTree(directory / "root"), "real/\n");
 }
 
 TEST_F(PlacementBelowRootsTest, AnotherUsersFileBehindALinkIsNotReplacedByAnOutput) {
@@ -80,6 +95,43 @@ TEST_F(PlacementBelowRootsTest, SourcesMayBeReachedThroughLinks) {
   EXPECT_FALSE(rooted.link(directory / "root/planted/source", directory / "root/real/a"));
   EXPECT_FALSE(rooted.move(directory / "root/planted/source", directory / "root/real/b"));
   EXPECT_EQ(listTree(directory / "root/real"), "a\nb\n");
+}
+
+// Fresh files
+
+TEST_F(PosixFilePlacementTest, AFreshFileIsEmptyWhateverHadTheName) {
+  writeFile(directory / "victim", "untouched");
+  fs::create_hard_link(directory / "victim", directory / "hard");
+  fs::create_symlink("victim", directory / "symbolic");
+  for (const std::string name : {"new", "hard", "symbolic"}) {
+    std::FILE* const file = files.openFresh(directory / name);
+    ASSERT_NE(file, nullptr) << name;
+    EXPECT_GE(std::fputs("mine", file), 0);
+    EXPECT_EQ(std::fclose(file), 0);
+    EXPECT_EQ(readFile(directory / name), "mine");
+    EXPECT_TRUE(fs::is_regular_file(fs::symlink_status(directory / name))) << name;
+  }
+  EXPECT_EQ(readFile(directory / "victim"), "untouched");
+}
+
+TEST_F(PosixFilePlacementTest, AFreshFileTakesNoDirectorysPlaceAndADeviceIsOpenedAsItIs) {
+  fs::create_directory(directory / "taken");
+  EXPECT_EQ(files.openFresh(directory / "taken"), nullptr);
+  EXPECT_EQ(files.openFresh(directory / "missing/file"), nullptr);
+  EXPECT_EQ(errno, ENOENT);
+  std::FILE* const device = files.openFresh("/dev/full");
+  ASSERT_NE(device, nullptr);
+  EXPECT_EQ(std::fclose(device), 0);
+}
+
+TEST_F(PosixFilePlacementTest, ARemovalTakesTreesAndLinksButNotWhatTheyLeadTo) {
+  writeFile(directory / "tree/a/file", "");
+  writeFile(directory / "kept/file", "");
+  fs::create_directory_symlink("../kept", directory / "tree/link");
+  EXPECT_FALSE(files.remove(directory / "tree"));
+  EXPECT_FALSE(files.remove(directory / "tree"));
+  EXPECT_FALSE(files.remove(directory / "missing/file"));
+  EXPECT_EQ(listTree(directory.path()), "kept/\nkept/file\n");
 }
 
 // Links
