@@ -58,17 +58,29 @@ Descriptor openDirectoryAt(int parent, const std::string& name) {
 }
 
 std::vector<std::string> namesAt(int directory) {
+  std::error_code ignored;
+  return namesAt(directory, ignored);
+}
+
+std::vector<std::string> namesAt(int directory, std::error_code& error) {
   std::vector<std::string> names;
+  error.clear();
   // A handle of its own: its place in the directory is not the caller's.
   Descriptor own(::openat(directory, ".", O_RDONLY | O_DIRECTORY | O_CLOEXEC));
-  if (!own.isOpen()) return names;
-  const std::unique_ptr<DIR, CloseDirectory> listing(::fdopendir(own.get()));
-  if (!listing) return names;
+  const std::unique_ptr<DIR, CloseDirectory> listing(own.isOpen() ? ::fdopendir(own.get()) : nullptr);
+  if (!listing) {
+    error = lastSystemError();
+    return names;
+  }
   static_cast<void>(own.release());
-  while (const dirent* entry = ::readdir(listing.get())) {
+  for (;;) {
+    errno = 0;
+    const dirent* const entry = ::readdir(listing.get());
+    if (entry == nullptr) break;
     std::string name = entry->d_name;
     if (name != "." && name != "..") names.push_back(std::move(name));
   }
+  if (errno != 0) error = lastSystemError();
   std::sort(names.begin(), names.end());
   return names;
 }

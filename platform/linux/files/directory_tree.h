@@ -17,6 +17,8 @@ namespace zal {
 [[nodiscard]] Descriptor openDirectoryAt(int parent, const std::string& name);
 /// Without "." and "..", in the order of bytes; as far as it could be read.
 [[nodiscard]] std::vector<std::string> namesAt(int directory);
+/// The same, with the error that ended it.
+[[nodiscard]] std::vector<std::string> namesAt(int directory, std::error_code& error);
 /// What the file, or the directory with all below it, takes of the disk. A file with several names counts
 /// with its share of it for each.
 [[nodiscard]] std::uint64_t diskBytesAt(int parent, const std::string& name);

@@ -26,7 +26,8 @@ struct UnfinishedRotations {
 /// into the generations. It goes on wherever an earlier run was cut off, so that at every moment each
 /// record is in exactly one file that counts. Of more than nine waiting files the oldest are removed,
 /// as nine newer ones would push them out. One run at a time for one file; any thread; takes its
-/// time. Returned: why it stopped; a later run goes on.
+/// time. A symbolic link in the place of the set's directory is not followed. Returned: why it stopped; a
+/// later run goes on.
 [[nodiscard]] std::error_code completeRotations(const UnfinishedRotation& rotation);
 
 }  // namespace zal

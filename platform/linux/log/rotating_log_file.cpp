@@ -8,7 +8,10 @@
 #include <cstdio>
 #include <system_error>
 
+#include "platform/linux/files/descriptor.h"
 #include "platform/linux/files/rename_no_replace.h"
+#include "platform/linux/files/system_error.h"
+#include "platform/linux/log/log_set_directory.h"
 #include "platform/linux/log/record_text.h"
 #include "platform/linux/log/rotation_names.h"
 
@@ -26,9 +29,10 @@ bool makeDirectories(const std::string& path) {
          (::mkdir(path.c_str(), kLogDirectoryMode) == 0 || errno == EEXIST);
 }
 
-int openForAppending(const std::string& path) {
+int openForAppending(int directory, const std::string& name) {
   // Not blocking: a pipe in the file's place must not stop the agent. Regular files do not care.
-  return ::open(path.c_str(), O_RDWR | O_CREAT | O_APPEND | O_CLOEXEC | O_NOCTTY | O_NONBLOCK, kFileMode);
+  return ::openat(directory, name.c_str(),
+                  O_RDWR | O_CREAT | O_APPEND | O_NOFOLLOW | O_CLOEXEC | O_NOCTTY | O_NONBLOCK, kFileMode);
 }
 
 std::string errorText(int error) { return std::generic_category().message(error); }
@@ -94,11 +98,10 @@ int RotatingLogFile::_write() {
 }
 
 bool RotatingLogFile::_open() {
-  const std::string file = path();
-  _descriptor = openForAppending(file);
-  if (_descriptor < 0 && errno == ENOENT && makeDirectories(_directoryPath())) {
-    _descriptor = openForAppending(file);
-  }
+  Descriptor directory = openLogSet(_place.root, _place.directory);
+  if (!directory.isOpen() && errno == ENOENT && makeDirectories(_directoryPath()))
+    directory = openLogSet(_place.root, _place.directory);
+  if (directory.isOpen()) _descriptor = openForAppending(directory.get(), _place.fileName);
   if (_descriptor < 0) return false;
   struct stat status {};
   _size = ::fstat(_descriptor, &status) == 0 ? static_cast<std::uint64_t>(status.st_size) : 0;
@@ -135,14 +138,16 @@ bool RotatingLogFile::_wasReplaced() const {
   struct stat open {};
   struct stat named {};
   if (::fstat(_descriptor, &open) != 0) return false;
-  return ::stat(path().c_str(), &named) != 0 || named.st_ino != open.st_ino || named.st_dev != open.st_dev;
+  return ::lstat(path().c_str(), &named) != 0 || named.st_ino != open.st_ino || named.st_dev != open.st_dev;
 }
 
 std::error_code RotatingLogFile::_renameAway(std::uint64_t& sequence) const {
+  const Descriptor directory = openLogSet(_place.root, _place.directory);
+  if (!directory.isOpen()) return lastSystemError();
   for (;; ++sequence) {
     // A second agent may have taken the number; nothing that waits may be overwritten.
-    const std::error_code error =
-        renameNoReplace(path(), _directoryPath() + "/" + pendingName(_place.fileName, sequence));
+    const std::error_code error = renameNoReplaceAt(directory.get(), _place.fileName, directory.get(),
+                                                    pendingName(_place.fileName, sequence));
     if (error != std::errc::file_exists) return error;
   }
 }

@@ -12,7 +12,8 @@ namespace zal {
 
 /// One current log file: collects records, appends them in one write, steps aside for a rotation.
 /// What the disk refuses stays in memory up to a bound and is written when the disk takes it again,
-/// each byte once and in order. Not for several threads.
+/// each byte once and in order. A symbolic link in the place of the directory or the file is not followed:
+/// the file cannot be written then. Not for several threads.
 ///
 ///     file.append(record) ... file.flush();   // until file.isRotationDue()
 ///     if (file.flush()) file.rotateAway(sequence);   // "X.log" is now "X.log.pending-7"

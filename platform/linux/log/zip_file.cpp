@@ -66,17 +66,20 @@ std::error_code packIntoCreated(int source, const struct stat& status, const std
 
 }  // namespace
 
-std::error_code packIntoZip(const std::string& source, const std::string& target,
+std::error_code packIntoZip(int directory, const std::string& source, const std::string& target,
                             const std::string& entryName) {
-  const Descriptor from(::open(source.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
+  const Descriptor from(::openat(directory, source.c_str(), O_RDONLY | O_NOFOLLOW | O_CLOEXEC | O_NONBLOCK));
   struct stat status {};
   if (from.get() < 0 || ::fstat(from.get(), &status) != 0) return lastError();
   // Made here for its mode, and kept open for the sync: the zip library knows neither.
-  const Descriptor to(::open(target.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC, 0640));
+  ::unlinkat(directory, target.c_str(), 0);
+  const Descriptor to(
+      ::openat(directory, target.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW | O_CLOEXEC, 0640));
   if (to.get() < 0) return lastError();
-  std::error_code error = packIntoCreated(from.get(), status, target, entryName);
+  const std::string opened = "/proc/self/fd/" + std::to_string(to.get());
+  std::error_code error = packIntoCreated(from.get(), status, opened, entryName);
   if (!error && ::fsync(to.get()) != 0) error = lastError();
-  if (error) ::unlink(target.c_str());
+  if (error) ::unlinkat(directory, target.c_str(), 0);
   return error;
 }
 

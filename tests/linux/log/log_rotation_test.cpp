@@ -1,5 +1,6 @@
 #include "platform/linux/log/log_rotation.h"
 
+#include <fcntl.h>
 #include <sys/stat.h>
 
 #include <gmock/gmock.h>
@@ -8,6 +9,7 @@
 #include "platform/linux/log/rotation_names.h"
 #include "platform/linux/log/zip_file.h"
 #include "tests/linux/log/unzipped.h"
+#include "tests/support/file_size_limit.h"
 #include "tests/support/temporary_directory.h"
 
 namespace zal {
@@ -32,7 +34,7 @@ class LogRotationTest : public ::testing::Test {
   void zip(const std::string& name, const std::string& text) {
     writeFile(root / "content", text);
     std::filesystem::create_directories(set);
-    ASSERT_EQ(packIntoZip(root / "content", path(name), kFile), std::error_code{});
+    ASSERT_EQ(packIntoZip(AT_FDCWD, root / "content", path(name), kFile), std::error_code{});
     std::filesystem::remove(root / "content");
   }
   void ready(std::uint64_t sequence, const std::string& text) { zip(readyName(kFile, sequence), text); }
@@ -227,17 +229,40 @@ TEST(ZipFileTest, ALargeFileComesBackByteForByte) {
   std::string text;
   for (int i = 0; i < 60'000; ++i) text += "record " + std::to_string(i * 7919) + "\n";
   writeFile(directory / "source", text);
-  EXPECT_EQ(packIntoZip(directory / "source", directory / "a.zip", "source.log"), std::error_code{});
+  EXPECT_EQ(packIntoZip(AT_FDCWD, directory / "source", directory / "a.zip", "source.log"),
+            std::error_code{});
   EXPECT_TRUE(unzipped(directory / "a.zip") == text);
   EXPECT_LT(std::filesystem::file_size(directory / "a.zip"), text.size() / 2);
 }
 
+TEST_F(LogRotationTest, ALinkInThePlaceOfTheSetIsNotFollowed) {
+  std::filesystem::create_directories(root / "elsewhere");
+  writeFile(root / ("elsewhere/" + pendingName(kFile, 1)), "theirs\n");
+  std::filesystem::create_directory_symlink("elsewhere", set);
+  EXPECT_THAT(findUnfinishedRotations(root.path()).files, IsEmpty());
+  EXPECT_EQ(complete(), std::errc::too_many_symbolic_link_levels);
+  EXPECT_EQ(listTree(root / "elsewhere"), pendingName(kFile, 1) + "\n");
+}
+
+TEST_F(LogRotationTest, ALinkThatWaitsIsNotPackedAndOneAtTheZipsNameLosesIt) {
+  writeFile(root / "theirs", "theirs");
+  std::filesystem::create_directories(set);
+  std::filesystem::create_symlink(root / "theirs", path(pendingName(kFile, 1)));
+  EXPECT_EQ(complete(), std::errc::too_many_symbolic_link_levels);
+  std::filesystem::remove(path(pendingName(kFile, 1)));
+  pending(2, "ours");
+  std::filesystem::create_symlink(root / "theirs", path(unfinishedZipName(kFile)));
+  EXPECT_EQ(complete(), std::error_code{});
+  EXPECT_EQ(generations(), "1=ours ");
+  EXPECT_EQ(readFile(root / "theirs"), "theirs");
+}
+
 TEST(ZipFileTest, FailureIsReturnedAndLeavesNoArchive) {
   const TemporaryDirectory directory;
-  EXPECT_EQ(packIntoZip(directory / "missing", directory / "a.zip", "x.log"),
+  EXPECT_EQ(packIntoZip(AT_FDCWD, directory / "missing", directory / "a.zip", "x.log"),
             std::errc::no_such_file_or_directory);
   writeFile(directory / "source", std::string(300'000, 'x'));
-  EXPECT_EQ(packIntoZip(directory / "source", directory / "no/a.zip", "x.log"),
+  EXPECT_EQ(packIntoZip(AT_FDCWD, directory / "source", directory / "no/a.zip", "x.log"),
             std::errc::no_such_file_or_directory);
   EXPECT_EQ(listTree(directory.path()), "source\n");
 }
@@ -245,8 +270,8 @@ TEST(ZipFileTest, FailureIsReturnedAndLeavesNoArchive) {
 TEST(ZipFileTest, AFullDiskIsReturned) {
   const TemporaryDirectory directory;
   writeFile(directory / "source", std::string(300'000, 'x'));
-  std::filesystem::create_symlink("/dev/full", directory / "a.zip");
-  EXPECT_NE(packIntoZip(directory / "source", directory / "a.zip", "x.log"), std::error_code{});
+  const testing::FileSizeLimit limit(100);
+  EXPECT_NE(packIntoZip(AT_FDCWD, directory / "source", directory / "a.zip", "x.log"), std::error_code{});
   EXPECT_EQ(listTree(directory.path()), "source\n");
 }
 

@@ -10,6 +10,7 @@
 #include <gtest/gtest.h>
 
 #include "platform/linux/log/record_text.h"
+#include "tests/support/file_size_limit.h"
 #include "tests/support/temporary_directory.h"
 
 namespace zal {
@@ -141,21 +142,64 @@ TEST_F(RotatingLogFileTest, AFileThatWasTakenAwayIsMadeAgain) {
 }
 
 TEST_F(RotatingLogFileTest, AFullDiskIsSaidOnceAndTheRecordsAreKept) {
-  std::filesystem::create_directories(root + "/Vistel");
-  std::filesystem::create_symlink("/dev/full", path);
   open();
   add("one\n");
-  EXPECT_FALSE(file->flush());
-  add("two\n");
-  EXPECT_FALSE(file->flush());
-  EXPECT_THAT(messages, ElementsAre(path + ": cannot be written: No space left on device; up to 4 MiB of "
+  {
+    const testing::FileSizeLimit full(0);
+    EXPECT_FALSE(file->flush());
+    add("two\n");
+    EXPECT_FALSE(file->flush());
+  }
+  EXPECT_THAT(messages, ElementsAre(path + ": cannot be written: File too large; up to 4 MiB of "
                                            "records are kept until it can"));
-  std::filesystem::remove(path);
   EXPECT_TRUE(file->flush());
   EXPECT_EQ(content(), "one\ntwo\n");
   ASSERT_EQ(messages.size(), 2U);
   EXPECT_EQ(messages[1], path + ": is written again; 0 records were dropped");
   EXPECT_FALSE(file->isInOutage());
+}
+
+TEST_F(RotatingLogFileTest, ALinkInThePlaceOfTheDirectoryOrTheFileIsNotFollowed) {
+  const std::string victim = directory / "elsewhere/Vistel.log";
+  writeFile(victim, "untouched\n");
+  std::filesystem::create_directories(root);
+  std::filesystem::create_directory_symlink(directory / "elsewhere", root + "/Vistel");
+  open();
+  add("one\n");
+  EXPECT_FALSE(file->flush());
+  EXPECT_THAT(messages,
+              ElementsAre(path + ": cannot be written: Too many levels of symbolic links; up to 4 MiB "
+                                 "of records are kept until it can"));
+  std::filesystem::remove(root + "/Vistel");
+  std::filesystem::create_directories(root + "/Vistel");
+  std::filesystem::create_symlink(victim, path);
+  EXPECT_FALSE(file->flush());
+  std::filesystem::remove(path);
+  EXPECT_TRUE(file->flush());
+  EXPECT_EQ(content(), "one\n");
+  EXPECT_EQ(listTree(directory / "elsewhere"), "Vistel.log\n");
+  EXPECT_EQ(readFile(victim), "untouched\n");
+}
+
+TEST_F(RotatingLogFileTest, AFileThatALinkReplacesIsLeft) {
+  open();
+  add("one\n");
+  EXPECT_TRUE(file->flush());
+  std::filesystem::rename(path, directory / "moved");
+  std::filesystem::create_symlink(directory / "moved", path);
+  file->leaveIfReplaced();
+  add("two\n");
+  EXPECT_FALSE(file->flush());
+  EXPECT_EQ(readFile(directory / "moved"), "one\n");
+}
+
+TEST_F(RotatingLogFileTest, ARootThatIsALinkIsAsGood) {
+  std::filesystem::create_directories(directory / "elsewhere");
+  std::filesystem::create_directory_symlink("elsewhere", root);
+  open();
+  add("one\n");
+  EXPECT_TRUE(file->flush());
+  EXPECT_EQ(readFile(directory / "elsewhere/Vistel/Vistel.log"), "one\n");
 }
 
 TEST_F(RotatingLogFileTest, ADirectoryThatCannotBeMadeIsAnOutageToo) {
