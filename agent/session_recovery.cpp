@@ -3,6 +3,7 @@
 #include <memory>
 #include <optional>
 #include <string>
+#include <string_view>
 
 #include "agent/session_directory.h"
 #include "agent/session_type_key.h"
@@ -13,7 +14,8 @@
 namespace zal {
 namespace {
 
-/// What a record is, as far as its pieces were understood. Not the entries themselves: there may be millions.
+/// What a record is, as far as its pieces were understood. Not the entries themselves: there may be more than
+/// memory takes, so that the record is read twice.
 struct CutOffSession {
   std::optional<std::string> type;
   /// The clock may have been set back in the call: the last entry says when it was, not the latest.
@@ -23,8 +25,7 @@ struct CutOffSession {
 
 CutOffSession understood(const UnfinishedRecord& record) {
   CutOffSession session;
-  session.unreadableBytes = record.unreadableBytes;
-  for (const std::string_view piece : record.pieces) {
+  const std::uint64_t damaged = record.read([&session](std::string_view piece) {
     const auto entry = decodeEntry(piece);
     if (!entry) {
       session.unreadableBytes += piece.size();
@@ -33,7 +34,8 @@ CutOffSession understood(const UnfinishedRecord& record) {
     } else {
       session.lastHeardOf = entry->at;
     }
-  }
+  });
+  session.unreadableBytes += damaged;
   return session;
 }
 
@@ -61,10 +63,10 @@ bool recover(const UnfinishedRecord& record, Platform& platform, SessionServices
       std::make_shared<ZalLoggingAgentVistelSession>(key, sessionDirectory(platform, key), services);
   const std::string note = recoveryNote(cutOff, services);
   session->setRecoveryNote(note);
-  for (const std::string_view piece : record.pieces) {
+  record.read([&session](std::string_view piece) {
     const auto entry = decodeEntry(piece);
     if (entry && entry->kind != SessionEntryKind::opened) session->replay(*entry);
-  }
+  });
   const bool isWritten = session->endReplay(*cutOff.lastHeardOf);
   platform.agentLog.notice("Recovered a session of type " + key + ": " + note);
   return isWritten;

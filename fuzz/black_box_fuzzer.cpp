@@ -3,6 +3,7 @@
 
 #include "fuzz/fuzz_entries.h"
 #include "fuzz/promise.h"
+#include "fuzz/record_content.h"
 #include "platform/linux/blackbox/record_frame.h"
 #include "session/entry_codec.h"
 
@@ -25,14 +26,14 @@ void fuzzBlackBox(const std::uint8_t* data, std::size_t size) {
   const std::string_view bytes(alone.data(), alone.size());
   if (data[0] == 0) return readPiece(bytes);
 
-  const UnfinishedRecord record = readRecordFrames(bytes, data[0]);
+  const RecordContent record = readAsWritten(bytes, data[0]);
+  // Ends of the window come to lie everywhere.
+  for (const std::size_t width : {std::size_t{1}, 1 + size % 61, size}) {
+    promise(readThroughWindow(bytes, data[0], width) == record, "the window's width changes nothing");
+  }
   std::uint64_t accounted = record.unreadableBytes;
-  const char* last = bytes.data();
   std::string again;
-  for (const std::string_view piece : record.pieces) {
-    promise(piece.data() >= last && piece.data() + piece.size() <= bytes.data() + bytes.size(),
-            "pieces are parts of the file, in its order");
-    last = piece.data() + piece.size();
+  for (const std::string& piece : record.pieces) {
     accounted += kRecordFrameHeaderSize + piece.size();
     appendRecordFrame(again, data[0], piece);
     readPiece(piece);
@@ -41,7 +42,8 @@ void fuzzBlackBox(const std::uint8_t* data, std::size_t size) {
   promise(
       bytes.substr(accounted).find_first_not_of('\0') == std::string_view::npos || record.unreadableBytes > 0,
       "what is no piece is counted");
-  promise(readRecordFrames(again, data[0]).pieces.size() == record.pieces.size(), "what is left is whole");
+  promise(readThroughWindow(again, data[0], size) == RecordContent{record.pieces, 0},
+          "what is left is whole");
 }
 
 }  // namespace zal

@@ -5,7 +5,6 @@
 #include <memory>
 #include <string>
 #include <string_view>
-#include <vector>
 
 namespace zal {
 
@@ -22,10 +21,13 @@ class SessionRecord {
   virtual void remove(const std::string& writtenInto) = 0;
 };
 
-/// What is left of a record that its process did not come to remove.
-struct UnfinishedRecord {
-  std::vector<std::string_view> pieces;  ///< in order; borrowed for the call
-  std::uint64_t unreadableBytes = 0;     ///< damaged ones between the pieces, and a torn end
+/// A record that its process did not come to remove. It may be larger than memory. Main thread only.
+class UnfinishedRecord {
+ public:
+  virtual ~UnfinishedRecord() = default;
+  /// Gives its pieces to the handler, in order and borrowed for the call; another time the same ones.
+  /// Returned: how many bytes are unreadable, damaged ones between the pieces and a torn end.
+  virtual std::uint64_t read(const std::function<void(std::string_view piece)>& handler) const = 0;
 };
 
 /// The black box: records of sessions that survive the end of the process, however it comes. Main thread

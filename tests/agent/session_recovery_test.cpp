@@ -104,5 +104,29 @@ TEST_F(SessionRecoveryTest, ARecordWithNothingInItGoesAndOneThatIsAllDamageIsNam
   EXPECT_THAT(fake.agentLog.lines, Contains(HasSubstr("could be read from the black box")));
 }
 
+TEST_F(SessionRecoveryTest, ALongSessionTakesNoMoreMemoryThanOneThatGoesOn) {
+  createLogging();
+  beginAndLeave("Vistel");
+  std::string piece;
+  encodeEntry({.kind = SessionEntryKind::description,
+               .text = std::string(120, 'x'),
+               .log = "Codec",
+               .sender = "media",
+               .time = 1714651389},
+              piece);
+  record(0).pieces.insert(record(0).pieces.end(), 1000, piece);
+  MemoryLedger memory{{.session = 3000, .peer = 6000, .total = 9000}};
+  SessionServices services = sessions.services();
+  services.memory = &memory;
+  std::uint64_t most = 0;
+  fake.sessionRecords.onRead = [&] { most = std::max(most, memory.total()); };
+  recoverSessions(fake.platform, services);
+  EXPECT_GT(most, 1000U);
+  EXPECT_LE(most, 3000U);
+  EXPECT_GT(fake.spillFiles.spilled, 100'000U);
+  EXPECT_GT(logOf("Vistel", "Verbose Log").size(), 120'000U);
+  EXPECT_TRUE(record(0).isRemoved);
+}
+
 }  // namespace
 }  // namespace zal

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <functional>
 #include <memory>
 #include <string>
 #include <vector>
@@ -20,6 +21,7 @@ class FakeSessionRecords : public SessionRecords {
   };
   std::vector<std::shared_ptr<Kept>> records;
   bool isEnabled = true;
+  std::function<void()> onRead;  ///< after each piece that a reader took
 
   [[nodiscard]] std::shared_ptr<SessionRecord> begin() override {
     if (!isEnabled) return nullptr;
@@ -30,8 +32,7 @@ class FakeSessionRecords : public SessionRecords {
   void recover(const std::function<bool(const UnfinishedRecord& record)>& handler) override {
     for (const auto& kept : records) {
       if (kept->isRemoved) continue;
-      const UnfinishedRecord left{{kept->pieces.begin(), kept->pieces.end()}, kept->unreadableBytes};
-      kept->isRemoved = handler(left);
+      kept->isRemoved = handler(Left(*kept, onRead));
     }
   }
 
@@ -47,6 +48,21 @@ class FakeSessionRecords : public SessionRecords {
 
    private:
     std::shared_ptr<Kept> _kept;
+  };
+  class Left : public UnfinishedRecord {
+   public:
+    Left(const Kept& kept, const std::function<void()>& onRead) : _kept(kept), _onRead(onRead) {}
+    std::uint64_t read(const std::function<void(std::string_view piece)>& handler) const override {
+      for (const std::string& piece : _kept.pieces) {
+        handler(piece);
+        if (_onRead) _onRead();
+      }
+      return _kept.unreadableBytes;
+    }
+
+   private:
+    const Kept& _kept;
+    const std::function<void()>& _onRead;
   };
 };
 

@@ -7,7 +7,6 @@
 #include <utility>
 
 #include "platform/linux/blackbox/left_record.h"
-#include "platform/linux/blackbox/record_frame.h"
 #include "platform/linux/files/directory_names.h"
 
 namespace zal {
@@ -65,8 +64,7 @@ void FileSessionRecords::recover(const std::function<bool(const UnfinishedRecord
     const auto left = LeftRecord::take(_directory, name, _log);
     if (!left) continue;
     try {
-      const std::string content = left->content();
-      if (handler(readRecordFrames(content, left->seed()))) {
+      if (handler(*left)) {
         if (_settings.sync) ::sync();  // what came of it, wherever that lies
         left->remove();
       } else {

@@ -12,6 +12,8 @@
 #include <utility>
 
 #include "platform/linux/blackbox/record_file.h"
+#include "platform/linux/blackbox/record_frame.h"
+#include "platform/linux/blackbox/record_window.h"
 
 namespace zal {
 namespace {
@@ -42,7 +44,8 @@ std::optional<LeftRecord> LeftRecord::take(const std::string& directory, const s
     return std::nullopt;
   }
   if (::flock(file.get(), LOCK_EX | LOCK_NB) != 0) return std::nullopt;
-  LeftRecord record(std::move(file), directory, name.substr(0, kNumberLength));
+  LeftRecord record(std::move(file), static_cast<std::uint64_t>(status.st_size), directory,
+                    name.substr(0, kNumberLength));
   record._path = record._pathOf(std::string(*std::next(tried)));
   if (::rename(path.c_str(), record._path.c_str()) != 0) record._path = path;
   if (std::next(tried) != kEndings.end() - 1) return record;
@@ -50,35 +53,40 @@ std::optional<LeftRecord> LeftRecord::take(const std::string& directory, const s
   return std::nullopt;
 }
 
-LeftRecord::LeftRecord(Descriptor file, std::string directory, std::string number)
-    : _file(std::move(file)), _directory(std::move(directory)), _number(std::move(number)) {}
+LeftRecord::LeftRecord(Descriptor file, std::uint64_t size, std::string directory, std::string number)
+    : _file(std::move(file)), _size(size), _directory(std::move(directory)), _number(std::move(number)) {}
 
 std::string LeftRecord::_pathOf(const std::string& ending) const {
   return _directory + "/" + _number + ending;
 }
 
-std::uint32_t LeftRecord::seed() const { return recordSeed(_number); }
-
-std::string LeftRecord::content() const {
+void LeftRecord::_fill(std::uint64_t offset, char* buffer, std::size_t size) const {
   constexpr std::size_t kChunk = 64U << 10U;
   constexpr std::size_t kSector = 4096;
-  struct stat status {};
-  if (::fstat(_file.get(), &status) != 0) return {};
-  std::string bytes(static_cast<std::size_t>(status.st_size), '\0');
-  for (std::size_t at = 0; at < bytes.size();) {
-    const std::size_t wanted = std::min(kChunk, bytes.size() - at);
-    ssize_t count = ::pread(_file.get(), bytes.data() + at, wanted, static_cast<off_t>(at));
+  for (std::size_t done = 0; done < size;) {
+    const std::size_t wanted = std::min(kChunk, size - done);
+    const auto at = static_cast<off_t>(offset + done);
+    ssize_t count = ::pread(_file.get(), buffer + done, wanted, at);
     if (count < 0 && errno == EINTR) continue;
-    if (count < 0) {
+    if (count <= 0) {
       // Smaller steps find where the medium gives way.
       const std::size_t step = std::min(kSector, wanted);
-      count = ::pread(_file.get(), bytes.data() + at, step, static_cast<off_t>(at));
-      if (count <= 0) count = static_cast<ssize_t>(step);
+      count = ::pread(_file.get(), buffer + done, step, at);
+      if (count <= 0) {
+        std::fill_n(buffer + done, step, '\0');
+        count = static_cast<ssize_t>(step);
+      }
     }
-    if (count == 0) break;
-    at += static_cast<std::size_t>(count);
+    done += static_cast<std::size_t>(count);
   }
-  return bytes;
+}
+
+std::uint64_t LeftRecord::read(const std::function<void(std::string_view piece)>& handler) const {
+  constexpr std::size_t kWindow = 1U << 20U;
+  RecordWindow window(_size, kWindow, [this](std::uint64_t offset, char* buffer, std::size_t size) {
+    _fill(offset, buffer, size);
+  });
+  return readRecordFrames(window, recordSeed(_number), handler);
 }
 
 void LeftRecord::remove() const { ::unlink(_path.c_str()); }

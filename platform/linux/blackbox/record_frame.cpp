@@ -4,6 +4,7 @@
 
 #include <optional>
 
+#include "platform/linux/blackbox/record_window.h"
 #include "platform/linux/wire/little_endian.h"
 
 namespace zal {
@@ -28,13 +29,11 @@ std::uint32_t checksum(std::uint32_t seed, std::string_view bytes) {
   return ::crc32_iscsi(data, static_cast<int>(bytes.size()), seed);
 }
 
-/// The length of the piece that begins here, if a header does.
-std::optional<std::size_t> pieceLength(std::string_view bytes, std::uint32_t seed) {
-  if (bytes.size() < kRecordFrameHeaderSize || !bytes.starts_with(kMagic)) return std::nullopt;
-  if (numberAt(bytes, kChecked) != checksum(seed, bytes.substr(0, kChecked))) return std::nullopt;
-  const std::size_t length = numberAt(bytes, kMagic.size());
-  if (length > bytes.size() - kRecordFrameHeaderSize) return std::nullopt;  // torn
-  return length;
+/// The length of the piece that such a header announces, if it is one.
+std::optional<std::size_t> announcedLength(std::string_view header, std::uint32_t seed) {
+  if (!header.starts_with(kMagic)) return std::nullopt;
+  if (numberAt(header, kChecked) != checksum(seed, header.substr(0, kChecked))) return std::nullopt;
+  return numberAt(header, kMagic.size());
 }
 
 bool isWhole(std::string_view frame) {
@@ -54,28 +53,29 @@ void appendRecordFrame(std::string& bytes, std::uint32_t seed, std::string_view 
   bytes.append(header, sizeof header).append(piece);
 }
 
-UnfinishedRecord readRecordFrames(std::string_view bytes, std::uint32_t seed) {
-  UnfinishedRecord record;
-  std::size_t read = 0;  // everything before is a piece, or counted
-  for (std::size_t at = 0; at != std::string_view::npos;) {
-    const auto length = pieceLength(bytes.substr(at), seed);
-    if (!length) {
-      at = bytes.find(kMagic, at + 1);
+std::uint64_t readRecordFrames(RecordWindow& file, std::uint32_t seed,
+                               const std::function<void(std::string_view piece)>& handler) {
+  std::uint64_t unreadable = 0;
+  std::uint64_t read = 0;  // everything before is a piece, or counted
+  for (std::uint64_t at = 0; at + kRecordFrameHeaderSize <= file.size();) {
+    const auto length = announcedLength(file.from(at, kRecordFrameHeaderSize), seed);
+    // A piece that would go beyond the end was torn.
+    if (!length || *length > file.size() - at - kRecordFrameHeaderSize) {
+      at = file.find(kMagic, at + 1);
       continue;
     }
-    const std::string_view frame = bytes.substr(at, kRecordFrameHeaderSize + *length);
-    record.unreadableBytes += at - read;
+    const std::size_t size = kRecordFrameHeaderSize + *length;
+    const std::string_view frame = file.from(at, size).substr(0, size);
+    unreadable += at - read;
     if (isWhole(frame)) {
-      record.pieces.push_back(frame.substr(kRecordFrameHeaderSize));
+      handler(frame.substr(kRecordFrameHeaderSize));
     } else {
-      record.unreadableBytes += frame.size();
+      unreadable += size;
     }
-    at = read = at + frame.size();
+    at = read = at + size;
   }
   // What was reserved and never written reads as zeros.
-  const std::size_t last = bytes.substr(read).find_last_not_of('\0');
-  if (last != std::string_view::npos) record.unreadableBytes += last + 1;
-  return record;
+  return unreadable + file.endOfContent(read) - read;
 }
 
 }  // namespace zal

@@ -1,12 +1,14 @@
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
+#include <functional>
 #include <string>
 #include <string_view>
 
-#include "platform/session_records.h"
-
 namespace zal {
+
+class RecordWindow;
 
 // One piece of a record as it lies in the file; numbers are little-endian, checksums CRC-32C:
 //
@@ -24,8 +26,10 @@ inline constexpr std::size_t kRecordFrameHeaderSize = 16;
 
 void appendRecordFrame(std::string& bytes, std::uint32_t seed, std::string_view piece);
 
-/// Every whole piece of a file, in order. Bytes that are none are passed over and counted, but for zeros at
-/// the end. Never fails; time is linear in the bytes.
-[[nodiscard]] UnfinishedRecord readRecordFrames(std::string_view bytes, std::uint32_t seed);
+/// Gives every whole piece of a file to the handler, in order and borrowed for the call. Returned: the bytes
+/// that are none, which are passed over; zeros at the end are not counted. Never fails; time is linear in
+/// the bytes, memory is that of the window, which widens for a piece that is longer.
+std::uint64_t readRecordFrames(RecordWindow& file, std::uint32_t seed,
+                               const std::function<void(std::string_view piece)>& handler);
 
 }  // namespace zal

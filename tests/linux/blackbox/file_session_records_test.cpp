@@ -3,12 +3,14 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <fstream>
 #include <stdexcept>
 
 #include "platform/linux/blackbox/file_session_records.h"
 #include "tests/support/fake_services.h"
 #include "tests/support/file_size_limit.h"
 #include "tests/support/manual_run_loop.h"
+#include "tests/support/process_size.h"
 #include "tests/support/temporary_directory.h"
 
 namespace zal {
@@ -43,8 +45,8 @@ class FileSessionRecordsTest : public ::testing::Test {
   std::vector<Pieces> recovered(bool isServed = true) {
     std::vector<Pieces> found;
     makeRecords()->recover([&](const UnfinishedRecord& record) {
-      found.emplace_back(record.pieces.begin(), record.pieces.end());
-      unreadable = record.unreadableBytes;
+      Pieces& pieces = found.emplace_back();
+      unreadable = record.read([&pieces](std::string_view piece) { pieces.emplace_back(piece); });
       return isServed;
     });
     return found;
@@ -144,6 +146,37 @@ TEST_F(FileSessionRecordsTest, ATornEndIsCutAndCounted) {
   std::filesystem::resize_file(file, std::filesystem::file_size(file) - 1);
   EXPECT_THAT(recovered(), ElementsAre(Pieces{"one"}));
   EXPECT_EQ(unreadable, 18U);
+}
+
+TEST_F(FileSessionRecordsTest, ALargeRecordIsReadAPartAtATimeAndAsOftenAsAskedFor) {
+  constexpr std::size_t kPieces = 24'000;
+  leave(Pieces(kPieces, std::string(1000, 'x')));
+  {
+    std::fstream file(files().at(0), std::ios::in | std::ios::out);
+    file.seekp(10 << 20).put('y');
+  }
+  const auto resident = [] { return testing::ProcessSize::of(::getpid()).residentKilobytes; };
+  const std::uint64_t before = resident();
+  std::uint64_t most = before;
+  makeRecords()->recover([&](const UnfinishedRecord& record) {
+    for (int time = 0; time < 2; ++time) {
+      std::size_t pieces = 0;
+      EXPECT_EQ(record.read([&](std::string_view piece) {
+        EXPECT_EQ(piece.size(), 1000U);
+        if (++pieces % 1000 == 0) most = std::max(most, resident());
+      }),
+                1016U);
+      EXPECT_EQ(pieces, kPieces - 1);
+    }
+    return true;
+  });
+  EXPECT_LT(most - before, 8U << 10U);
+}
+
+TEST_F(FileSessionRecordsTest, APieceThatIsLongerThanThatIsReadWhole) {
+  const Pieces pieces{"one", std::string(5 << 20, 'x'), "two"};
+  leave(pieces);
+  EXPECT_TRUE(recovered() == std::vector<Pieces>{pieces});
 }
 
 TEST_F(FileSessionRecordsTest, WhatDidNotServeStaysForTheNextTimeHoweverOften) {

@@ -1,14 +1,18 @@
+#include "platform/linux/blackbox/record_frame.h"
+
 #include <gmock/gmock.h>
 
-#include "platform/linux/blackbox/record_frame.h"
+#include <random>
+
+#include "fuzz/record_content.h"
 
 namespace zal {
 namespace {
 
 using ::testing::ElementsAre;
-using ::testing::IsEmpty;
 
 constexpr std::uint32_t kSeed = 0x5eed1234;
+constexpr std::size_t kWidth = 64;
 
 class RecordFrameTest : public ::testing::Test {
  protected:
@@ -23,11 +27,16 @@ class RecordFrameTest : public ::testing::Test {
     }
   }
   static std::vector<std::string> readPieces(const std::string& content) {
-    const UnfinishedRecord record = readRecordFrames(content, kSeed);
-    return {record.pieces.begin(), record.pieces.end()};
+    return readThroughWindow(content, kSeed, kWidth).pieces;
   }
   static std::uint64_t unreadable(const std::string& content) {
-    return readRecordFrames(content, kSeed).unreadableBytes;
+    return readThroughWindow(content, kSeed, kWidth).unreadableBytes;
+  }
+  void expectTheSameThroughAnyWindow(const std::string& content) const {
+    const RecordContent whole = readAsWritten(content, kSeed);
+    for (const std::size_t width : {1, 7, 16, 17, 40, 100, 1000}) {
+      ASSERT_EQ(readThroughWindow(content, kSeed, width), whole) << width;
+    }
   }
   [[nodiscard]] std::size_t endOf(std::size_t piece) const {
     return piece + 1 < begins.size() ? begins[piece + 1] : bytes.size();
@@ -92,8 +101,7 @@ TEST_F(RecordFrameTest, RoomThatWasNeverWrittenIsNoDamage) {
 }
 
 TEST_F(RecordFrameTest, AnotherFilesPiecesAreNone) {
-  EXPECT_THAT(readRecordFrames(bytes, kSeed + 7).pieces, IsEmpty());
-  EXPECT_EQ(readRecordFrames(bytes, kSeed + 7).unreadableBytes, bytes.size());
+  EXPECT_EQ(readThroughWindow(bytes, kSeed + 7, kWidth), (RecordContent{{}, bytes.size()}));
 }
 
 TEST_F(RecordFrameTest, AFileOfBeginningsIsReadInOneGo) {
@@ -101,6 +109,53 @@ TEST_F(RecordFrameTest, AFileOfBeginningsIsReadInOneGo) {
   for (int i = 0; i < 200'000; ++i) beginnings.append("ZR\xB1\x01\xF0\xFF\x0F\0", 8);
   EXPECT_THAT(readPieces(beginnings + bytes), ::testing::ElementsAreArray(pieces));
   EXPECT_EQ(unreadable(beginnings + bytes), beginnings.size());
+}
+
+TEST_F(RecordFrameTest, FramesAcrossEveryEndOfTheWindowAreReadAsFromTheWholeFile) {
+  for (std::size_t before = 0; before < 130; ++before) {
+    expectTheSameThroughAnyWindow(std::string(before, 'Z') + bytes + std::string(before, '\0'));
+  }
+}
+
+TEST_F(RecordFrameTest, AnyDamageIsReadAsFromTheWholeFile) {
+  std::mt19937 random{3};
+  for (int round = 0; round < 2000; ++round) {
+    std::string damaged = bytes + bytes;
+    for (auto blows = 1 + random() % 3; blows > 0; --blows) {
+      const std::size_t at = random() % damaged.size();
+      const std::size_t size = std::min<std::size_t>(random() % 40, damaged.size() - at);
+      switch (random() % 4) {
+        case 0:
+          damaged.replace(at, size, size, '\0');
+          break;
+        case 1:
+          damaged.erase(at, size);
+          break;
+        case 2:
+          damaged.insert(at, bytes.substr(random() % bytes.size(), size));
+          break;
+        default:
+          damaged[at] = static_cast<char>(random());
+      }
+    }
+    expectTheSameThroughAnyWindow(damaged);
+  }
+}
+
+TEST_F(RecordFrameTest, NoMoreIsHeldThanTheWindowOrTheLongestPiece) {
+  std::string large;
+  for (int copy = 0; copy < 50; ++copy) large += bytes + std::string(300, 'Z');
+  const auto mostAtOnce = [&large](std::size_t width) {
+    std::size_t most = 0;
+    RecordWindow window(large.size(), width, [&](std::uint64_t offset, char* buffer, std::size_t size) {
+      most = std::max(most, size);
+      large.copy(buffer, size, offset);
+    });
+    readRecordFrames(window, kSeed, [](std::string_view) {});
+    return most;
+  };
+  EXPECT_LE(mostAtOnce(256), 256U);
+  EXPECT_LE(mostAtOnce(16), kRecordFrameHeaderSize + 100);
 }
 
 }  // namespace
