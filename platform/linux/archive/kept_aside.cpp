@@ -21,15 +21,16 @@ std::string cutText(std::string text, std::size_t size) {
 
 }  // namespace
 
-std::string keepAside(const std::string& path, std::error_code& error) {
-  const std::filesystem::path here(path);
+std::string keepAside(const std::string& path, std::error_code& error, const RootedPaths& paths) {
+  const RootedPlace here = paths.placeOf(path);
+  error = here.error;
+  if (error) return {};
   for (int number = 1; number <= kMostNames; ++number) {
     const std::string ending =
         " (not archived)" + (number > 1 ? '-' + std::to_string(number) : std::string());
-    const std::string name = cutText(here.filename().string(), NAME_MAX - ending.size()) + ending;
-    const std::string aside = (here.parent_path() / name).string();
-    error = renameNoReplace(path, aside);
-    if (!error) return aside;
+    const std::string aside = cutText(here.name, NAME_MAX - ending.size()) + ending;
+    error = renameNoReplaceAt(here.directory.get(), here.name, here.directory.get(), aside);
+    if (!error) return (std::filesystem::path(path).parent_path() / aside).string();
     if (error != std::errc::file_exists && error != std::errc::directory_not_empty) return {};
   }
   return {};

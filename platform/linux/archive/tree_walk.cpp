@@ -8,7 +8,6 @@
 #include <array>
 #include <cerrno>
 #include <climits>
-#include <filesystem>
 #include <memory>
 #include <system_error>
 #include <utility>
@@ -37,12 +36,13 @@ const char* kindOf(mode_t mode) {
 
 }  // namespace
 
-TreeWalk::TreeWalk(const std::string& directory, Line leftOut, Line renamed)
+TreeWalk::TreeWalk(const RootedPaths& paths, const std::string& directory, Line leftOut, Line renamed)
     : _leftOut(std::move(leftOut)), _renamed(std::move(renamed)) {
-  Descriptor opened(::open(directory.c_str(), kOpenDirectory));
+  const RootedPlace place = paths.placeOf(directory);
+  if (place.error) throw std::system_error(place.error);
+  Descriptor opened(::openat(place.directory.get(), place.name.c_str(), kOpenDirectory));
   if (!opened.isOpen()) throw std::system_error(lastSystemError());
-  const std::string name = std::filesystem::path(directory).filename().string();
-  _first = _enter(std::move(opened), directory + '/', entryNames({name}).front() + '/');
+  _first = _enter(std::move(opened), directory + '/', entryNames({place.name}).front() + '/');
 }
 
 std::optional<FoundEntry> TreeWalk::next() {

@@ -11,6 +11,7 @@
 #include "platform/linux/archive/archive_output.h"
 #include "platform/linux/archive/zip_container.h"
 #include "platform/linux/files/descriptor.h"
+#include "platform/linux/files/rooted_paths.h"
 
 namespace zal {
 
@@ -30,7 +31,7 @@ class TreeWalk {
  public:
   using Line = std::function<void(const std::string&)>;
   /// Throws std::system_error when the directory cannot be read, is none, or is a link.
-  TreeWalk(const std::string& directory, Line leftOut, Line renamed);
+  TreeWalk(const RootedPaths& paths, const std::string& directory, Line leftOut, Line renamed);
   /// The next one, nothing at the end. Throws std::system_error when this process, not the file, is at
   /// fault: without descriptors or memory nothing can be said about what is there.
   [[nodiscard]] std::optional<FoundEntry> next();

@@ -240,7 +240,8 @@ class ArchiveWriter {
 
 ArchiveOutcome writeZipArchive(const std::string& directory, const std::string& output,
                                ArchiveCompression compression, const ArchiveEnding& ending,
-                               const std::function<void(const std::string&)>& line) {
+                               const std::function<void(const std::string&)>& line,
+                               const RootedPaths& paths) {
   ArchiveOutcome outcome;
   try {
     // The walk is there before the output is made, and what it leaves out at its beginning waits so long.
@@ -249,7 +250,7 @@ ArchiveOutcome writeZipArchive(const std::string& directory, const std::string& 
     const auto leftOut = [&](const std::string& text) {
       writer != nullptr ? writer->remark(text) : early.push_back(text);
     };
-    TreeWalk walk(directory, leftOut, line);
+    TreeWalk walk(paths, directory, leftOut, line);
     ArchiveOutput file(output);
     outcome.outputIsOurs = file.isMade();
     if (file.error()) throw std::system_error(file.error(), output);

@@ -16,6 +16,7 @@ namespace {
 struct JobDescription {
   std::string input, output, identifier;
   ArchiveCompression compression;
+  RootedPaths paths;
 };
 
 class ZipJob : public FileCopierJob, public std::enable_shared_from_this<ZipJob> {
@@ -41,8 +42,9 @@ class ZipJob : public FileCopierJob, public std::enable_shared_from_this<ZipJob>
 
  private:
   void _write() {
-    _outcome = writeZipArchive(_description.input, _description.output, _description.compression, _ending,
-                               [this](const std::string& line) { _log.notice(line); });
+    _outcome = writeZipArchive(
+        _description.input, _description.output, _description.compression, _ending,
+        [this](const std::string& line) { _log.notice(line); }, _description.paths);
     if (!_outcome.failure.empty()) return _fail(_outcome.failure);
     _queues.global(QueuePriority::standard).async([self = shared_from_this()] { self->_check(); });
   }
@@ -70,7 +72,7 @@ class ZipJob : public FileCopierJob, public std::enable_shared_from_this<ZipJob>
   void _setAside(const std::string& why) {
     const std::string& input = _description.input;
     std::error_code error;
-    const std::string aside = keepAside(input, error);
+    const std::string aside = keepAside(input, error, _description.paths);
     _log.warning('"' + input + "\" " + why + "; " +
                  (error ? "it stays where it is, as it cannot be moved aside: " + error.message()
                         : "it is kept as \"" + aside + '"'));
@@ -97,8 +99,8 @@ std::shared_ptr<FileCopierJob> ZipFileCopier::makeJob(std::string input, std::st
                                                       std::string identifier, CopierOperation /*operation*/,
                                                       WorkQueue& queue, Completion completion) {
   return std::make_shared<ZipJob>(
-      JobDescription{std::move(input), std::move(output), std::move(identifier), _compression}, _queues, _log,
-      queue, std::move(completion));
+      JobDescription{std::move(input), std::move(output), std::move(identifier), _compression, _paths},
+      _queues, _log, queue, std::move(completion));
 }
 
 }  // namespace zal

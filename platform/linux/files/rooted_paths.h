@@ -22,6 +22,8 @@ struct RootedPlace {
 /// counts. A path below none of them is taken as it is, links and all. Any thread.
 class RootedPaths {
  public:
+  /// Without roots.
+  RootedPaths() = default;
   /// Absolute, or beginning with "~", which is the home directory.
   RootedPaths(const std::vector<std::string>& roots, std::string_view home);
 

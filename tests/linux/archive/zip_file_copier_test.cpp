@@ -194,6 +194,24 @@ TEST_P(ZipFileCopierTest, AnInputThatIsALinkIsNotFollowed) {
   EXPECT_EQ(log.lines.size(), 1U);
 }
 
+TEST_P(ZipFileCopierTest, AnInputBehindALinkBelowARootIsNeitherArchivedNorMovedAside) {
+  writeFile(files() + "/elsewhere/Dump/file", "theirs");
+  std::filesystem::create_directory(files() + "/root");
+  std::filesystem::create_directory_symlink("../elsewhere", files() + "/root/Vistel");
+  ZipFileCopier rooted(queues, log, GetParam(), {{files() + "/root"}, ""});
+  const std::string behind = files() + "/root/Vistel/Dump";
+  const auto job = rooted.makeJob(behind, output(), "behind", CopierOperation::compressIntoZip, queues.main(),
+                                  [](FileCopierJob&) {});
+  job->start();
+  queues.runAll();
+  EXPECT_FALSE(std::filesystem::exists(output()));
+  EXPECT_EQ(listTree(files() + "/elsewhere"), "Dump/\nDump/file\n");
+  const std::string why = "Too many levels of symbolic links";
+  EXPECT_EQ(log.lines,
+            std::vector<std::string>{"warning: \"" + behind + "\" could not be archived (" + why +
+                                     "); it stays where it is, as it cannot be moved aside: " + why});
+}
+
 TEST_P(ZipFileCopierTest, WhatStandsAtTheOutputStaysAndTheInputIsMovedAside) {
   writeFile(input("file"), "x");
   writeFile(output(), "somebody's");
