@@ -193,9 +193,10 @@ bool addSessionEntries(Rows& rows, const std::filesystem::path& programs, const 
   return true;
 }
 
+constexpr double kMostMemory = 300e6 / (1 << 20);
+
 /// Returned: whether the session was written as it should be, or a good reason that there was none.
 bool addLongSession(Rows& rows, const std::filesystem::path& programs, std::uint64_t entries) {
-  constexpr double kMostMemory = 300e6 / (1 << 20);
   constexpr double kLongestHold = 0.050;
   fprintf(stderr, "a session of %llu lines\n", static_cast<unsigned long long>(entries));
   const std::string lines = " of a session of " + std::to_string(entries) + " lines";
@@ -210,6 +211,21 @@ bool addLongSession(Rows& rows, const std::filesystem::path& programs, std::uint
   rows.push_back({"end" + lines + ", 3 s of delay included", duration(figures.secondsToEnd), "", "", "", ""});
   rows.push_back({"another client's barrier, longest meanwhile", duration(figures.longestAnswer), "", "",
                   "50 ms", figures.longestAnswer <= kLongestHold ? "met" : "MISSED"});
+  return true;
+}
+
+/// Returned: as above.
+bool addRecoveredSession(Rows& rows, const std::filesystem::path& programs, std::uint64_t entries) {
+  fprintf(stderr, "a session of %llu lines that is recovered\n", static_cast<unsigned long long>(entries));
+  const std::string lines = " a session of " + std::to_string(entries) + " lines";
+  const RecoveredSessionFigures figures = measureRecoveredSession(programs, entries);
+  if (!figures.missing.empty()) {
+    rows.push_back(skipped("memory of recovering" + lines, figures.missing));
+    return figures.peakMebibytes == 0;
+  }
+  rows.push_back({"memory of recovering" + lines + " (most resident)", mebibytes(figures.peakMebibytes), "",
+                  "", "300 MB", figures.peakMebibytes <= kMostMemory ? "met" : "MISSED"});
+  rows.push_back({"start of the agent that recovers it", duration(figures.seconds), "", "", "", ""});
   return true;
 }
 
@@ -273,6 +289,7 @@ int run(const std::filesystem::path& programs, bool quick) {
   bool ownPart = addStartUp(rows, programs, extent.startUps);
   ownPart = addSessionEntries(rows, programs, extent) && ownPart;
   ownPart = addLongSession(rows, programs, quick ? 20'000 : 10'000'000) && ownPart;
+  ownPart = addRecoveredSession(rows, programs, quick ? 20'000 : 2'000'000) && ownPart;
   ownPart = addDump(rows, programs, quick) && ownPart;
   ownPart = addStackshot(rows, programs, quick) && ownPart;
   ownPart = addBus(rows, programs, quick) && ownPart;

@@ -63,12 +63,19 @@ bool isWhole(const fs::path& log, std::uint64_t entries) {
   return next == entries;
 }
 
+bool hasRoomFor(std::uint64_t entries) {
+  return fs::space(ScratchFolder::parent()).available >= entries * kRoomForEntry;
+}
+
+constexpr const char* kNoRoom = "not enough room for its files";
+constexpr const char* kNotWhole = "the session's verbose log is not whole";
+
 }  // namespace
 
 LongSessionFigures measureLongSession(const fs::path& programs, std::uint64_t entries) {
   LongSessionFigures figures;
-  if (fs::space(ScratchFolder::parent()).available < entries * kRoomForEntry) {
-    figures.missing = "not enough room for its files";
+  if (!hasRoomFor(entries)) {
+    figures.missing = kNoRoom;
     return figures;
   }
   SessionAgent agent(programs, "");
@@ -84,7 +91,27 @@ LongSessionFigures measureLongSession(const fs::path& programs, std::uint64_t en
   figures.secondsToEnd = ending.seconds();
   figures.peakMebibytes = peakMebibytes(agent.process());
   if (!isWritten(agent) || !isWhole(verboseLogIn(agent.folder()), entries)) {
-    figures.missing = "the session's verbose log is not whole";
+    figures.missing = kNotWhole;
+  }
+  return figures;
+}
+
+RecoveredSessionFigures measureRecoveredSession(const fs::path& programs, std::uint64_t entries) {
+  RecoveredSessionFigures figures;
+  if (!hasRoomFor(entries)) {
+    figures.missing = kNoRoom;
+    return figures;
+  }
+  SessionAgent agent(programs, "");
+  figures.missing = agent.missing();
+  if (figures.missing.empty()) figures.missing = agent.send(entries);
+  if (!figures.missing.empty()) return figures;
+  const Stopwatch recovering;
+  figures.missing = agent.cutOff();
+  figures.seconds = recovering.seconds();
+  figures.peakMebibytes = peakMebibytes(agent.process());
+  if (figures.missing.empty() && (!isWritten(agent) || !isWhole(verboseLogIn(agent.folder()), entries))) {
+    figures.missing = kNotWhole;
   }
   return figures;
 }

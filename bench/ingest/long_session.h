@@ -19,4 +19,15 @@ struct LongSessionFigures {
 [[nodiscard]] LongSessionFigures measureLongSession(const std::filesystem::path& programs,
                                                     std::uint64_t entries);
 
+/// Such a session whose agent is killed, and what the next one needs to write it.
+struct RecoveredSessionFigures {
+  double peakMebibytes = 0;  ///< the most that was resident of the next one
+  double seconds = 0;        ///< from its start until it listens
+  std::string missing;       ///< why there are no figures
+};
+
+/// Fails under the same conditions.
+[[nodiscard]] RecoveredSessionFigures measureRecoveredSession(const std::filesystem::path& programs,
+                                                              std::uint64_t entries);
+
 }  // namespace zal::bench

@@ -1,6 +1,7 @@
 #include "bench/ingest/session_agent.h"
 
 #include <fstream>
+#include <utility>
 
 #include "bench/servers/agent_server.h"
 #include "bench/servers/record_text.h"
@@ -33,10 +34,10 @@ ChildProcess::Options optionsWith(const std::filesystem::path& programs, const s
 }  // namespace
 
 SessionAgent::SessionAgent(const std::filesystem::path& programs, const std::string& settings)
-    : _agent(optionsWith(programs, _folder.path(), settings)),
+    : _options(optionsWith(programs, _folder.path(), settings)),
+      _agent(_options),
       _socket(AgentServer::socketIn(_folder.path()).string()) {
-  const auto listens = [&] { return UnixSocket(UnixSocket::Kind::stream, _socket).connected(); };
-  if (!waitUntil(10, listens)) {
+  if (!_listensWithin(10)) {
     _missing = "the agent does not start";
     return;
   }
@@ -64,6 +65,18 @@ std::string SessionAgent::send(std::uint64_t entries) {
       return "an entry was refused";
   }
   return lirra_flush(_client, 60'000) == LIRRA_OK ? "" : "the barrier was not answered";
+}
+
+bool SessionAgent::_listensWithin(double seconds) const {
+  return waitUntil(seconds, [&] { return UnixSocket(UnixSocket::Kind::stream, _socket).connected(); });
+}
+
+std::string SessionAgent::cutOff() {
+  lirra_close(std::exchange(_client, nullptr), 0);
+  _agent.kill();
+  _agent = ChildProcess(_options);
+  constexpr double kLongestRecovery = 600;
+  return _listensWithin(kLongestRecovery) ? "" : "the agent does not start again";
 }
 
 void SessionAgent::endSession() { lirra_end_session(_client, kSession); }

@@ -27,13 +27,19 @@ class SessionAgent {
   /// answered. Returned: what went wrong, or nothing.
   [[nodiscard]] std::string send(std::uint64_t entries);
   void endSession();
+  /// Kills the agent and starts it again, until that one listens; there is no client then. Returned: what
+  /// went wrong, or nothing.
+  [[nodiscard]] std::string cutOff();
 
  private:
   ScratchFolder _folder;
+  ChildProcess::Options _options;
   ChildProcess _agent;
   std::string _socket;
   lirra_handle* _client = nullptr;
   std::string _missing;
+
+  [[nodiscard]] bool _listensWithin(double seconds) const;
 };
 
 }  // namespace zal::bench

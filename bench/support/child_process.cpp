@@ -89,17 +89,19 @@ bool ChildProcess::running() {
 
 void ChildProcess::stop() {
   if (!running()) return;
-  kill(_id, SIGTERM);
+  ::kill(_id, SIGTERM);
   const Stopwatch since;
   while (running()) {
-    if (since.seconds() > 3.0) {
-      kill(_id, SIGKILL);
-      waitpid(_id, nullptr, 0);
-      _id = -1;
-      return;
-    }
+    if (since.seconds() > 3.0) return kill();
     pauseMilliseconds(1);
   }
+}
+
+void ChildProcess::kill() {
+  if (!running()) return;
+  ::kill(_id, SIGKILL);
+  waitpid(_id, nullptr, 0);
+  _id = -1;
 }
 
 std::string findProgram(const std::string& name) {

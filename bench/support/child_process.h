@@ -30,6 +30,8 @@ class ChildProcess {
   [[nodiscard]] bool running();
   /// SIGTERM, then SIGKILL after three seconds.
   void stop();
+  /// SIGKILL.
+  void kill();
 
  private:
   pid_t _id = -1;
