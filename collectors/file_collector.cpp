@@ -109,6 +109,17 @@ bool FileCollector::LinkDirectoryEntriesWithSuffix(const std::string& sourceDire
 
 bool FileCollector::MoveFileIntoDirectory(const std::string& source, const std::string& directory,
                                           const std::string& suffix) {
+  return _move(source, directory, suffix, Reach::anywhere).value_or(false);
+}
+
+std::optional<bool> FileCollector::MoveFileWithinFileSystem(const std::string& source,
+                                                            const std::string& directory,
+                                                            const std::string& suffix) {
+  return _move(source, directory, suffix, Reach::fileSystem);
+}
+
+std::optional<bool> FileCollector::_move(const std::string& source, const std::string& directory,
+                                         const std::string& suffix, Reach reach) {
   const std::string resolved = _source(source, directory);
   const std::string name = nameOf(resolved);
   if (name.empty()) return false;  // "/" has no name to go under
@@ -116,7 +127,9 @@ bool FileCollector::MoveFileIntoDirectory(const std::string& source, const std::
   const auto target = _files.uniqueSavePath(wanted);
   _makeParent(target.value_or(wanted));
   if (target) {
-    const std::error_code error = _files.move(resolved, *target);
+    const std::error_code error =
+        reach == Reach::anywhere ? _files.move(resolved, *target) : _files.rename(resolved, *target);
+    if (reach == Reach::fileSystem && error == std::errc::cross_device_link) return std::nullopt;
     _tell(resolved, directory, error);
     return !error;
   }

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <optional>
 #include <string>
 #include <system_error>
 #include <vector>
@@ -42,6 +43,10 @@ class FileCollector {
   /// name can be found the file is removed.
   bool MoveFileIntoDirectory(const std::string& source, const std::string& directory,
                              const std::string& suffix);
+  /// The same as far as it is quick: nothing, and nothing happens, where the file would have to be copied to
+  /// another file system.
+  std::optional<bool> MoveFileWithinFileSystem(const std::string& source, const std::string& directory,
+                                               const std::string& suffix);
 
   /// Makes the directory with all missing parents, with mode 0777. Returned: why it is not there.
   std::error_code MakeDirectory(const std::string& directory);
@@ -58,6 +63,9 @@ class FileCollector {
   [[nodiscard]] std::string _resolved(const std::string& path) const;
   /// The source as a path without links; empty, and told, when there is nothing to take.
   [[nodiscard]] std::string _source(const std::string& path, const std::string& directory) const;
+  enum class Reach { fileSystem, anywhere };
+  std::optional<bool> _move(const std::string& source, const std::string& directory,
+                            const std::string& suffix, Reach reach);
   bool _linkEntry(const std::string& sourceDirectory, const std::string& name, const std::string& directory);
   void _makeParent(const std::string& target);
   void _copy(const std::string& source, const std::string& target, std::error_code& errorSlot);

@@ -25,6 +25,8 @@ class FilePlacement {
   /// Where the target lies on another file system, and only there, a file gets a copy with its mode
   /// and times instead, which no longer grows with its writer; anything else is an error.
   virtual std::error_code link(const std::string& source, const std::string& target) = 0;
+  /// Quick. An existing target is an error, and so is one on another file system: cross_device_link.
+  virtual std::error_code rename(const std::string& source, const std::string& target) = 0;
   /// Rename; across file systems a synced copy and then the removal, so that at every moment at
   /// least one whole file exists. An existing target is an error.
   virtual std::error_code move(const std::string& source, const std::string& target) = 0;

@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <filesystem>
+#include <utility>
 
 #include "collectors/file_collector.h"
 #include "platform/agent_log.h"
@@ -40,23 +41,55 @@ std::string fileSetText(const std::set<std::string>& files) {
   return text.empty() ? "{}" : text + "}";
 }
 
-void placeCollectedFiles(const FilesByCategory& files, const std::string& directory, FileCollector& collector,
-                         AgentLog& log) {
-  for (const auto& [category, paths] : files) {
-    const auto contained = containedCategory(category);
-    if (!contained) {
-      log.warning("Refused the file category \"" + printable(category) +
-                  "\": it leads out of the session directory");
-      continue;
-    }
-    const std::string destination = directory + "/" + *contained;
-    log.notice("category:" + destination + " files=" + fileSetText(paths));
-    if (const std::error_code error = collector.MakeDirectory(destination)) {
-      log.warning("No files are moved into " + destination + ": " + error.message());
-      continue;
-    }
-    for (const std::string& path : paths) collector.MoveFileIntoDirectory(path, destination, "");
+CollectedFilesMove::CollectedFilesMove(FilesByCategory files, std::string directory, FileCollector& collector,
+                                       AgentLog& log)
+    : _left(std::move(files)), _directory(std::move(directory)), _collector(collector), _log(log) {}
+
+void CollectedFilesMove::_beginCategory() {
+  const auto& [category, paths] = *_left.begin();
+  _hasBegun = true;
+  _destination.reset();
+  const auto contained = containedCategory(category);
+  if (!contained) {
+    _log.warning("Refused the file category \"" + printable(category) +
+                 "\": it leads out of the session directory");
+    return;
   }
+  const std::string destination = _directory + "/" + *contained;
+  _log.notice("category:" + destination + " files=" + fileSetText(paths));
+  if (const std::error_code error = _collector.MakeDirectory(destination)) {
+    _log.warning("No files are moved into " + destination + ": " + error.message());
+    return;
+  }
+  _destination = destination;
+}
+
+template <class Mover>
+bool CollectedFilesMove::_go(const Mover& isMoved) {
+  while (!_left.empty()) {
+    if (!_hasBegun) _beginCategory();
+    std::set<std::string>& paths = _left.begin()->second;
+    while (_destination && !paths.empty()) {
+      if (!isMoved(*paths.begin())) return false;
+      paths.erase(paths.begin());
+    }
+    _left.erase(_left.begin());
+    _hasBegun = false;
+  }
+  return true;
+}
+
+bool CollectedFilesMove::moveWithinFileSystem() {
+  return _go([this](const std::string& path) {
+    return _collector.MoveFileWithinFileSystem(path, *_destination, "").has_value();
+  });
+}
+
+void CollectedFilesMove::moveRest() {
+  _go([this](const std::string& path) {
+    _collector.MoveFileIntoDirectory(path, *_destination, "");
+    return true;
+  });
 }
 
 }  // namespace zal

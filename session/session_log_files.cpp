@@ -1,5 +1,7 @@
 #include <filesystem>
+#include <memory>
 #include <system_error>
+#include <vector>
 
 #include "collectors/file_collector.h"
 #include "collectors/rotated_log_sets.h"
@@ -7,8 +9,10 @@
 #include "platform/file_placement.h"
 #include "platform/session_records.h"
 #include "platform/standard_path.h"
+#include "session/collected_files.h"
 #include "session/date_text.h"
 #include "session/session_lines.h"
+#include "session/session_log_writing.h"
 #include "session/session_writings.h"
 #include "session/vistel_session.h"
 
@@ -18,6 +22,19 @@ namespace {
 
 /// A log of fewer lines says nothing but that there was a session.
 constexpr std::size_t kFewestLines = 4;
+
+/// What has to be copied to another file system would hold the main thread for as long as that takes.
+void placeCollectedFiles(const std::shared_ptr<CollectedFilesMove>& files, SessionServices& services,
+                         const SessionWritings::Finish& finish) {
+  const SessionLogWriting::File moveRest = [files] {
+    files->moveRest();
+    return true;
+  };
+  if (files->moveWithinFileSystem()) return finish(true);
+  if (services.writings == nullptr) return finish(moveRest());
+  const std::vector<SessionLogWriting::File> parts{moveRest};
+  services.writings->begin(std::make_shared<SessionLogWriting>(parts, services.agentLog), finish);
+}
 
 }  // namespace
 
@@ -72,14 +89,17 @@ void ZalLoggingAgentVistelSession::writeSessionLog(bool endedByEndAll) {
 
   const bool areLarge = _logs.areLarge();
   const SessionLogs::Taken logs = _logs.take(directory, fileEnding);
-  const auto finish = [&services = _services, directory, hold = logs.hold, record = _recorder.release(),
-                       files = _filesToCollect,
-                       collection = _collection(directory, endedByEndAll)](bool isWritten) {
-    hold->release(hold->bytes());
-    placeCollectedFiles(files, directory, services.fileCollector, services.agentLog);
+  const auto close = [&services = _services, directory, record = _recorder.release(),
+                      collection = _collection(directory, endedByEndAll)](bool isWritten) {
     // One that is left stays: perhaps the disk takes the files at the next start.
     if (record && isWritten) record->remove(directory);
     if (services.CollectServiceLogs) services.CollectServiceLogs(collection);
+  };
+  const auto files =
+      std::make_shared<CollectedFilesMove>(_filesToCollect, directory, _services.fileCollector, log);
+  const auto finish = [&services = _services, hold = logs.hold, files, close](bool isWritten) {
+    hold->release(hold->bytes());
+    placeCollectedFiles(files, services, [close, isWritten](bool isPlaced) { close(isWritten && isPlaced); });
   };
   if (areLarge && _services.writings != nullptr) return _services.writings->begin(logs.writing, finish);
   _isWritten = logs.writing->run();

@@ -21,7 +21,7 @@ bool SessionLogWriting::_write() {
     try {
       isWritten &= file();
     } catch (const std::exception& exception) {
-      _log.warning(std::string("A log file of a session was given up: ") + exception.what());
+      _log.warning(std::string("A file of a session was given up: ") + exception.what());
       isWritten = false;
     }
   }

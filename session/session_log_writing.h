@@ -8,15 +8,16 @@
 
 namespace zal {
 
-/// The log files of one ended session, written once by whoever comes first. Any thread.
+/// Files of one ended session, its logs or those that were collected, put into its directory once, by whoever
+/// comes first. Any thread.
 class SessionLogWriting {
  public:
-  /// Writes one file; returned: whether everything is in it.
+  /// Writes or moves; returned: whether everything is there.
   using File = std::function<bool()>;
   /// The log outlives it.
   SessionLogWriting(std::vector<File> files, AgentLog& log) : _log(log), _files(std::move(files)) {}
 
-  /// Writes the files, or waits for the one who does. Returned: whether everything is in them.
+  /// Does it, or waits for the one who does. Returned: whether everything is there.
   bool run();
 
  private:

@@ -65,7 +65,7 @@ struct SessionServices {
   MemoryLedger* memory = nullptr;
   SpillFiles* spillFiles = nullptr;
   WorkQueues* queues = nullptr;         ///< for the way to the disk
-  SessionWritings* writings = nullptr;  ///< for the end of large sessions
+  SessionWritings* writings = nullptr;  ///< for the end of sessions that takes long
 };
 
 }  // namespace zal

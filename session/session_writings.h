@@ -10,8 +10,9 @@
 
 namespace zal {
 
-/// Large sessions that have ended and whose files are being written, one after the other and away from the
-/// main thread. Main thread only; loop and queues outlive it. What is unfinished at its end is not told.
+/// Ended sessions whose files take long, as there are many lines or files from another file system: they are
+/// written one after the other and away from the main thread. Main thread only; loop and queues outlive it.
+/// What is unfinished at its end is not told.
 class SessionWritings {
  public:
   using Finish = std::function<void(bool isWritten)>;

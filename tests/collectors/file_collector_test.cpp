@@ -130,6 +130,18 @@ TEST_F(FileCollectorTest, FailedMoveReturnsFalseAndLeavesTheSource) {
   EXPECT_EQ(testing::readFile(in + "/ping.log"), "content of ping.log\n");
 }
 
+TEST_F(FileCollectorTest, AQuickMoveLeavesWhatLiesOnAnotherFileSystem) {
+  put("ping.log");
+  bool isElsewhere = true;
+  files.isElsewhere = [&](const std::string&) { return isElsewhere; };
+  EXPECT_EQ(collector.MoveFileWithinFileSystem(in + "/ping.log", out, ""), std::nullopt);
+  EXPECT_TRUE(fs::exists(in + "/ping.log"));
+  isElsewhere = false;
+  EXPECT_EQ(collector.MoveFileWithinFileSystem(in + "/ping.log", out, ""), true);
+  EXPECT_EQ(collector.MoveFileWithinFileSystem(in + "/ping.log", out, ""), false);
+  EXPECT_EQ(testing::listTree(out), "ping.log\n");
+}
+
 class NoFreeName : public testing::PlainFilePlacement {
  public:
   using PlainFilePlacement::PlainFilePlacement;

@@ -38,7 +38,7 @@ TEST(CollectedFilesTest, ShowsControlCharactersAsQuestionMarks) {
   EXPECT_EQ(printable(std::string_view("a\nb\0c é", 8)), "a?b?c é");
 }
 
-class PlaceCollectedFilesTest : public ::testing::Test {
+class CollectedFilesMoveTest : public ::testing::Test {
  protected:
   testing::TemporaryDirectory home;
   testing::PlainFilePlacement files{home.path()};
@@ -47,15 +47,16 @@ class PlaceCollectedFilesTest : public ::testing::Test {
   FileCollector collector{files, log, roots};
   std::string directory = home / "session";
 
-  PlaceCollectedFilesTest() { std::filesystem::create_directory(directory); }
+  CollectedFilesMoveTest() { std::filesystem::create_directory(directory); }
   std::string fileNamed(const std::string& name) {
     testing::writeFile(home / name, name);
     return home / name;
   }
-  void place(const FilesByCategory& wanted) { placeCollectedFiles(wanted, directory, collector, log); }
+  CollectedFilesMove moveOf(const FilesByCategory& wanted) { return {wanted, directory, collector, log}; }
+  void place(const FilesByCategory& wanted) { moveOf(wanted).moveRest(); }
 };
 
-TEST_F(PlaceCollectedFilesTest, MovesFilesIntoTheirCategory) {
+TEST_F(CollectedFilesMoveTest, MovesFilesIntoTheirCategory) {
   const std::string a = fileNamed("a.log");
   const std::string b = fileNamed("b.log");
   place({{"Ping", {a, b}}});
@@ -65,17 +66,17 @@ TEST_F(PlaceCollectedFilesTest, MovesFilesIntoTheirCategory) {
             std::vector<std::string>{"notice: category:" + directory + "/Ping files={" + a + ", " + b + "}"});
 }
 
-TEST_F(PlaceCollectedFilesTest, AnEmptyCategoryIsTheDirectoryItself) {
+TEST_F(CollectedFilesMoveTest, AnEmptyCategoryIsTheDirectoryItself) {
   place({{"", {fileNamed("a.log")}}});
   EXPECT_EQ(testing::listTree(directory), "a.log\n");
 }
 
-TEST_F(PlaceCollectedFilesTest, PassesOverWhatIsMissing) {
+TEST_F(CollectedFilesMoveTest, PassesOverWhatIsMissing) {
   place({{"Ping", {home / "missing.log", fileNamed("there.log")}}});
   EXPECT_EQ(testing::listTree(directory), "Ping/\nPing/there.log\n");
 }
 
-TEST_F(PlaceCollectedFilesTest, RefusesACategoryThatLeadsOutAndGoesOn) {
+TEST_F(CollectedFilesMoveTest, RefusesACategoryThatLeadsOutAndGoesOn) {
   const std::string a = fileNamed("a.log");
   const std::string b = fileNamed("b.log");
   place({{"../escaped", {a}}, {"Ping", {b}}});
@@ -86,16 +87,38 @@ TEST_F(PlaceCollectedFilesTest, RefusesACategoryThatLeadsOutAndGoesOn) {
                 "notice: category:" + directory + "/Ping files={" + b + "}"}));
 }
 
-TEST_F(PlaceCollectedFilesTest, SkipsACategoryWhoseDirectoryCannotBeMade) {
+TEST_F(CollectedFilesMoveTest, SkipsACategoryWhoseDirectoryCannotBeMade) {
   testing::writeFile(directory + "/Ping", "a file where a directory belongs");
   place({{"Ping", {fileNamed("a.log")}}, {"Video", {fileNamed("b.log")}}});
   EXPECT_EQ(testing::listTree(home.path()),
             "a.log\nsession/\nsession/Ping\nsession/Video/\nsession/Video/b.log\n");
 }
 
-TEST_F(PlaceCollectedFilesTest, MakesDirectoriesOpenToEverybody) {
+TEST_F(CollectedFilesMoveTest, MakesDirectoriesOpenToEverybody) {
   place({{"a/b", {}}});
   EXPECT_EQ(std::filesystem::status(directory + "/a/b").permissions(), std::filesystem::perms::all);
+}
+
+TEST_F(CollectedFilesMoveTest, WithinAFileSystemItIsDoneAtOnce) {
+  EXPECT_TRUE(
+      moveOf({{"", {fileNamed("a.log")}}, {"../escaped", {fileNamed("b.log")}}}).moveWithinFileSystem());
+  EXPECT_EQ(testing::listTree(home.path()), "b.log\nsession/\nsession/a.log\n");
+}
+
+TEST_F(CollectedFilesMoveTest, StopsAtAFileOfAnotherFileSystemAndGoesOnInTheSameOrder) {
+  const FilesByCategory wanted{{"", {fileNamed("1.log"), fileNamed("2.log"), fileNamed("3.log")}},
+                               {"Ping", {fileNamed("4.log")}}};
+  files.isElsewhere = [](const std::string& source) { return source.ends_with("/2.log"); };
+  auto move = moveOf(wanted);
+  EXPECT_FALSE(move.moveWithinFileSystem());
+  EXPECT_EQ(testing::listTree(home.path()), "2.log\n3.log\n4.log\nsession/\nsession/1.log\n");
+  const std::vector<std::string> told = log.lines;
+  EXPECT_FALSE(move.moveWithinFileSystem());
+  move.moveRest();
+  EXPECT_EQ(testing::listTree(home.path()),
+            "session/\nsession/1.log\nsession/2.log\nsession/3.log\nsession/Ping/\nsession/Ping/4.log\n");
+  EXPECT_EQ(log.lines.size(), told.size() + 1);  // a line for each category
+  EXPECT_TRUE(move.moveWithinFileSystem());
 }
 
 }  // namespace

@@ -37,6 +37,12 @@ class PlainFilePlacement : public FilePlacement {
     if (!error) std::filesystem::create_hard_link(source, target, error);
     return error;
   }
+  /// Sources that lie on another file system: they can be moved, not renamed.
+  std::function<bool(const std::string& source)> isElsewhere;
+  std::error_code rename(const std::string& source, const std::string& target) override {
+    if (isElsewhere && isElsewhere(source)) return std::make_error_code(std::errc::cross_device_link);
+    return move(source, target);
+  }
   std::error_code move(const std::string& source, const std::string& target) override {
     std::error_code error = _injected(source);
     if (!error && std::filesystem::exists(target)) error = std::make_error_code(std::errc::file_exists);

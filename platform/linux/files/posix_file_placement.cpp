@@ -89,6 +89,11 @@ std::error_code PosixFilePlacement::link(const std::string& source, const std::s
   return copyTreeTo(to.directory.get(), source, to.name, {}).error;
 }
 
+std::error_code PosixFilePlacement::rename(const std::string& source, const std::string& target) {
+  const RootedPlace to = _paths.placeOf(target);
+  return to.error ? to.error : renameNoReplaceAt(AT_FDCWD, source, to.directory.get(), to.name);
+}
+
 std::error_code PosixFilePlacement::move(const std::string& source, const std::string& target) {
   const RootedPlace to = _paths.placeOf(target);
   if (to.error) return to.error;

@@ -32,6 +32,7 @@ class PosixFilePlacement : public FilePlacement {
   /// Tries 10,000 names.
   [[nodiscard]] std::optional<std::string> uniqueSavePath(const std::string& path) override;
   std::error_code link(const std::string& source, const std::string& target) override;
+  std::error_code rename(const std::string& source, const std::string& target) override;
   std::error_code move(const std::string& source, const std::string& target) override;
   std::error_code prepareOutput(const std::string& path) override;
   std::error_code copy(const std::string& source, const std::string& target) override;

@@ -281,6 +281,14 @@ TEST_F(MoveAcrossFileSystemsTest, AFileArrivesWholeWithModeAndTime) {
   EXPECT_EQ(listTree(other.path), "b\n");
 }
 
+TEST_F(MoveAcrossFileSystemsTest, ARenameSaysThatItIsNoneAndCopiesNothing) {
+  putLargeFile("a");
+  EXPECT_EQ(files.rename(directory / "a", other / "b"), std::errc::cross_device_link);
+  EXPECT_EQ(listTree(other.path), "");
+  EXPECT_FALSE(files.rename(directory / "a", directory / "b"));
+  expectLargeFile(directory / "b");
+}
+
 TEST_F(MoveAcrossFileSystemsTest, ADirectoryArrivesWithAllBelowIt) {
   writeFile(directory / "a/deep/file", "content");
   fs::create_symlink("deep", directory / "a/link");
