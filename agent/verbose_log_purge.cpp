@@ -1,10 +1,10 @@
 #include "agent/verbose_log_purge.h"
 
-#include <filesystem>
-#include <system_error>
+#include <string>
 #include <vector>
 
 #include "collectors/directory_listing.h"
+#include "platform/file_placement.h"
 
 namespace zal {
 namespace {
@@ -14,14 +14,13 @@ constexpr std::string_view kVerboseLogMarker = "-Verbose-";
 
 }  // namespace
 
-void purgeVerboseLogs(const std::string& logRoot, std::span<const std::string_view> types) {
+void purgeVerboseLogs(FilePlacement& files, const std::string& logRoot,
+                      std::span<const std::string_view> types) {
   for (const std::string_view type : types) {
     const std::string directory = logRoot + "/" + std::string(type);
     for (const std::string& name : listDirectory(directory, HiddenEntries::skipped).value_or(Names{})) {
       const std::string path = std::string(directory).append("/").append(name);
-      if (path.find(kVerboseLogMarker) == std::string::npos) continue;
-      std::error_code ignored;
-      std::filesystem::remove_all(path, ignored);
+      if (path.find(kVerboseLogMarker) != std::string::npos) files.remove(path);
     }
   }
 }

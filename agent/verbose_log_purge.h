@@ -6,9 +6,12 @@
 
 namespace zal {
 
+class FilePlacement;
+
 /// Deletes what earlier runs left of verbose logs: every visible entry of `logRoot`/<type> whose
 /// full path contains "-Verbose-", one level deep. A directory that cannot be listed is passed over
 /// and a failed deletion ignored, both without a word.
-void purgeVerboseLogs(const std::string& logRoot, std::span<const std::string_view> types);
+void purgeVerboseLogs(FilePlacement& files, const std::string& logRoot,
+                      std::span<const std::string_view> types);
 
 }  // namespace zal

@@ -71,6 +71,7 @@ ZalLoggingAgentServer::ZalLoggingAgentServer(Platform& platform, SessionServices
       std::string(kSessionBecameInactive), [this](void* session) { _sessionBecameInactive(session); });
   _noteActivity();
   purgeVerboseLogs(
+      _platform.files,
       resolveAndStandardize(_platform.configuration.roots.MobileLogRoot, _platform.files.homeDirectory()),
       SessionTypeList);
 }

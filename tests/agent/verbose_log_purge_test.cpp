@@ -4,6 +4,7 @@
 
 #include <array>
 
+#include "tests/support/plain_file_placement.h"
 #include "tests/support/temporary_directory.h"
 
 namespace zal {
@@ -16,9 +17,10 @@ class VerboseLogPurgeTest : public ::testing::Test {
  protected:
   void purge() {
     constexpr std::array<std::string_view, 2> types = {"Nexa", "Messages"};
-    purgeVerboseLogs(root.path(), types);
+    purgeVerboseLogs(files, root.path(), types);
   }
   testing::TemporaryDirectory root;
+  testing::PlainFilePlacement files{root / "home"};
 };
 
 TEST_F(VerboseLogPurgeTest, DeletesVisibleEntriesWithTheMarkerAndKeepsTheRest) {
@@ -51,7 +53,7 @@ TEST_F(VerboseLogPurgeTest, PassesOverADirectoryThatIsMissingOrIsAFile) {
 TEST_F(VerboseLogPurgeTest, TheMarkerCountsAnywhereInTheFullPath) {
   constexpr std::array<std::string_view, 1> types = {"Nexa"};
   writeFile(root / "logs-Verbose-set/Nexa/plain.log", "below a marked directory");
-  purgeVerboseLogs(root / "logs-Verbose-set", types);
+  purgeVerboseLogs(files, root / "logs-Verbose-set", types);
   EXPECT_EQ(listTree(root.path()), "logs-Verbose-set/\nlogs-Verbose-set/Nexa/\n");
 }
 

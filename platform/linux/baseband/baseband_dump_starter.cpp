@@ -32,6 +32,10 @@ class BasebandDumpStarter::State : public std::enable_shared_from_this<State> {
       _log.notice("A baseband dump is being written already; it stands for this one too");
       return;
     }
+    if (const auto error = _places.paths.makeDirectories(_places.directory)) {
+      _log.warning("Baseband dump: cannot make " + _places.directory + ": " + error.message());
+      return;
+    }
     if (const auto error = HandOffMarker::place(_places.marker))
       _log.warning("Cannot make " + _places.marker + ": " + error.message());
     const std::string text(cutAtCharacter(reason, kLongestReason));

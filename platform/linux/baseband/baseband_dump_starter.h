@@ -7,6 +7,7 @@
 #include <asio/io_context.hpp>
 
 #include "platform/agent_log.h"
+#include "platform/linux/files/rooted_paths.h"
 
 namespace zal {
 
@@ -22,6 +23,7 @@ class BasebandDumpStarter {
     std::string helper;     ///< the program's path
     std::string directory;  ///< for the files; made when it is missing
     std::string marker;     ///< is there as long as files are being written
+    RootedPaths paths{};    ///< how the directory is reached: the program would follow a link
   };
   /// The reason is cut there, in bytes: it becomes an argument.
   static constexpr std::size_t kLongestReason = 4096;
@@ -32,8 +34,9 @@ class BasebandDumpStarter {
   BasebandDumpStarter(const BasebandDumpStarter&) = delete;
   BasebandDumpStarter& operator=(const BasebandDumpStarter&) = delete;
 
-  /// The marker is there when it returns. When the program cannot be started the marker is gone again
-  /// and one line in the log says why; one of a program that was killed goes with its end.
+  /// The marker is there when it returns. When the directory cannot be made, or the program not started, the
+  /// marker is gone again and one line in the log says why; one of a program that was killed goes with its
+  /// end.
   void start(std::string_view reason);
 
  private:

@@ -36,10 +36,16 @@ std::string helperProgram(const Configuration& configuration, const std::string&
   return directory.empty() ? name : directory + "/" + name;
 }
 
-BasebandDumpStarter::Places basebandPlaces(const Configuration& configuration) {
+RootedPaths rootedPaths(const Configuration& configuration, const HostEnvironment& environment) {
+  return {writtenRoots(configuration.roots), environment.homeDirectory};
+}
+
+BasebandDumpStarter::Places basebandPlaces(const Configuration& configuration,
+                                           const HostEnvironment& environment) {
   return {.helper = helperProgram(configuration, "lirra-modemdump"),
           .directory = configuration.roots.WirelessReportRoot + "/Baseband",
-          .marker = configuration.roots.TemporaryRoot + "/Telvane.dumping"};
+          .marker = configuration.roots.TemporaryRoot + "/Telvane.dumping",
+          .paths = rootedPaths(configuration, environment)};
 }
 
 /// Of the session that the agent was started from.
@@ -84,7 +90,7 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
       _queueingShell(_shell, _queues),
       _systemVersion(_loaded.configuration.systemVersionFile),
       _descriptors(_mainLoop.context()),
-      _basebandDumps(_mainLoop.context(), _agentLog, basebandPlaces(_loaded.configuration)),
+      _basebandDumps(_mainLoop.context(), _agentLog, basebandPlaces(_loaded.configuration, environment)),
       _busHost{.configuration = _loaded.configuration,
                .clock = _clock,
                .mainLoop = _mainLoop,
@@ -102,19 +108,21 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
       _networkStatus(_bus),
       _cellularData(_bus),
       _telephony(_bus),
-      _pings(_mainLoop.context(), _loaded.configuration.interfaces, _agentLog),
+      _pings(_mainLoop.context(), _loaded.configuration.interfaces, _agentLog, {},
+             rootedPaths(_loaded.configuration, environment)),
       _notificationScreen(_bus),
       _dialogs(_mainLoop.context(), _agentLog, {.hasDisplay = hasDisplay(environment)}),
       _screens({&_notificationScreen, &_dialogs}),
       _userAlerts(_mainLoop.context(), _mainLoop, _clock, _agentLog,
                   alertDirectory(_loaded.configuration.roots.RuntimeRoot)),
       _fileCopier(_queues, _agentLog, _loaded.configuration.archiveCompression,
-                  {writtenRoots(_loaded.configuration.roots), environment.homeDirectory}),
+                  rootedPaths(_loaded.configuration, environment)),
       _deviceSupport(_mainLoop, _clock, _cellularData,
                      {.videoCallsOverCellular = _loaded.configuration.videoCallsOverCellular,
                       .cellularInterface = _loaded.configuration.interfaces.cellular,
                       .looksAtStart = !_loaded.configuration.endpoints.cellPingServer.empty()}),
       _wifiDiagnostics(_agentLog, helperProgram(_loaded.configuration, "lirra-wifidump")),
+      _propertyLists(rootedPaths(_loaded.configuration, environment)),
       _dumpRecords(_clock, _agentLog, progressDirectory(_loaded.configuration.roots.RuntimeRoot)),
       _dumpProgress(_dumpRecords, [this](DumpNews news) { _announceDump(std::move(news)); }),
       _processExit([this] {

@@ -37,8 +37,9 @@ std::error_code makeNotificationDirectory(const std::string& directory) {
   if (error) return error;
   if (::mkdir(directory.c_str(), kDirectoryMode) == 0) return {};
   if (errno != EEXIST) return lastSystemError();
-  return std::filesystem::is_directory(directory, error) ? std::error_code{}
-                                                         : std::make_error_code(std::errc::not_a_directory);
+  // A link is none: what it leads to need not be ours.
+  const bool isDirectory = std::filesystem::is_directory(std::filesystem::symlink_status(directory, error));
+  return isDirectory ? std::error_code{} : std::make_error_code(std::errc::not_a_directory);
 }
 
 bool isPostId(std::string_view id) {

@@ -4,6 +4,7 @@
 #include <string>
 
 #include "platform/configuration.h"
+#include "platform/linux/files/rooted_paths.h"
 #include "platform/linux/ping/echo_socket.h"
 #include "platform/ping_test.h"
 
@@ -30,8 +31,8 @@ struct PingMethods {
 class LinuxPingFacility : public PingFacility {
  public:
   /// Loop and log are borrowed.
-  LinuxPingFacility(asio::io_context& context, Interfaces interfaces, AgentLog& log,
-                    PingMethods methods = {});
+  LinuxPingFacility(asio::io_context& context, Interfaces interfaces, AgentLog& log, PingMethods methods = {},
+                    RootedPaths paths = {});
   [[nodiscard]] std::shared_ptr<PingTest> makeTest(std::string address, bool useWifi) override;
 
  private:
@@ -39,6 +40,7 @@ class LinuxPingFacility : public PingFacility {
   const Interfaces _interfaces;
   AgentLog& _log;
   const PingMethods _methods;
+  const RootedPaths _paths;  // of the results
 };
 
 }  // namespace zal

@@ -25,12 +25,13 @@ std::chrono::nanoseconds durationOf(double seconds) {
 }  // namespace
 
 LinuxPingTest::LinuxPingTest(asio::io_context& context, AgentLog& log, std::string address,
-                             std::string interface, PingMethods methods)
+                             std::string interface, PingMethods methods, const RootedPaths& paths)
     : _context(context),
       _log(log),
       _host(std::move(address)),
       _interface(std::move(interface)),
       _methods(std::move(methods)),
+      _paths(paths),
       _report(std::make_shared<PingReport>(_host)) {}
 
 void LinuxPingTest::startWithTimeout(double seconds, WorkQueue& queue, CompletionHandler handler) {
@@ -53,7 +54,9 @@ void LinuxPingTest::stop() {
 // somebody laid there must not turn us against another file.
 bool LinuxPingTest::writeResultsToFile(const std::string& path, std::string& error) {
   constexpr mode_t kMode = 0644;
-  const Descriptor file = openOwnFile(path, kMode);
+  const RootedPlace at = _paths.placeOf(path);
+  errno = at.error.value();
+  const Descriptor file = at.error ? Descriptor() : openOwnFileAt(at.directory.get(), at.name, kMode);
   if (file.isOpen() && (::ftruncate(file.get(), 0) == 0 || errno == EINVAL) &&
       !writeWhole(file.get(), _report->text()))
     return true;

@@ -25,7 +25,7 @@ class LinuxPingTest : public PingTest, public std::enable_shared_from_this<Linux
   static constexpr double kLongestSeconds = 7.0 * 24 * 3600;
 
   LinuxPingTest(asio::io_context& context, AgentLog& log, std::string address, std::string interface,
-                PingMethods methods);
+                PingMethods methods, const RootedPaths& paths);
 
   [[nodiscard]] double longTimeInterval() const override { return kLongTimeInterval; }
   void startWithTimeout(double seconds, WorkQueue& queue, CompletionHandler handler) override;
@@ -38,6 +38,7 @@ class LinuxPingTest : public PingTest, public std::enable_shared_from_this<Linux
   AgentLog& _log;
   const std::string _host, _interface;
   const PingMethods _methods;
+  const RootedPaths& _paths;
   const std::shared_ptr<PingReport> _report;
   std::atomic<double> _secondsToRun{0};
   std::weak_ptr<PingAttempt> _attempt;  // loop thread only; the loop's pending work owns it

@@ -12,7 +12,10 @@ namespace zal {
 
 std::error_code PugixmlPropertyListWriter::write(const ValueMap& dictionary, const std::string& path) {
   const std::string text = propertyListText(dictionary);
-  Descriptor file(::open(path.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_NOFOLLOW | O_CLOEXEC, 0666));
+  const RootedPlace at = _paths.placeOf(path);
+  if (at.error) return at.error;
+  constexpr int kFlags = O_WRONLY | O_CREAT | O_TRUNC | O_NOFOLLOW | O_CLOEXEC;
+  Descriptor file(::openat(at.directory.get(), at.name.c_str(), kFlags, 0666));
   if (!file.isOpen()) return lastSystemError();
   if (const auto error = writeWhole(file.get(), text)) return error;
   if (::close(file.release()) != 0) return lastSystemError();  // where a full disk may show last

@@ -61,6 +61,19 @@ TEST_F(BasebandDumpStarterTest, MarkerIsThereBeforeItReturnsAndTheProgramGetsIts
   EXPECT_EQ(log.lines, std::vector<std::string>{});
 }
 
+TEST_F(BasebandDumpStarterTest, NothingIsStartedForADirectoryThatIsALinkBelowItsRoot) {
+  std::filesystem::create_directories(directory / "elsewhere");
+  std::filesystem::create_directories(directory / "root");
+  std::filesystem::create_directory_symlink("../elsewhere", directory / "root/Baseband");
+  BasebandDumpStarter rooted{
+      loop, log, {program, directory / "root/Baseband", marker, {{directory / "root"}, ""}}};
+  rooted.start("reason");
+  EXPECT_FALSE(markerIsThere());
+  EXPECT_FALSE(std::filesystem::exists(program + ".words"));
+  EXPECT_EQ(log.lines, std::vector<std::string>{"warning: Baseband dump: cannot make " + directory.path() +
+                                                "/root/Baseband: Too many levels of symbolic links"});
+}
+
 TEST_F(BasebandDumpStarterTest, SecondStartJoinsTheOneThatRuns) {
   starter.start("first");
   ASSERT_TRUE(hasBegun());

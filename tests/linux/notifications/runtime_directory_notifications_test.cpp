@@ -148,6 +148,14 @@ TEST_F(RuntimeDirectoryNotificationsTest, ADirectoryThatIsRemovedComesBackWithIt
   EXPECT_THAT(log.lines, IsEmpty());
 }
 
+TEST_F(RuntimeDirectoryNotificationsTest, ALinkInThePlaceOfTheDirectoryIsNotUsed) {
+  const std::string planted = root / "planted";
+  std::filesystem::create_directories(root / "elsewhere");
+  std::filesystem::create_directory_symlink("elsewhere", planted);
+  EXPECT_EQ(postNotification(planted, "One"), std::errc::not_a_directory);
+  EXPECT_TRUE(std::filesystem::is_empty(root / "elsewhere"));
+}
+
 TEST_F(RuntimeDirectoryNotificationsTest, ADirectoryThatIsMovedAwayIsMadeAgain) {
   observe("One");
   std::filesystem::rename(root / "run", root / "old");

@@ -128,6 +128,18 @@ TEST_F(LinuxPingTestTest, ALinkLaidAtTheResultsNameIsReplacedNotFollowed) {
   EXPECT_EQ(testing::readFile(directory / "victim"), "untouched");
 }
 
+TEST_F(LinuxPingTestTest, NoResultsAreWrittenThroughALinkBelowARoot) {
+  std::filesystem::create_directories(directory / "elsewhere");
+  std::filesystem::create_directories(directory / "root");
+  std::filesystem::create_directory_symlink("../elsewhere", directory / "root/Statistics");
+  LinuxPingFacility rooted(loop->context, Interfaces{}, log, {}, {{directory / "root"}, ""});
+  std::string error;
+  EXPECT_FALSE(
+      rooted.makeTest("10.77.0.2", true)->writeResultsToFile(directory / "root/Statistics/ping.log", error));
+  EXPECT_EQ(error, "Too many levels of symbolic links");
+  EXPECT_TRUE(std::filesystem::is_empty(directory / "elsewhere"));
+}
+
 TEST_F(LinuxPingTestTest, LongIntervalIsAMinute) {
   prepare("10.77.0.2");
   EXPECT_EQ(ping->longTimeInterval(), 60.0);

@@ -138,6 +138,15 @@ TEST_F(PugixmlPropertyListWriterTest, AnExistingFileIsReplacedInPlace) {
   EXPECT_EQ(readFile(directory / "second-name"), readFile(path));
 }
 
+TEST_F(PugixmlPropertyListWriterTest, NothingIsWrittenThroughALinkBelowARoot) {
+  std::filesystem::create_directories(directory / "elsewhere");
+  std::filesystem::create_directories(directory / "root");
+  std::filesystem::create_directory_symlink("../elsewhere", directory / "root/CT");
+  PugixmlPropertyListWriter rooted({{directory / "root"}, ""});
+  EXPECT_EQ(rooted.write({}, directory / "root/CT/CTState.plist"), std::errc::too_many_symbolic_link_levels);
+  EXPECT_EQ(listTree(directory / "elsewhere"), "");
+}
+
 TEST_F(PugixmlPropertyListWriterTest, APathThatCannotBeWrittenIsTheErrorItself) {
   EXPECT_EQ(writer.write({}, directory / "missing/CTState.plist"), std::errc::no_such_file_or_directory);
   EXPECT_EQ(writer.write({}, directory.path()), std::errc::is_a_directory);
