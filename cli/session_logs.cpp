@@ -2,7 +2,7 @@
 
 #include <array>
 #include <fstream>
-#include <iterator>
+#include <sstream>
 
 namespace zal {
 namespace {
@@ -64,9 +64,11 @@ std::optional<std::string> readSessionFile(const SessionDirectory& session, cons
   if (session.isArchive) return archives.text(session.path, name);
   std::ifstream file(session.path + "/" + name, std::ios::binary);
   if (!file) return std::nullopt;
-  std::string text{std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>()};
-  if (file.bad()) return std::nullopt;
-  return text;
+  std::ostringstream text;
+  // Copied by the stream, which takes a failed read for an end; a buffer read directly throws it.
+  if (file.peek() != std::ifstream::traits_type::eof()) text << file.rdbuf();
+  if (file.bad() || !text) return std::nullopt;
+  return std::move(text).str();
 }
 
 std::vector<MetricBlock> statisticsBlocks(std::string_view qualityLog) {

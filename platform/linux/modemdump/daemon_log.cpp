@@ -3,11 +3,10 @@
 #include <algorithm>
 #include <cstdint>
 #include <filesystem>
-#include <fstream>
-#include <iterator>
 #include <system_error>
 #include <vector>
 
+#include "platform/linux/files/readable_text.h"
 #include "platform/linux/helper/bounded_program.h"
 #include "platform/linux/modemdump/modem_manager.h"
 
@@ -47,19 +46,16 @@ LogSettings settingsOfModemManager(SystemBus& bus, const std::string& root) {
   if (std::holds_alternative<Trouble>(answer) ||
       sd_bus_message_read(std::get<BusMessage>(answer).get(), "u", &process) < 0)
     return {};
-  std::ifstream file(root + "/proc/" + std::to_string(process) + "/cmdline", std::ios::binary);
-  return logSettings(std::string{std::istreambuf_iterator<char>(file), {}});
+  return logSettings(readableText(root + "/proc/" + std::to_string(process) + "/cmdline"));
 }
 
 /// The end of the file from a line's beginning on.
 std::string endOfFile(const std::string& path) {
   std::error_code error;
   const auto size = std::filesystem::file_size(path, error);
-  std::ifstream file(path, std::ios::binary);
-  if (error || !file) return {};
+  if (error) return {};
   const bool isCut = size > kMostFileBytes;
-  if (isCut) file.seekg(static_cast<std::streamoff>(size - kMostFileBytes));
-  std::string text{std::istreambuf_iterator<char>(file), {}};
+  const std::string text = readableText(path, isCut ? static_cast<long long>(size - kMostFileBytes) : 0);
   return isCut ? text.substr(text.find('\n') + 1) : text;
 }
 

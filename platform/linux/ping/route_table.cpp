@@ -5,10 +5,10 @@
 
 #include <charconv>
 #include <cstring>
-#include <fstream>
-#include <iterator>
 #include <string>
 #include <vector>
+
+#include "platform/linux/files/readable_text.h"
 
 namespace zal {
 namespace {
@@ -62,11 +62,6 @@ void keepBetter(std::optional<DefaultRoute>& best, const DefaultRoute& candidate
 
 bool usable(std::uint32_t flags) { return (flags & RTF_UP) != 0 && (flags & RTF_REJECT) == 0; }
 
-std::string readAll(const char* path) {
-  std::ifstream file(path);
-  return {std::istreambuf_iterator<char>(file), {}};
-}
-
 }  // namespace
 
 // Iface Destination Gateway Flags RefCnt Use Metric Mask MTU Window IRTT
@@ -107,9 +102,9 @@ std::optional<DefaultRoute> defaultRouteV6(std::string_view table, std::string_v
 }
 
 std::optional<DefaultRoute> currentDefaultRoute(const std::string& interface) {
-  auto v4 = defaultRouteV4(readAll(kTableV4), interface);
+  auto v4 = defaultRouteV4(readableText(kTableV4), interface);
   if (v4 && v4->gateway) return v4;
-  auto v6 = defaultRouteV6(readAll(kTableV6), interface);
+  auto v6 = defaultRouteV6(readableText(kTableV6), interface);
   if (!v6 || !v6->gateway) return v4 ? v4 : v6;
   asio::ip::address_v6 gateway = v6->gateway->to_v6();
   if (gateway.is_link_local()) gateway.scope_id(::if_nametoindex(interface.c_str()));

@@ -2,19 +2,18 @@
 
 #include <unistd.h>
 
-#include <fstream>
-#include <iterator>
 #include <optional>
 #include <sstream>
 #include <string>
+
+#include "platform/linux/files/readable_text.h"
 
 namespace zal {
 namespace {
 
 /// The start time that the process file system tells; nothing for a process that has ended.
 std::optional<std::uint64_t> startTimeOf(pid_t process) {
-  std::ifstream file("/proc/" + std::to_string(process) + "/stat");
-  const std::string text{std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>()};
+  const std::string text = readableText("/proc/" + std::to_string(process) + "/stat");
   // The name stands in parentheses and may hold any of them itself.
   const std::size_t nameEnd = text.rfind(')');
   if (nameEnd == std::string::npos) return std::nullopt;

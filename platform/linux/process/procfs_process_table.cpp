@@ -6,9 +6,10 @@
 #include <charconv>
 #include <filesystem>
 #include <fstream>
-#include <iterator>
 #include <system_error>
 #include <utility>
+
+#include "platform/linux/files/readable_text.h"
 
 namespace zal {
 
@@ -26,8 +27,7 @@ std::optional<pid_t> processId(const std::string& name) {
 
 /// The arguments, joined by blanks; nothing for a process that is gone or has none.
 std::string commandOf(const std::string& folder) {
-  std::ifstream file(folder + "/cmdline", std::ios::binary);
-  std::string arguments{std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>()};
+  std::string arguments = readableText(folder + "/cmdline");
   while (!arguments.empty() && arguments.back() == '\0') arguments.pop_back();
   std::replace(arguments.begin(), arguments.end(), '\0', ' ');
   if (arguments.empty()) {

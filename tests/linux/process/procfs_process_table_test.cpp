@@ -185,5 +185,16 @@ TEST(ProcfsProcessTableTest, AWriterWithoutArgumentsIsNamedByItsShortName) {
   EXPECT_EQ(ProcfsProcessTable(root / "missing").writersBelow("/dump"), std::vector<FileWriter>{});
 }
 
+TEST(ProcfsProcessTableTest, AFailedReadOfTheArgumentsLeavesTheShortName) {
+  const TemporaryDirectory root;
+  // It opens, and a read fails, as in the folder of a process that has just ended.
+  std::filesystem::create_directories(root / "8/cmdline");
+  std::filesystem::create_directories(root / "8/fd");
+  std::filesystem::create_symlink("/dump/out", root / "8/fd/1");
+  writeFile(root / "8/comm", "sleep\n");
+  EXPECT_EQ(ProcfsProcessTable(root.path()).writersBelow("/dump"),
+            (std::vector<FileWriter>{{8, "sleep", "/dump/out"}}));
+}
+
 }  // namespace
 }  // namespace zal::testing
