@@ -24,7 +24,7 @@ struct Extent {
 enum class Subject { journald, rsyslog, undecoded, agent, mirroring, library };
 [[nodiscard]] const char* subjectName(Subject subject);
 
-/// Medians over the rounds, and why a subject has none.
+/// Of all rounds the best speed, cost and latencies and the median of the memory; and why a subject has none.
 struct RoundResults {
   std::map<std::pair<Subject, unsigned>, IngestResult> ingest;  ///< by subject and number of clients
   std::map<Subject, std::pair<double, double>> latency;         ///< p50 and p99 in seconds

@@ -21,4 +21,13 @@ namespace zal::bench {
   return values.size() % 2 == 1 ? values[middle] : (values[middle - 1] + values[middle]) / 2;
 }
 
+/// 0 of nothing.
+[[nodiscard]] inline double least(const std::vector<double>& values) {
+  return values.empty() ? 0 : *std::min_element(values.begin(), values.end());
+}
+
+[[nodiscard]] inline double greatest(const std::vector<double>& values) {
+  return values.empty() ? 0 : *std::max_element(values.begin(), values.end());
+}
+
 }  // namespace zal::bench
