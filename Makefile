@@ -3,7 +3,7 @@
 BUILD := build
 JOBS := $(shell nproc 2>/dev/null || echo 2)
 # Tests wait for children, buses and timeouts more than they compute.
-TEST_JOBS := $(shell expr 2 \* $(JOBS))
+TEST_JOBS := $(shell expr 3 \* $(JOBS))
 CMAKE := cmake
 # Seconds that each fuzzer runs; `make test` gives them a short turn.
 FUZZ_SECONDS ?= 120

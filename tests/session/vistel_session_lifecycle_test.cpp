@@ -1,5 +1,4 @@
 #include <chrono>
-#include <thread>
 
 #include "tests/session/session_fixture.h"
 
@@ -237,20 +236,6 @@ TEST_F(VistelSessionTest, PropertiesReadBackWhatWasSet) {
   EXPECT_EQ(session->endFlags(), 0xFFFFFFFF);
   session->setFailureReason(std::nullopt);
   EXPECT_EQ(session->failureReason(), std::nullopt);
-}
-
-TEST_F(VistelSessionTest, TextPropertiesAreWrittenAndReadWholeFromAnyThread) {
-  const std::string a(100, 'a');
-  const std::string b(100, 'b');
-  session->setInitiator(a);
-  std::thread writer([&] {
-    for (int i = 0; i < 2000; ++i) session->setInitiator(i % 2 == 0 ? b : a);
-  });
-  for (int i = 0; i < 2000; ++i) {
-    const auto seen = session->initiator();
-    ASSERT_TRUE(seen == a || seen == b);
-  }
-  writer.join();
 }
 
 }  // namespace
