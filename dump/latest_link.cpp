@@ -25,11 +25,16 @@ void linkLatestArchive(FilePlacement& files, const std::string& logRoot, const s
     return;
   }
   const std::string link = linkOf(logRoot, service);
-  std::error_code error = files.remove(link);
-  if (!error) error = files.linkSymbolically(archive, link);
-  // Without logs of the service there is no directory for it.
-  if (error && error != std::errc::no_such_file_or_directory)
-    log.warning("Could not link the latest archive at " + link + ": " + error.message());
+  // More than once where it fails: that a disk refuses for a moment must not cost the link.
+  constexpr int kMostTimes = 3;
+  std::error_code error;
+  for (int time = 0; time < kMostTimes; ++time) {
+    error = files.remove(link);
+    if (!error) error = files.linkSymbolically(archive, link);
+    // Without logs of the service there is no directory for it.
+    if (!error || error == std::errc::no_such_file_or_directory) return;
+  }
+  log.warning("Could not link the latest archive at " + link + ": " + error.message());
 }
 
 void linkArchiveOfEarlier(FilePlacement& files, const std::string& logRoot, const std::string& service,

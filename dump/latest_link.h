@@ -8,8 +8,9 @@ class AgentLog;
 class FilePlacement;
 
 /// Makes `<log root>/<service>/Latest-<service>` a link to the archive, in place of what stands
-/// there. Failures are not reported; a service name that would lead out of the log root is refused
-/// with one warning. The root is absolute. Any thread.
+/// there. What fails is tried again at once, then told with one warning, and so is a service name that
+/// would lead out of the log root. Without logs of the service there is no link. The root is absolute. Any
+/// thread.
 void linkLatestArchive(FilePlacement& files, const std::string& logRoot, const std::string& service,
                        const std::string& archive, AgentLog& log);
 

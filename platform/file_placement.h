@@ -19,7 +19,8 @@ class FilePlacement {
   /// A path in the temporary area that names nothing yet and that nobody can guess.
   [[nodiscard]] virtual std::string randomTemporaryPath(std::string_view suffix) = 0;
   /// The path itself when nothing exists there, else the first free "name-2.ext", "name-3.ext" …;
-  /// nothing when no free name was found.
+  /// nothing when they are all taken or cannot be names. Where a look fails otherwise, the path that
+  /// was looked at, which may be taken.
   [[nodiscard]] virtual std::optional<std::string> uniqueSavePath(const std::string& path) = 0;
   /// Hard link; an existing target is an error, never overwritten. Symbolic links are not followed.
   /// Where the target lies on another file system, and only there, a file gets a copy with its mode

@@ -61,6 +61,44 @@ TEST_F(LatestLinkTest, AnArchiveOfEarlierTakesTheLinkOnlyFromNoneOrAnOlderOne) {
   EXPECT_EQ(linkedAfter("older.zip"), "older.zip");
 }
 
+/// A disk that refuses so many removals, and so many links.
+class RefusingPlacement : public testing::PlainFilePlacement {
+ public:
+  using PlainFilePlacement::PlainFilePlacement;
+  int refusals = 0;
+  std::error_code remove(const std::string& path) override {
+    return _refusedRemovals++ < refusals ? std::make_error_code(std::errc::io_error)
+                                         : PlainFilePlacement::remove(path);
+  }
+  std::error_code linkSymbolically(const std::string& text, const std::string& path) override {
+    return _refusedLinks++ < refusals ? std::make_error_code(std::errc::no_space_on_device)
+                                      : PlainFilePlacement::linkSymbolically(text, path);
+  }
+
+ private:
+  int _refusedRemovals = 0, _refusedLinks = 0;
+};
+
+TEST_F(LatestLinkTest, ADiskThatRefusesForAMomentDoesNotCostTheLink) {
+  fs::create_directories(home / "Logs/Vistel");
+  link("Vistel", "/dumps/older.zip");
+  RefusingPlacement refusing(home.path());
+  refusing.refusals = 1;
+  linkLatestArchive(refusing, home / "Logs", "Vistel", "/dumps/Log.zip", log);
+  EXPECT_EQ(fs::read_symlink(home / "Logs/Vistel/Latest-Vistel"), "/dumps/Log.zip");
+  EXPECT_TRUE(log.lines.empty());
+}
+
+TEST_F(LatestLinkTest, ADiskThatGoesOnRefusingIsToldOnce) {
+  fs::create_directories(home / "Logs/Vistel");
+  RefusingPlacement refusing(home.path());
+  refusing.refusals = 100;
+  linkLatestArchive(refusing, home / "Logs", "Vistel", "/dumps/Log.zip", log);
+  EXPECT_EQ(log.lines,
+            std::vector<std::string>{"warning: Could not link the latest archive at " +
+                                     (home / "Logs/Vistel/Latest-Vistel") + ": Input/output error"});
+}
+
 TEST_F(LatestLinkTest, ServiceWithoutLogsHasNoPlaceForALinkAndNothingIsSaid) {
   link("Vistel");
   EXPECT_FALSE(fs::exists(home / "Logs"));

@@ -18,6 +18,7 @@ std::size_t slotsFor(std::size_t threads) { return 2 * threads + 1; }
 
 /// Reads until there is nothing more. Returned: the bytes read.
 std::size_t readChunk(const ChunkTask& task, char* bytes, std::error_code& error) {
+  if (task.text) return task.text->copy(bytes, task.size, task.offset);
   std::size_t read = 0;
   while (read < task.size) {
     const ssize_t got =
@@ -135,6 +136,7 @@ const ChunkResult& ChunkPipeline::oldest() {
 void ChunkPipeline::dropOldest() {
   ChunkTask& task = _slots[_dropped % _slots.size()].task;
   task.file.reset();
+  task.text.reset();
   task.hash.reset();
   ++_dropped;
 }

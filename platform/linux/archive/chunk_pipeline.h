@@ -6,6 +6,7 @@
 #include <deque>
 #include <memory>
 #include <mutex>
+#include <string>
 #include <system_error>
 #include <vector>
 
@@ -18,9 +19,10 @@
 
 namespace zal {
 
-/// A part of a file to read and compress.
+/// A part of a file, or of a text, to read and compress.
 struct ChunkTask {
   std::shared_ptr<const Descriptor> file;
+  std::shared_ptr<const std::string> text;  ///< instead of a file
   std::uint64_t offset = 0;
   std::size_t size = 0;                    ///< 1 to kChunkSize
   bool first = true, last = true;          ///< of its file

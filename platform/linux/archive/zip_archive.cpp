@@ -2,7 +2,9 @@
 
 #include <zlib.h>
 
+#include <algorithm>
 #include <array>
+#include <ctime>
 #include <deque>
 #include <exception>
 #include <filesystem>
@@ -12,7 +14,7 @@
 #include <system_error>
 #include <utility>
 
-#include <sys/mman.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include "platform/linux/archive/archive_output.h"
@@ -21,7 +23,6 @@
 #include "platform/linux/archive/zip_container.h"
 #include "platform/linux/files/file_copy.h"
 #include "platform/linux/files/system_error.h"
-#include "platform/linux/files/whole_file.h"
 
 namespace zal {
 namespace {
@@ -33,17 +34,7 @@ constexpr std::uint64_t kTrialPlaces = 4;
 /// Lines about what was left out that the ending gets to know.
 constexpr std::size_t kMostRemarks = 1000;
 
-/// The text as a file that lies nowhere.
-FoundEntry textEntry(const std::string& name, std::string_view text) {
-  FoundEntry found;
-  found.path = found.entry.name = name;
-  found.file = Descriptor(::memfd_create("archive-ending", MFD_CLOEXEC));
-  if (!found.file.isOpen()) throw std::system_error(lastSystemError());
-  if (const std::error_code error = writeWhole(found.file.get(), text)) throw std::system_error(error);
-  if (::fstat(found.file.get(), &found.entry.status) != 0) throw std::system_error(lastSystemError());
-  found.entry.status.st_mode = S_IFREG | S_IRUSR | S_IWUSR | S_IRGRP | S_IROTH;
-  return found;
-}
+std::uint64_t chunksOf(std::uint64_t size) { return (size + kChunkSize - 1) / kChunkSize; }
 
 /// The walk gives entries, their files go through the pipeline as chunks, and what comes out goes into
 /// the container, all in one order.
@@ -72,8 +63,7 @@ class ArchiveWriter {
     }
     while (!_waiting.empty()) _writeOldest();
     if (_ending.text) {
-      const std::string text = _ending.text(_content);
-      _add(textEntry(_top + _freeName(), text));
+      _addText(_top + _freeName(), _ending.text(_content));
       while (!_waiting.empty()) _writeOldest();
     }
     _container.finish();
@@ -99,14 +89,30 @@ class ArchiveWriter {
       return;
     }
     waiting.size = static_cast<std::uint64_t>(waiting.entry.status.st_size);
-    waiting.chunks = (waiting.size + kChunkSize - 1) / kChunkSize;
-    const auto file = std::make_shared<const Descriptor>(std::move(found.file));
+    waiting.chunks = chunksOf(waiting.size);
     if (_ending.text && waiting.chunks > 0) waiting.hash = std::make_shared<FileHash>();
     ChunkTask task;
-    task.file = file;
+    task.file = std::make_shared<const Descriptor>(std::move(found.file));
     task.hash = waiting.hash;
     task.method =
-        waiting.chunks > 1 && !_shrinks(*file, waiting.size) ? ZipMethod::stored : ZipMethod::deflated;
+        waiting.chunks > 1 && !_shrinks(*task.file, waiting.size) ? ZipMethod::stored : ZipMethod::deflated;
+    _giveChunks(std::move(waiting), std::move(task));
+  }
+
+  /// A text as a file that lies nowhere: no disk can fail while it is read.
+  void _addText(std::string name, std::string text) {
+    Waiting waiting;
+    waiting.path = waiting.entry.name = std::move(name);
+    waiting.entry.status.st_mode = S_IFREG | S_IRUSR | S_IWUSR | S_IRGRP | S_IROTH;
+    waiting.entry.status.st_mtime = ::time(nullptr);
+    waiting.size = text.size();
+    waiting.chunks = chunksOf(waiting.size);
+    ChunkTask task;
+    task.text = std::make_shared<const std::string>(std::move(text));
+    _giveChunks(std::move(waiting), std::move(task));
+  }
+
+  void _giveChunks(Waiting waiting, ChunkTask task) {
     const std::uint64_t size = waiting.size;
     _waiting.push_back(std::move(waiting));
     for (; task.offset < size; task.offset += kChunkSize) {

@@ -72,7 +72,8 @@ std::optional<std::string> PosixFilePlacement::uniqueSavePath(const std::string&
   for (int number = 2; number <= kMostSaveNames + 1; ++number) {
     std::error_code error;
     if (!nameIsTaken(candidate, error)) {
-      if (error) return std::nullopt;
+      if (error == std::errc::filename_too_long) return std::nullopt;
+      // Where nobody can tell, moving there does: it never overwrites, and what cannot be moved stays.
       return candidate;
     }
     candidate = stem + '-' + std::to_string(number) + extension;

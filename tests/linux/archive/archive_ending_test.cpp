@@ -1,4 +1,9 @@
+#include <sys/syscall.h>
+
+#include <cerrno>
+
 #include "tests/linux/archive/archive_fixture.h"
+#include "tests/support/failing_calls.h"
 
 namespace zal::testing {
 namespace {
@@ -79,6 +84,18 @@ TEST_P(ArchiveEndingTest, WhatIsLeftOutIsRemarked) {
   archiveEndingWith("text");
   EXPECT_EQ(content.remarks, Lines{'"' + input("pipe") + "\" is left out of the archive: a pipe"});
   EXPECT_EQ(log.lines, Lines{"notice: " + content.remarks.at(0)});
+}
+
+TEST_P(ArchiveEndingTest, TheTextIsThereWhereNothingCanBeRead) {
+  writeFile(input("file"), "text");
+  const auto job = makeJob(input(), output());
+  job->endWith({"Manifest.json", [](const ArchiveContent&) { return std::string(1'500'000, 'm'); }});
+  job->start();
+  if (!withFailingCalls({{SYS_pread64, EIO, 1000}}, [this] { queues.runNext(kQueue); })) GTEST_SKIP();
+  queues.runAll();
+  EXPECT_EQ(names(), "Dump/\nDump/Manifest.json\n");
+  EXPECT_EQ(printed("unzip -p '" + output() + "' Dump/Manifest.json | tr -d m"), "");
+  EXPECT_EQ(printed("unzip -p '" + output() + "' Dump/Manifest.json | wc -c"), "1500000\n");
 }
 
 TEST_P(ArchiveEndingTest, WithoutATextThereIsNoEntryMore) {

@@ -2,6 +2,7 @@
 #include <sys/fsuid.h>
 #include <sys/resource.h>
 #include <sys/stat.h>
+#include <sys/syscall.h>
 #include <unistd.h>
 
 #include <atomic>
@@ -9,6 +10,7 @@
 
 #include "platform/linux/archive/chunk_pipeline.h"
 #include "tests/linux/archive/archive_fixture.h"
+#include "tests/support/failing_calls.h"
 
 namespace zal::testing {
 namespace {
@@ -16,7 +18,27 @@ namespace {
 constexpr std::size_t kMebibyte = 1U << 20U;
 
 /// Files and hosts that do not do what they should.
-class ZipFileCopierTroubleTest : public ArchiveFixture {};
+class ZipFileCopierTroubleTest : public ArchiveFixture {
+ protected:
+  /// False where the host lets no call fail.
+  [[nodiscard]] bool archiveWhile(const FailingCall& failure) {
+    const auto job = makeJob(input(), output());
+    job->start();
+    if (!withFailingCalls({failure}, [this] { queues.runNext(kQueue); })) return false;
+    queues.runAll();
+    return true;
+  }
+  void expectKeptBeside(const std::string& leftOut) {
+    EXPECT_EQ(log.lines, (std::vector<std::string>{
+                             "notice: \"" + leftOut + "\" is left out of the archive: Input/output error",
+                             "warning: \"" + input() +
+                                 "\" has more than could be read for its archive; it is kept as \"" +
+                                 input() + " (not archived)\""}));
+    EXPECT_EQ(readFile(input() + " (not archived)/broken"), "content");
+    EXPECT_EQ(printed("unzip -Z1 '" + output() + "'"), "Dump/\nDump/whole\n");
+    EXPECT_EQ(completed.size(), 1U);
+  }
+};
 
 INSTANTIATE_TEST_SUITE_P(Compression, ZipFileCopierTroubleTest,
                          ::testing::Values(ArchiveCompression::small, ArchiveCompression::fast),
@@ -92,6 +114,21 @@ TEST_P(ZipFileCopierTroubleTest, AFileThatNobodyMayReadIsLeftOutWithALine) {
   EXPECT_EQ(printed("unzip -Z1 '" + output() + "'"), "Dump/\nDump/closed/\nDump/open\n");
   EXPECT_EQ(complaintsAbout(output()), "");
   ::chmod(input("closed").c_str(), 0755);
+}
+
+TEST_P(ZipFileCopierTroubleTest, AFileThatTheDiskFailsToReadIsKeptBesideItsArchive) {
+  writeFile(input("broken"), "content");
+  writeFile(input("whole"), "of another length");
+  const FailingCall failure{SYS_pread64, EIO, 1, [](const std::uint64_t* words) { return words[2] == 7; }};
+  if (!archiveWhile(failure)) GTEST_SKIP();
+  expectKeptBeside(input("broken"));
+}
+
+TEST_P(ZipFileCopierTroubleTest, AFileThatTheDiskFailsToShowIsKeptBesideItsArchive) {
+  writeFile(input("broken"), "content");
+  writeFile(input("whole"), "of another length");
+  if (!archiveWhile({SYS_newfstatat, EIO, 1, namesPath("broken")})) GTEST_SKIP();
+  expectKeptBeside(input("broken"));
 }
 
 TEST_P(ZipFileCopierTroubleTest, WithoutDescriptorsNothingIsSilentlyLeftOut) {

@@ -368,6 +368,15 @@ TEST_F(PosixFilePlacementTest, ANameWhoseNumberedFormsAreTooLongHasNoUniqueName)
   EXPECT_EQ(uniqueName(name), "(none)");
 }
 
+/// Who finds no name for a file removes it.
+TEST_F(PosixFilePlacementTest, ANameThatCannotBeLookedAtIsLeftToTheMoveWhichKeepsTheFile) {
+  writeFile(directory / "a", "content");
+  fs::create_symlink("loop", directory / "loop");
+  EXPECT_EQ(uniqueName("loop/a"), "loop/a");
+  EXPECT_EQ(move("a", "loop/a"), std::errc::too_many_symbolic_link_levels);
+  EXPECT_EQ(readFile(directory / "a"), "content");
+}
+
 TEST_F(PosixFilePlacementTest, TheSearchForAFreeNameEnds) {
   writeFile(directory / "a", "");
   for (int number = 2; number <= 10'000; ++number) {

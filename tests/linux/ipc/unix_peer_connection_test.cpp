@@ -1,6 +1,10 @@
 #include "platform/linux/ipc/unix_peer_connection.h"
 
+#include <sys/socket.h>
+#include <sys/syscall.h>
+
 #include <atomic>
+#include <cerrno>
 #include <random>
 #include <thread>
 
@@ -8,6 +12,7 @@
 
 #include "platform/linux/wire/wire_message.h"
 #include "tests/linux/ipc/ipc_fixture.h"
+#include "tests/support/failing_calls.h"
 
 namespace zal {
 namespace {
@@ -144,6 +149,32 @@ TEST_F(UnixPeerConnectionTest, ABarrierIsAnsweredAfterWhatCameBeforeItWasHandled
   ASSERT_TRUE(runUntilEvents(3));
   EXPECT_EQ(order, (Lines{"1: after 0 flushes", "2: after 0 flushes", "3: after 1 flushes"}));
   EXPECT_EQ(client.frames(), Lines{"4/12379813738877118345/0"});
+}
+
+/// An agent of the thread in which its answers fail.
+class UnansweringAgent : public IpcFixture {
+ public:
+  void play() {
+    startService();
+    TestClient client(path);
+    ASSERT_TRUE(client.send(requestFrame(1) + bareFrame(FrameKind::barrier, 5)));
+    EXPECT_TRUE(runUntil([&] { return client.seesTheEnd(); }));
+    EXPECT_EQ(client.frames(), Lines{});
+    EXPECT_EQ(events, Lines{"1:"});
+    TestClient next(path);
+    ASSERT_TRUE(next.send(bareFrame(FrameKind::barrier, 6)));
+    EXPECT_TRUE(runUntil([&] { return next.frames() == Lines{"4/6/0"}; }));
+  }
+
+ private:
+  void TestBody() override {}
+};
+
+TEST(UnixPeerConnectionFailureTest, AClientWhoseAnswerTheKernelRefusesSeesTheEndInsteadOfWaiting) {
+  const testing::FailingCall answer{SYS_sendto, ENOBUFS, 1, [](const std::uint64_t* words) {
+                                      return (words[3] & static_cast<std::uint64_t>(MSG_DONTWAIT)) != 0;
+                                    }};
+  if (!testing::withFailingCalls({answer}, [] { UnansweringAgent().play(); })) GTEST_SKIP();
 }
 
 TEST_F(UnixPeerConnectionTest, AReplyRepeatsTheTokenAndReadsBack) {

@@ -5,6 +5,8 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <system_error>
+
 #include "tests/linux/log/unzipped.h"
 #include "tests/support/fake_services.h"
 #include "tests/support/manual_run_loop.h"
@@ -222,6 +224,48 @@ TEST_F(FileLogFacilityTest, RotationsThatFollowEachOtherQuicklyAreCompressedALit
   loop.advance(1500ms);
   record("Vistel", full);
   EXPECT_EQ(queues.readyJobs(kRotationQueue), 3U);
+}
+
+/// Queues of a host that has no descriptor left for a timer.
+class TimerlessQueues : public testing::ManualWorkQueues {
+ public:
+  using ManualWorkQueues::ManualWorkQueues;
+  std::unique_ptr<WorkQueue> makeSerial(std::string label, QueuePriority priority) override {
+    return std::make_unique<Queue>(ManualWorkQueues::makeSerial(std::move(label), priority));
+  }
+
+ private:
+  class Queue : public WorkQueue {
+   public:
+    explicit Queue(std::unique_ptr<WorkQueue> queue) : _queue(std::move(queue)) {}
+    [[nodiscard]] const std::string& label() const override { return _queue->label(); }
+    void async(Job job) override { _queue->async(std::move(job)); }
+    void asyncAfter(std::chrono::nanoseconds /*delay*/, Job /*job*/) override {
+      throw std::system_error(std::make_error_code(std::errc::too_many_files_open));
+    }
+
+   private:
+    const std::unique_ptr<WorkQueue> _queue;
+  };
+};
+
+TEST_F(FileLogFacilityTest, ARotationThatFindsNoTimerWaitsAndCostsNoRecord) {
+  settings.rotationSize = 50;
+  TimerlessQueues timerless{loop};
+  FileLogFacility own({loop, loop, timerless, log}, root, settings);
+  const auto tell = [&](const std::string& text) { own.record({6, "A", "A", false, text, 0}); };
+  const std::string second(30, '2'), third(30, '3');
+  // The first rotation takes no delay, the next ones would.
+  for (const std::string& text : {std::string(30, '1'), second, third}) tell(text);
+  EXPECT_THAT(log.lines,
+              ElementsAre("warning: " + root + "/A/A.log: its rotation waits: Too many open files"));
+  own.flush();
+  loop.advance(2s);
+  tell("fourth");
+  own.flush();
+  timerless.runAll();
+  EXPECT_EQ(history("A", "A.log"),
+            line(std::string(30, '1')) + line(second) + line(third) + "2024-05-02 14:03:09.251 <6> fourth\n");
 }
 
 TEST_F(FileLogFacilityTest, WhatAnEarlierProcessLeftIsEndedAtTheStart) {

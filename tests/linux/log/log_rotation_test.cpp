@@ -2,6 +2,9 @@
 
 #include <fcntl.h>
 #include <sys/stat.h>
+#include <sys/syscall.h>
+
+#include <cerrno>
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
@@ -9,6 +12,7 @@
 #include "platform/linux/log/rotation_names.h"
 #include "platform/linux/log/zip_file.h"
 #include "tests/linux/log/unzipped.h"
+#include "tests/support/failing_calls.h"
 #include "tests/support/file_size_limit.h"
 #include "tests/support/temporary_directory.h"
 
@@ -203,6 +207,19 @@ TEST_F(LogRotationTest, ACompressionThatTheDiskRefusesLeavesThePendingFile) {
   std::filesystem::create_directories(path("Vistel.log.zip.tmp/in the way"));
   EXPECT_NE(complete(), std::error_code{});
   EXPECT_EQ(readFile(path("Vistel.log.pending-1")), "new");
+}
+
+TEST_F(LogRotationTest, AGenerationThatCannotBeLookedAtIsNotWrittenOver) {
+  generation(1, "g1");
+  pending(5, "new");
+  std::error_code error;
+  if (!testing::withFailingCalls({{SYS_newfstatat, EIO, 1, testing::namesPath("Vistel.log.1.zip")}},
+                                 [&] { error = complete(); }))
+    GTEST_SKIP();
+  EXPECT_EQ(error, std::errc::io_error);
+  EXPECT_EQ(generations(), "1=g1 ");
+  EXPECT_EQ(complete(), std::error_code{});
+  EXPECT_EQ(generations(), "1=new 2=g1 ");
 }
 
 TEST_F(LogRotationTest, UnfinishedRotationsOfAllSetsAreFound) {

@@ -8,15 +8,18 @@
 #include <unistd.h>
 
 #include <atomic>
+#include <cerrno>
 #include <filesystem>
 #include <fstream>
 #include <future>
 #include <mutex>
 #include <stdexcept>
 #include <string>
+#include <system_error>
 #include <thread>
 #include <vector>
 
+#include "tests/support/failing_calls.h"
 #include "tests/support/manual_run_loop.h"
 
 namespace zal::testing {
@@ -49,6 +52,17 @@ class LinuxWorkQueuesTest : public ::testing::Test {
     queue.async([&task] { task(); });
     auto value = result.get();
     return value;
+  }
+  /// The work, with so many threads that do not start; false where the host lets no call fail.
+  [[nodiscard]] bool withoutThreads(int times, const std::function<void()>& work) {
+    std::vector<FailingCall> failing = {{SYS_clone, EAGAIN, times}};
+#ifdef SYS_clone3
+    failing.push_back({SYS_clone3, EAGAIN, times});
+#endif
+    return withFailingCalls(failing, [&] {
+      work();
+      queues.reset();
+    });
   }
   WorkQueue& standard() { return queues->global(QueuePriority::standard); }
   WorkQueue& background() { return queues->global(QueuePriority::background); }
@@ -125,6 +139,20 @@ TEST_F(LinuxWorkQueuesTest, ThreadsAreBounded) {
   EXPECT_LE(threadsNamed("zal-work-"), 4);
   queues.reset();
   EXPECT_EQ(finished, 1000);
+}
+
+TEST_F(LinuxWorkQueuesTest, AThreadThatDoesNotStartIsTriedAgain) {
+  int answer = 0;
+  if (!withoutThreads(2, [&] { answer = on(standard(), [] { return 7; }); })) GTEST_SKIP();
+  EXPECT_EQ(answer, 7);
+}
+
+TEST_F(LinuxWorkQueuesTest, WithoutAnyThreadTheOwnerOfTheJobFailsAndTheNextOneTriesAgain) {
+  const auto play = [&] {
+    EXPECT_THROW(standard().async([] {}), std::system_error);
+    EXPECT_EQ(on(standard(), [] { return 7; }), 7);
+  };
+  if (!withoutThreads(3, play)) GTEST_SKIP();
 }
 
 TEST_F(LinuxWorkQueuesTest, WhatAJobThrowsIsToldAndTheQueueGoesOn) {
