@@ -15,7 +15,7 @@ using namespace zal::testing;
 
 constexpr const char* kUsage =
     "crash_points [call|dump] [kill|tear|fault|disk|full] [--every N] [--start N] [--jobs N]\n"
-    "             [--only NUMBER [--error N] [--keep DIRECTORY]]\n";
+    "             [--of SYSTEMCALL] [--only NUMBER [--error N] [--keep DIRECTORY]]\n";
 
 constexpr int kSkipped = 77;
 
@@ -27,7 +27,7 @@ const std::map<std::string, Harm> kHarms = {{"kill", Harm::kill},
 
 int tryOne(const SweepOptions& options, std::uint64_t number, std::size_t error, const std::string& keepIn) {
   const TrialResult result =
-      tryPoint(*Scenario::named(options.scenario), {options.harm, number, error}, keepIn);
+      tryPoint(*Scenario::named(options.scenario), {options.harm, number, error, options.of}, keepIn);
   std::printf("point %llu: %s; %s; %zu confirmed\n", static_cast<unsigned long long>(number),
               result.isReached ? result.call.c_str() : "no such call", result.outcome.c_str(),
               result.confirmed);
@@ -53,6 +53,8 @@ int run(int argc, char** argv) {
       options.start = std::stoul(value());
     } else if (word == "--jobs") {
       options.jobs = static_cast<unsigned>(std::stoul(value()));
+    } else if (word == "--of") {
+      options.of = value();
     } else if (word == "--only") {
       only = std::stoul(value());
     } else if (word == "--error") {

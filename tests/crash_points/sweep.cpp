@@ -32,7 +32,7 @@ void work(const SweepOptions& options, unsigned worker, int output) {
   for (std::uint64_t number = options.start + worker * options.every;; number += step) {
     std::size_t errors = 1;
     for (std::size_t error = 0; error < errors; ++error) {
-      const TrialPoint point{options.harm, number, error};
+      const TrialPoint point{options.harm, number, error, options.of};
       const TrialResult result = tryPoint(*scenario, point, "");
       // A run without harm has to be sound too.
       if (!result.isReached && result.violations.empty()) return;

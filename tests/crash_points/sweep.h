@@ -13,6 +13,7 @@ struct SweepOptions {
   std::uint64_t start = 0;  ///< the first point, from 1; 0: another one each time
   std::uint64_t every = 1;  ///< 1: all points
   unsigned jobs = 1;        ///< processes
+  std::string of{};         ///< only system calls of that name are points; empty: all
 };
 
 struct SweepFigures {

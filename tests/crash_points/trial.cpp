@@ -137,6 +137,7 @@ class Trial {
     }
     if (_point.harm == Harm::fault && !_isConfigured(process, call, data)) return {};
     if (_point.harm == Harm::fault && call.number == SYS_epoll_ctl && !addsMore(process, data)) return {};
+    if (!_point.of.empty() && _point.of != call.name) return {};
     if (++_counted != _point.number) return {};
     _result.isReached = true;
     _result.call = call.name;

@@ -22,6 +22,7 @@ struct TrialPoint {
   Harm harm = Harm::kill;
   std::uint64_t number = 1;  ///< of the call, from 1
   std::size_t error = 0;     ///< which of those that the call can fail with
+  std::string of{};          ///< only calls of that name count; empty: all
 };
 
 struct TrialResult {
