@@ -13,7 +13,9 @@ namespace {
 
 bool fileExists(const std::string& path) {
   std::error_code error;
-  return std::filesystem::exists(path, error);
+  const bool exists = std::filesystem::exists(path, error);
+  // Once more where the look failed: what is there now may be gone when somebody else comes for it.
+  return error ? std::filesystem::exists(path, error) : exists;
 }
 
 std::string nameOf(const std::string& path) { return std::filesystem::path(path).filename().string(); }

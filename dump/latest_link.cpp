@@ -4,6 +4,7 @@
 #include <system_error>
 
 #include "collectors/plain_name.h"
+#include "dump/several_attempts.h"
 #include "platform/agent_log.h"
 #include "platform/file_placement.h"
 #include "session/collected_files.h"
@@ -25,16 +26,13 @@ void linkLatestArchive(FilePlacement& files, const std::string& logRoot, const s
     return;
   }
   const std::string link = linkOf(logRoot, service);
-  // More than once where it fails: that a disk refuses for a moment must not cost the link.
-  constexpr int kMostTimes = 3;
-  std::error_code error;
-  for (int time = 0; time < kMostTimes; ++time) {
-    error = files.remove(link);
-    if (!error) error = files.linkSymbolically(archive, link);
-    // Without logs of the service there is no directory for it.
-    if (!error || error == std::errc::no_such_file_or_directory) return;
-  }
-  log.warning("Could not link the latest archive at " + link + ": " + error.message());
+  const std::error_code error = inSeveralAttempts([&] {
+    const std::error_code trouble = files.remove(link);
+    return trouble ? trouble : files.linkSymbolically(archive, link);
+  });
+  // Without logs of the service there is no directory for it.
+  if (error && error != std::errc::no_such_file_or_directory)
+    log.warning("Could not link the latest archive at " + link + ": " + error.message());
 }
 
 void linkArchiveOfEarlier(FilePlacement& files, const std::string& logRoot, const std::string& service,

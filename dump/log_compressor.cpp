@@ -6,6 +6,7 @@
 #include <utility>
 
 #include "collectors/file_url.h"
+#include "dump/several_attempts.h"
 #include "platform/agent_log.h"
 #include "platform/file_placement.h"
 #include "platform/work_queue.h"
@@ -41,14 +42,6 @@ std::string temporarySuffix(std::string name) {
   std::size_t start = name.size() - kLongestTemporarySuffix;
   while (start < name.size() && (static_cast<unsigned char>(name[start]) & 0xC0U) == 0x80U) ++start;
   return name.substr(start);
-}
-
-/// Once more where it fails: a signal or a moment without descriptors is enough for that.
-void removeTree(FilePlacement& files, const std::string& path) {
-  constexpr int kMostTimes = 3;
-  for (int time = 0; time < kMostTimes; ++time) {
-    if (!files.remove(path)) return;
-  }
 }
 
 /// Not to be written any more, it is no leftover of who made it. False when there is none.
@@ -116,14 +109,16 @@ void _LirraLogCompressor::_settle(FileCopierJob& job, const std::string& tempora
                                   const std::string& archive, std::function<void()> completion) {
   _services.queues.global(QueuePriority::standard)
       .async([this, &job, temporary, archive, completion = std::move(completion)]() mutable {
-        const std::error_code error = _services.files.move(temporary, archive);
+        FilePlacement& files = _services.files;
+        const std::error_code error = inSeveralAttempts([&] { return files.move(temporary, archive); });
         const bool isKept = error && keepInTemporaryArea(temporary);
         if (isKept) {
           _services.log.warning("\"" + archive + "\" could not be put in its place (" + error.message() +
                                 "); for a day it is kept as \"" + temporary + '"');
         }
         // What is in no archive stays. Without a slash at the end: with one, a link would be followed.
-        if (!error || isKept) removeTree(_services.files, withoutEndSlashes(job.identifier()));
+        if (!error || isKept)
+          inSeveralAttempts([&] { return files.remove(withoutEndSlashes(job.identifier())); });
         _services.queues.main().async([this, &job, completion = std::move(completion)] {
           const auto released = _take(job);
           if (completion) completion();

@@ -1,8 +1,12 @@
 #include "session/collected_files.h"
 
 #include <gtest/gtest.h>
+#include <sys/syscall.h>
+
+#include <cerrno>
 
 #include "collectors/file_collector.h"
+#include "tests/support/failing_calls.h"
 #include "tests/support/fake_services.h"
 #include "tests/support/plain_file_placement.h"
 #include "tests/support/temporary_directory.h"
@@ -74,6 +78,15 @@ TEST_F(CollectedFilesMoveTest, AnEmptyCategoryIsTheDirectoryItself) {
 TEST_F(CollectedFilesMoveTest, PassesOverWhatIsMissing) {
   place({{"Ping", {home / "missing.log", fileNamed("there.log")}}});
   EXPECT_EQ(testing::listTree(directory), "Ping/\nPing/there.log\n");
+}
+
+TEST_F(CollectedFilesMoveTest, AFileThatCannotBeLookedAtForAMomentIsMoved) {
+  const std::string a = fileNamed("a.log");
+  if (!testing::withFailingCalls({{SYS_newfstatat, EIO, 1, testing::namesPath(a)}}, [&] {
+        place({{"Ping", {a}}});
+      }))
+    GTEST_SKIP();
+  EXPECT_EQ(testing::listTree(directory), "Ping/\nPing/a.log\n");
 }
 
 TEST_F(CollectedFilesMoveTest, RefusesACategoryThatLeadsOutAndGoesOn) {
