@@ -52,6 +52,24 @@ std::string noise(std::size_t bytes) {
   return text;
 }
 
+TEST_F(FullDiskE2eTest, AFileFromAnotherFileSystemIsWholeInTheSessionsDirectoryBeforeTheAgentEnds) {
+  start();
+  const std::string content = noise(2'000'000);
+  testing::writeFile(sandbox / "capture.pcap", content);
+  {
+    lirra::Client client = makeClient();
+    client.beginSession("Vistel");
+    for (const char* text : {"one", "two"}) client.checkpoint("Vistel", text, 1714651388.0);
+    client.addLogFile("Vistel", "Captures", sandbox / "capture.pcap");
+    ASSERT_EQ(client.flush(kReplyLimit), LIRRA_OK);
+  }
+  EXPECT_EQ(agent->terminate(), 0);
+  EXPECT_FALSE(std::filesystem::exists(sandbox / "capture.pcap"));
+  const std::string captures = sandbox.sessionDirectory("Vistel") + "/Captures";
+  EXPECT_EQ(testing::listTree(captures), "capture.pcap\n");
+  EXPECT_TRUE(testing::readFile(captures + "/capture.pcap") == content);
+}
+
 TEST_F(FullDiskE2eTest, ADumpThatFindsNoRoomForItsArchiveStaysAsItIsAndSaysSo) {
   start();
   const std::string content = noise(1'000'000);
