@@ -61,6 +61,15 @@ TEST_F(AgentLifecycleE2eTest, ASecondAgentOnTheSameSocketNamesTheHolderAndEndsWi
   EXPECT_TRUE(client.barrier()) << "the first one goes on";
 }
 
+TEST_F(AgentLifecycleE2eTest, AnAgentThatFindsNoDescriptorsSaysSoAndEndsWithStatus1) {
+  AgentProcess::Options options;
+  options.waitUntilListening = false;
+  options.launcher = {"/bin/sh", "-c", R"(ulimit -n 4 && exec "$0" "$@")"};
+  start(options);
+  EXPECT_EQ(agent->waitForExit(), 1);
+  EXPECT_THAT(output(), HasSubstr("zalloggingagent: cannot start: "));
+}
+
 TEST_F(AgentLifecycleE2eTest, ASocketLeftByAKilledAgentIsReplaced) {
   start();
   agent->signal(SIGKILL);
