@@ -12,7 +12,7 @@ TEST_FUZZ_SECONDS ?= 5
 
 .PHONY: help demo test build bench crash-points fuzz soak lint format hooks install clean \
 	dependencies-build dependencies-demo dependencies-test dependencies-bench dependencies-develop \
-	build-plain build-address build-thread test-plain test-address test-thread house-check fuzz-short bench-once
+	build-plain build-address build-thread test-plain test-address test-thread house-check fuzz-short
 
 help:
 	@sed -n 's/^## //p' Makefile
