@@ -13,6 +13,9 @@ namespace {
 // Counts the zones that were in force, so that no thread answers from one that is gone.
 std::atomic<unsigned> zoneGeneration{0};
 
+constexpr std::chrono::sys_seconds kEndOfCalendar =
+    std::chrono::sys_days{std::chrono::year{10000} / std::chrono::January / 1};
+
 struct LastSecond {
   std::chrono::sys_seconds second;
   unsigned generation = 0;
@@ -79,6 +82,8 @@ std::optional<WallTime> LinuxClock::momentOf(const LocalTime& time) const {
   }
   const auto shown = std::chrono::sys_days{date} + std::chrono::hours{time.hour} +
                      std::chrono::minutes{time.minute} + std::chrono::seconds{time.second};
+  // A leap second may follow the last second of all, which no calendar of ours shows.
+  if (shown >= kEndOfCalendar) return std::nullopt;
   // mktime would look for another zone, and from then on every thread would answer from that one.
   const auto nearby = shown - zoneOffsetAt(shown);
   return WallTime{shown - zoneOffsetAt(nearby)} + std::chrono::milliseconds{time.millisecond};

@@ -128,6 +128,9 @@ TEST_F(LinuxClockTest, ThereIsNoMomentForAnImpossibleDateOrTime) {
     EXPECT_EQ(clock.momentOf(time), std::nullopt) << text(time);
   }
   EXPECT_TRUE(clock.momentOf({2024, 2, 29, 23, 59, 60, 0}));  // a leap second may be written down
+  EXPECT_TRUE(clock.momentOf({9999, 12, 31, 23, 59, 59, 0}));
+  EXPECT_EQ(clock.momentOf({9999, 12, 31, 23, 59, 60, 0}),
+            std::nullopt);  // would be in a year of five digits
 }
 
 TEST_F(LinuxClockTest, TheLastSecondBefore1970IsAMomentLikeAnyOther) {
