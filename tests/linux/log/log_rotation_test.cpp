@@ -215,7 +215,7 @@ TEST_F(LogRotationTest, AGenerationThatCannotBeLookedAtIsNotWrittenOver) {
   std::error_code error;
   if (!testing::withFailingCalls({{SYS_newfstatat, EIO, 1, testing::namesPath("Vistel.log.1.zip")}},
                                  [&] { error = complete(); }))
-    GTEST_SKIP();
+    GTEST_SKIP() << "the host lets no system call fail";
   EXPECT_EQ(error, std::errc::io_error);
   EXPECT_EQ(generations(), "1=g1 ");
   EXPECT_EQ(complete(), std::error_code{});
