@@ -5,12 +5,16 @@ JOBS := $(shell nproc 2>/dev/null || echo 2)
 # Tests wait for children, buses and timeouts more than they compute.
 TEST_JOBS := $(shell expr 3 \* $(JOBS))
 CMAKE := cmake
+# Ninja keeps all processors busy where make waits for one library after the other. A folder that was configured for
+# another one cannot be taken over.
+configure = { grep -qs '^CMAKE_GENERATOR:INTERNAL=Ninja$$' $(1)/CMakeCache.txt || \
+	rm -rf $(1)/CMakeCache.txt $(1)/CMakeFiles; } && $(CMAKE) -G Ninja -Wno-dev -S . -B $(1)
 # Seconds that each fuzzer runs; `make test` gives them a short turn.
 FUZZ_SECONDS ?= 120
 SOAK_ROUNDS ?= 150
 TEST_FUZZ_SECONDS ?= 5
 
-.PHONY: help demo test build bench crash-points fuzz soak lint format hooks install clean \
+.PHONY: help demo test build bench bench-once crash-points fuzz soak lint format hooks install clean \
 	dependencies-build dependencies-demo dependencies-test dependencies-bench dependencies-develop \
 	build-plain build-address build-thread test-plain test-address test-thread house-check fuzz-short
 
@@ -23,7 +27,7 @@ demo: build dependencies-demo
 
 ## make build    the programs, in build/bin
 build: dependencies-build
-	$(CMAKE) -Wno-dev -S . -B $(BUILD) -DCMAKE_BUILD_TYPE=Release -DZAL_TESTS=OFF -DZAL_BENCH=OFF
+	$(call configure,$(BUILD)) -DCMAKE_BUILD_TYPE=Release -DZAL_TESTS=OFF -DZAL_BENCH=OFF
 	$(CMAKE) --build $(BUILD) -j $(JOBS)
 
 ## make test     all tests with sanitizers (address and undefined; thread), the finished product from outside, a short fuzz run
@@ -39,8 +43,8 @@ house-check:
 
 # The product as its users get it, tested from outside. What is tested from within runs below, with a sanitizer.
 build-plain:
-	$(CMAKE) -Wno-dev -S . -B $(BUILD) -DCMAKE_BUILD_TYPE=Release -DZAL_TESTS=ON -DZAL_TESTS_FROM_OUTSIDE=ON \
-		-DZAL_BENCH=ON
+	$(call configure,$(BUILD)) -DCMAKE_BUILD_TYPE=Release -DZAL_TESTS=ON -DZAL_TESTS_FROM_OUTSIDE=ON \
+		-DZAL_BENCH=OFF
 	$(CMAKE) --build $(BUILD) -j $(JOBS)
 
 # There are a hundred sanitized programs, each large.
@@ -49,13 +53,13 @@ FAST_LINKER := -DCMAKE_EXE_LINKER_FLAGS=-fuse-ld=lld -DCMAKE_SHARED_LINKER_FLAGS
 # All test programs. clang here and for threads, where it is the faster one; GCC reads all of the product above. Not
 # optimised: half the compiler's time.
 build-address:
-	$(CMAKE) -Wno-dev -S . -B $(BUILD)/address -DCMAKE_BUILD_TYPE=Debug -DZAL_TESTS=ON -DZAL_FUZZ=ON \
+	$(call configure,$(BUILD)/address) -DCMAKE_BUILD_TYPE=Debug -DZAL_TESTS=ON -DZAL_FUZZ=ON \
 		-DZAL_SANITIZE=address,undefined -DCMAKE_C_COMPILER=clang -DCMAKE_CXX_COMPILER=clang++ \
 		-DCMAKE_CXX_FLAGS_DEBUG="-O0 -g1" $(FAST_LINKER)
 	$(CMAKE) --build $(BUILD)/address -j $(JOBS)
 
 build-thread:
-	$(CMAKE) -Wno-dev -S . -B $(BUILD)/thread -DCMAKE_BUILD_TYPE=Debug -DZAL_TESTS=ON \
+	$(call configure,$(BUILD)/thread) -DCMAKE_BUILD_TYPE=Debug -DZAL_TESTS=ON \
 		-DZAL_SANITIZE=thread -DCMAKE_C_COMPILER=clang -DCMAKE_CXX_COMPILER=clang++ -DCMAKE_CXX_FLAGS_DEBUG="-O0 -g1" $(FAST_LINKER)
 	$(CMAKE) --build $(BUILD)/thread -j $(JOBS)
 
@@ -80,7 +84,7 @@ fuzz: dependencies-build dependencies-test build-address
 
 ## make crash-points  the agent killed, torn and refused at each of its system calls, one table at the end
 crash-points: dependencies-build dependencies-test
-	$(CMAKE) -Wno-dev -S . -B $(BUILD) -DCMAKE_BUILD_TYPE=Release -DZAL_TESTS=ON -DZAL_TESTS_FROM_OUTSIDE=ON
+	$(call configure,$(BUILD)) -DCMAKE_BUILD_TYPE=Release -DZAL_TESTS=ON -DZAL_TESTS_FROM_OUTSIDE=ON
 	$(CMAKE) --build $(BUILD) --target crash_points -j $(JOBS)
 	scripts/crash-points $(BUILD)/tests/bin/crash_points $(JOBS)
 
@@ -91,14 +95,20 @@ soak: dependencies-build dependencies-test build-plain
 
 ## make bench    the benchmarks against their peers, one table at the end
 bench: dependencies-build dependencies-test dependencies-bench
-	$(CMAKE) -Wno-dev -S . -B $(BUILD) -DCMAKE_BUILD_TYPE=Release -DZAL_TESTS=OFF -DZAL_BENCH=ON
+	$(call configure,$(BUILD)) -DCMAKE_BUILD_TYPE=Release -DZAL_TESTS=OFF -DZAL_BENCH=ON
 	$(CMAKE) --build $(BUILD) -j $(JOBS)
 	bench/run $(BUILD)/bin
+
+## make bench-once  whether the benchmarks work, in a minute; their figures say nothing
+bench-once: dependencies-build dependencies-test dependencies-bench
+	$(call configure,$(BUILD)) -DCMAKE_BUILD_TYPE=Release -DZAL_TESTS=OFF -DZAL_BENCH=ON
+	$(CMAKE) --build $(BUILD) -j $(JOBS)
+	bench/run $(BUILD)/bin --quick
 
 ## make lint     each file by itself: does it compile, what does clang-tidy say, how is it laid out
 lint: dependencies-build dependencies-develop
 	git ls-files '*.cpp' '*.h' '*.hpp' | xargs clang-format --dry-run -Werror
-	$(CMAKE) -Wno-dev -S . -B $(BUILD)/lint -DCMAKE_BUILD_TYPE=Debug -DZAL_TESTS=OFF -DZAL_UNITY=OFF
+	$(call configure,$(BUILD)/lint) -DCMAKE_BUILD_TYPE=Debug -DZAL_TESTS=OFF -DZAL_UNITY=OFF
 	$(CMAKE) --build $(BUILD)/lint -j $(JOBS)
 	git ls-files 'platform/*.cpp' 'collectors/*.cpp' 'session/*.cpp' 'dump/*.cpp' 'agent/*.cpp' 'client/*.cpp' 'cli/*.cpp' \
 		| xargs -P $(JOBS) -n 4 clang-tidy -p $(BUILD)/lint --quiet
@@ -113,7 +123,7 @@ hooks: dependencies-develop
 
 ## make install  the programs, library, headers and unit files; DESTDIR and PREFIX as usual
 install: build
-	$(CMAKE) -S . -B $(BUILD) -DCMAKE_INSTALL_PREFIX=$(or $(PREFIX),/usr/local)
+	$(call configure,$(BUILD)) -DCMAKE_INSTALL_PREFIX=$(or $(PREFIX),/usr/local)
 	$(CMAKE) --build $(BUILD) -j $(JOBS)
 	$(CMAKE) --install $(BUILD)
 

@@ -1,11 +1,13 @@
 #include "agent/message_handler.h"
 
+#include <cstddef>
 #include <cstdint>
 #include <exception>
 #include <string>
 
 #include "agent/request_table.h"
 #include "platform/main_thread_watch.h"
+#include "session/session_writings.h"
 
 namespace zal {
 namespace {
@@ -59,7 +61,9 @@ void MessageHandler::_handleMessage(const std::shared_ptr<PeerConnection>& peer,
   const auto table = requestTable();
   if (code >= table.size()) return;
   const MainThreadWatch::Span span("request", table[code].name);
+  const std::size_t begun = _writings != nullptr ? _writings->begun() : 0;
   table[code].carryOut({*_server, *_clock, peer, message});
+  if (_writings != nullptr && _writings->begun() != begun) _writings->keepUntilFinished(peer->holdBarriers());
 }
 
 }  // namespace zal

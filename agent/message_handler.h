@@ -8,6 +8,7 @@
 
 namespace zal {
 
+class SessionWritings;
 class ZalLoggingAgentServer;
 
 /// Every event of every peer: a dictionary becomes one row of the request table, a lost connection
@@ -17,9 +18,11 @@ class ZalLoggingAgentServer;
 ///     listener->resume(onInvalid, MessageHandler(server, agentLog, clock));
 class MessageHandler {
  public:
-  /// Borrowed: all three outlive the listener that calls this.
-  MessageHandler(ZalLoggingAgentServer& server, AgentLog& agentLog, const Clock& clock)
-      : _server(&server), _agentLog(&agentLog), _clock(&clock) {}
+  /// Borrowed: all of them outlive the listener that calls this. With writings the barriers of a peer that
+  /// ended a session wait for its files.
+  MessageHandler(ZalLoggingAgentServer& server, AgentLog& agentLog, const Clock& clock,
+                 SessionWritings* writings = nullptr)
+      : _server(&server), _agentLog(&agentLog), _clock(&clock), _writings(writings) {}
 
   void operator()(const std::shared_ptr<PeerConnection>& peer, const IpcEvent& event) const;
 
@@ -30,6 +33,7 @@ class MessageHandler {
   ZalLoggingAgentServer* _server;
   AgentLog* _agentLog;
   const Clock* _clock;
+  SessionWritings* _writings;
 };
 
 }  // namespace zal

@@ -90,7 +90,7 @@ void ZalLoggingAgentServer::start() {
           _platform.agentLog.warning("Connection went invalid, exiting");
           _platform.processExit.exit(0);
         },
-        MessageHandler(*this, _platform.agentLog, _platform.clock));
+        MessageHandler(*this, _platform.agentLog, _platform.clock, _sessionServices.writings));
   }
   _noteActivity();
 }

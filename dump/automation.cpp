@@ -13,7 +13,7 @@
 namespace zal {
 namespace {
 
-constexpr const char* kVideoCalls = "Vistel Automation";
+constexpr const char* kAutomationTitle = "Vistel Automation";
 constexpr const char* kMessaging = "Quillet Automation";
 constexpr const char* kNoTarget = "Not starting automation, no target was specified";
 
@@ -41,14 +41,14 @@ void Automation::startVideoCalls(OptionalText sender, ActionServer& server) {
   _platform.shell.PerformSystem(callStressCommand(resolveAndStandardize(
       _platform.configuration.roots.DiagnosticReportRoot, _platform.files.homeDirectory())));
   server.setAutomationRunning(true);
-  _alert(kVideoCalls, "Started Vistel automation");
+  _alert(kAutomationTitle, "Started Vistel automation");
 }
 
 void Automation::stopVideoCalls(OptionalText sender, ActionServer& server) {
   _log("Stopping automation on behalf of: ", textOr(sender, kNoSender));
   _platform.shell.PerformSystem("/usr/bin/killall -9 runnel");
   server.setAutomationRunning(false);
-  _alert(kVideoCalls, "Stopped Vistel automation");
+  _alert(kAutomationTitle, "Stopped Vistel automation");
 }
 
 void Automation::startMessaging(OptionalText sender, const ValueMap* userInfo, ActionServer& server) {

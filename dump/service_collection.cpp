@@ -18,7 +18,7 @@ namespace {
 constexpr std::string_view kVideoCalls = "Vistel";
 
 /// What the steps of one collection work with.
-struct Context {
+struct CollectionContext {
   Platform& platform;
   Collectors& collectors;
   const CollectionRequest& request;
@@ -44,7 +44,7 @@ struct Context {
   }
 };
 
-void collectMedia(const Context& at) {
+void collectMedia(const CollectionContext& at) {
   FileCollector& files = at.files();
   at.makeDestination();
   files.LinkDirectoryEntriesWithPrefix(at.roots().MediaLogCacheDir, "Jitter", at.request.destination);
@@ -60,12 +60,12 @@ void collectMedia(const Context& at) {
                                        at.make("RadioMarshal"));
 }
 
-void collectWifi(const Context& at) {
+void collectWifi(const CollectionContext& at) {
   takeWifiDump(at.platform, at.request.service, at.request.reason, at.wait, at.record);
   at.files().LinkDirectoryEntriesWithPrefix(at.roots().SystemReportRoot, "setkey", at.request.destination);
 }
 
-void collectLocation(const Context& at) {
+void collectLocation(const CollectionContext& at) {
   const std::string directory = at.make("Location");
   const std::string source =
       resolveAndStandardize(at.roots().LocationCacheDir, at.platform.files.homeDirectory());
@@ -79,7 +79,7 @@ void collectLocation(const Context& at) {
   }
 }
 
-void collectCloudSync(const Context& at) {
+void collectCloudSync(const CollectionContext& at) {
   at.makeDestination();
   const std::string& log = at.settings().cloudSyncLog;
   if (log.empty()) return;
@@ -87,12 +87,12 @@ void collectCloudSync(const Context& at) {
                                    at.request.destination, "");
 }
 
-void collectVideoCalls(const Context& at) {
+void collectVideoCalls(const CollectionContext& at) {
   at.make("Vistel");
   at.linkSets({std::string(kVideoCalls)}, at.request.destination);
 }
 
-void collectProximity(const Context& at) {
+void collectProximity(const CollectionContext& at) {
   at.files().LinkFileIntoDirectory(at.roots().MobileLogRoot + "/nearwaved-latest.log", at.make("Nearwave"),
                                    "");
   const std::string bluetooth = at.make("Bluetooth");
@@ -100,7 +100,7 @@ void collectProximity(const Context& at) {
   at.collectors.logs.CollectBluetoothLogs(bluetooth);
 }
 
-void collectHandover(const Context& at) {
+void collectHandover(const CollectionContext& at) {
   const std::string launch = at.make("Launchpath");
   at.files().LinkDirectoryEntriesWithPrefix(at.roots().MobileLogRoot + "/Handover/", "", launch);
   at.collectors.table.runInBackground(at.collectors.commands, CommandGroup::handover, launch);
@@ -109,28 +109,28 @@ void collectHandover(const Context& at) {
   at.collectors.table.runInBackground(at.collectors.commands, CommandGroup::sharing, sharing);
 }
 
-void collectIdentity(const Context& at) {
+void collectIdentity(const CollectionContext& at) {
   at.linkSets({"Nexa", "NexaIDQuery", "Transport", "Messages"}, at.make("Nexa"));
   at.files().LinkDirectoryEntriesWithPrefix(at.roots().TemporaryRoot, "uart-", at.make("uart"));
   at.linkSets({"Phone"}, at.make("Phone"));
   at.linkSets({"Phone Tandem"}, at.make("Phone Tandem"));
 }
 
-void collectPrediction(const Context& at) {
+void collectPrediction(const CollectionContext& at) {
   const std::string directory = at.make("Kinsight");
   for (const char* prefix : {"kinsight", "KinsightHeuristic-BM"}) {
     at.files().LinkDirectoryEntriesWithPrefix(at.roots().MobileLogRoot, prefix, directory);
   }
 }
 
-void collectNetwork(const Context& at) {
+void collectNetwork(const CollectionContext& at) {
   const bool includePing = (at.request.flags & kCollectPings) != 0;
   const std::string directory = at.make("Network");
   at.record.keepForThisStep(directory);  // it goes on by itself
   at.collectors.network.ForceNetworkDump(directory, includePing);
 }
 
-void collectRegistration(const Context& at) {
+void collectRegistration(const CollectionContext& at) {
   FileCollector& files = at.files();
   const std::string directory = at.make("Registration");
   at.linkSets({"Registration"}, directory, true);
@@ -147,16 +147,16 @@ void collectRegistration(const Context& at) {
   files.CopyDirectoryContents(at.roots().DiagnosticReportRoot + "/DiagnosticLogs/Accounts", directory);
 }
 
-void collectLocalPreview(const Context& at) {
+void collectLocalPreview(const CollectionContext& at) {
   at.files().LinkFileIntoDirectory(at.roots().MobileLogRoot + "/LocalPreview/LocalPreview.log",
                                    at.make("LocalPreview"), "");
 }
 
 /// One row of a collection. Without a flag it belongs to video calls, whatever is asked for.
-struct Step {
+struct CollectionStep {
   CollectionFlags flag;
   std::string_view name;
-  void (*run)(const Context& at);
+  void (*run)(const CollectionContext& at);
   bool isBig = false;  ///< what it takes lies on the disk already, and would be there once more
 
   [[nodiscard]] bool isAskedFor(const CollectionRequest& request) const {
@@ -171,7 +171,7 @@ struct Step {
   }
 };
 
-constexpr Step kSteps[] = {
+constexpr CollectionStep kSteps[] = {
     {kCollectMedia, "Media and radio logs", collectMedia, true},
     {kCollectMedia, "Wi-Fi diagnostics", collectWifi},
     {kCollectLocation, "Location", collectLocation, true},
@@ -186,7 +186,7 @@ constexpr Step kSteps[] = {
     {0, "Local preview", collectLocalPreview},
 };
 
-void makeClosingDirectories(const Context& at) {
+void makeClosingDirectories(const CollectionContext& at) {
   at.make("Push Logs");
   if ((at.request.flags & kCollectBaseband) != 0) at.make("Baseband Logs");
   at.make("Power");
@@ -199,7 +199,7 @@ void makeClosingDirectories(const Context& at) {
 
 std::vector<PlannedStep> ServiceCollection::plan(const CollectionRequest& request, bool savesRoom) {
   std::vector<PlannedStep> planned;
-  for (const Step& step : kSteps) {
+  for (const CollectionStep& step : kSteps) {
     planned.push_back({std::string(step.name), step.isWanted(request, savesRoom), step.whyNot(request)});
   }
   for (PlannedStep& step : ClosingStages::plan(request.flags, savesRoom)) planned.push_back(std::move(step));
@@ -223,10 +223,10 @@ void ServiceCollection::CollectServiceLogs(const CollectionRequest& request,
                                    .directory = request.destination,
                                    .flags = request.flags,
                                    .steps = plan(request, savesRoom)});
-  const Context at{platform, _services.collectors, request,
-                   *record,  _services.wait,       [this] { _dumpCoexistence(); }};
+  const CollectionContext at{platform, _services.collectors, request,
+                             *record,  _services.wait,       [this] { _dumpCoexistence(); }};
   std::size_t number = 0;
-  for (const Step& step : kSteps) {
+  for (const CollectionStep& step : kSteps) {
     if (!step.isWanted(request, savesRoom)) continue;
     record->step(++number);
     step.run(at);

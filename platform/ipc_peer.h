@@ -22,6 +22,9 @@ class PeerConnection {
   [[nodiscard]] virtual bool isConnected() const = 0;
   /// Answers the message that gave the token. Returned: whether it was accepted for sending.
   virtual bool sendReply(std::uint64_t replyToken, const ValueMap& reply) = 0;
+  /// What a message of this peer set going is not over yet: its barriers are answered once whoever holds this
+  /// has let go of it, on the main thread. Nothing where there are no barriers.
+  [[nodiscard]] virtual std::shared_ptr<void> holdBarriers() { return nullptr; }
   /// Ends the connection; no event is delivered after this.
   virtual void cancel() = 0;
 };

@@ -1,5 +1,8 @@
-#include "platform/agent_log.h"
+#include <optional>
+#include <utility>
+
 #include "session/device_model.h"
+#include "session/header_lines.h"
 #include "session/reference_time.h"
 #include "session/session_lines.h"
 #include "session/vistel_session.h"
@@ -12,15 +15,15 @@ std::optional<std::string> ZalLoggingAgentVistelSession::model() {
 }
 
 void ZalLoggingAgentVistelSession::_addHeaderLine(OptionalText label, OptionalText value) {
-  const auto line = headerLine(label, value);
-  if (!line) return;
-  if (_logCheckpoints || _logDescriptions) _services.agentLog.notice(echoOf(*line));
-  _logs.addHeader(*line);
+  if (auto line = headerLine(label, value)) _header->add(std::move(*line));
 }
 
 void ZalLoggingAgentVistelSession::_addTimeInformation() {
   _addHeaderLine("Time", "Separator");
-  _addHeaderLine("Reference Time", referenceTime(_services.commandRunner, _services.roots.TemporaryRoot));
+  // Waits for a command, which may take long.
+  _header->addAnswer([&commands = _services.commandRunner, directory = _services.roots.TemporaryRoot] {
+    return headerLine("Reference Time", referenceTime(commands, directory));
+  });
 }
 
 void ZalLoggingAgentVistelSession::_addCallInfoInformation() {

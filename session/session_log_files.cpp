@@ -1,6 +1,7 @@
 #include <filesystem>
 #include <memory>
 #include <system_error>
+#include <utility>
 #include <vector>
 
 #include "collectors/file_collector.h"
@@ -11,6 +12,7 @@
 #include "platform/standard_path.h"
 #include "session/collected_files.h"
 #include "session/date_text.h"
+#include "session/header_lines.h"
 #include "session/session_lines.h"
 #include "session/session_log_writing.h"
 #include "session/session_writings.h"
@@ -78,17 +80,18 @@ void ZalLoggingAgentVistelSession::writeSessionLog(bool endedByEndAll) {
   LinkRecentLogSets(_services.fileCollector, _services.roots, log, {_sessionType}, directory);
 
   const std::optional<std::string> recovered = headerLine("Recovered", _recoveryNote);
-  if (recovered) _logs.addTimedHeader(*recovered);
+  _header = std::make_shared<HeaderLines>(_logCheckpoints || _logDescriptions ? &log : nullptr);
+  if (recovered) _header->addTimed(*recovered);
   _addTimeInformation();
   _addCallInfoInformation();
   _addBuildInformation();
   _addFailureInformation();
   _addRecipientInformation();
   _addInitiatorInformation();
-  if (recovered) _logs.addQualityHeader(*recovered);
+  if (recovered) _header->addQuality(*recovered);
 
   const bool areLarge = _logs.areLarge();
-  const SessionLogs::Taken logs = _logs.take(directory, fileEnding);
+  const SessionLogs::Taken logs = _logs.take(directory, fileEnding, std::exchange(_header, nullptr));
   const auto close = [&services = _services, directory, record = _recorder.release(),
                       collection = _collection(directory, endedByEndAll)](bool isWritten) {
     // One that is left stays: perhaps the disk takes the files at the next start.
@@ -101,9 +104,13 @@ void ZalLoggingAgentVistelSession::writeSessionLog(bool endedByEndAll) {
     hold->release(hold->bytes());
     placeCollectedFiles(files, services, [close, isWritten](bool isPlaced) { close(isWritten && isPlaced); });
   };
-  if (areLarge && _services.writings != nullptr) return _services.writings->begin(logs.writing, finish);
-  _isWritten = logs.writing->run();
-  finish(_isWritten);
+  if (_services.writings == nullptr) {
+    _isWritten = logs.writing->run();
+    return finish(_isWritten);
+  }
+  _services.writings->begin(logs.writing, finish);
+  // The end of all of them is over when it returns, but for what would take longer than the main thread has.
+  if (endedByEndAll && !areLarge) _services.writings->finishAll();
 }
 
 CollectionRequest ZalLoggingAgentVistelSession::_collection(const std::string& directory,

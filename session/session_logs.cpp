@@ -15,6 +15,12 @@ constexpr std::uint64_t kLargestAtOnce = 4U << 20U;
 /// Once the beginning of a session is on the disk, the rest follows in such pieces.
 constexpr std::uint64_t kNextPart = 16U << 20U;
 
+void addHeader(_ZalLoggingAgentSessionSortedLogList& list, const HeaderLines& header) {
+  for (const std::string& line : header.timedLines()) list.prependLog(line);
+}
+void addHeader(QualityLogList& list, const HeaderLines& header) {
+  for (const std::string& line : header.qualityLines()) list.insertAtFront(line);
+}
 LogLines headerOf(const _ZalLoggingAgentSessionSortedLogList& list) { return list.prependedLines(); }
 LogLines headerOf(const QualityLogList& list) { return list.frontLines(); }
 LogLines allOf(const _ZalLoggingAgentSessionSortedLogList& list) { return list.copySortedLogList(); }
@@ -48,18 +54,6 @@ void SessionLogs::addQuality(std::string_view line) {
   _quality.lines.append(line);
   _note(memoryOfLine(line));
 }
-
-void SessionLogs::addHeader(std::string_view line) {
-  addTimedHeader(line);
-  addQualityHeader(line);
-}
-
-void SessionLogs::addTimedHeader(std::string_view line) {
-  _simple.lines.prependLog(line);
-  _verbose.lines.prependLog(line);
-}
-
-void SessionLogs::addQualityHeader(std::string_view line) { _quality.lines.insertAtFront(line); }
 
 bool SessionLogs::hasTimedLines() const { return _simple.count() > 0 || _verbose.count() > 0; }
 
@@ -117,10 +111,13 @@ SpilledLines::Freed SessionLogs::_freed() {
 }
 
 template <class List>
-SessionLogWriting::File SessionLogs::_fileOf(Log<List>& log, std::string path) {
+SessionLogWriting::File SessionLogs::_fileOf(Log<List>& log, std::string path,
+                                             std::shared_ptr<const HeaderLines> header) {
   // Shared, as a function is copied.
   const auto taken = std::make_shared<Log<List>>(std::exchange(log, {}));
-  return [taken, path = std::move(path), &files = _services.files, &agentLog = _services.agentLog] {
+  return [taken, path = std::move(path), header = std::move(header), &files = _services.files,
+          &agentLog = _services.agentLog] {
+    addHeader(taken->lines, *header);
     if (!taken->spilled) {
       const LogLines lines = allOf(taken->lines);
       taken->lines.removeAllObjects();
@@ -131,16 +128,21 @@ SessionLogWriting::File SessionLogs::_fileOf(Log<List>& log, std::string path) {
   };
 }
 
-SessionLogs::Taken SessionLogs::take(const std::string& directory, const std::string& fileEnding) {
+SessionLogs::Taken SessionLogs::take(const std::string& directory, const std::string& fileEnding,
+                                     const std::shared_ptr<HeaderLines>& header) {
   Taken taken;
   taken.hold = std::make_shared<MemoryHold>();
   taken.hold->absorb(_hold);
   if (_leaving) taken.hold->absorb(*std::exchange(_leaving, nullptr));
   _bytes = 0;
   std::vector<SessionLogWriting::File> files;
-  files.push_back(_fileOf(_simple, directory + "/" + fileEnding));
-  files.push_back(_fileOf(_verbose, directory + "/Verbose " + fileEnding));
-  files.push_back(_fileOf(_quality, directory + "/Quality " + fileEnding));
+  files.emplace_back([header] {
+    header->complete();
+    return true;
+  });
+  files.push_back(_fileOf(_simple, directory + "/" + fileEnding, header));
+  files.push_back(_fileOf(_verbose, directory + "/Verbose " + fileEnding, header));
+  files.push_back(_fileOf(_quality, directory + "/Quality " + fileEnding, header));
   taken.writing = std::make_shared<SessionLogWriting>(std::move(files), _services.agentLog);
   return taken;
 }

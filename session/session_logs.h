@@ -8,6 +8,7 @@
 
 #include "platform/memory_ledger.h"
 #include "platform/work_queue.h"
+#include "session/header_lines.h"
 #include "session/quality_log_list.h"
 #include "session/session_log_writing.h"
 #include "session/session_services.h"
@@ -30,10 +31,6 @@ class SessionLogs final : public MemoryUser {
   /// A line of the verbose log alone.
   void addDescription(std::string_view line, double time);
   void addQuality(std::string_view line);
-  // Header lines: those of the quality log stand in the opposite order.
-  void addHeader(std::string_view line);
-  void addTimedHeader(std::string_view line);
-  void addQualityHeader(std::string_view line);
 
   [[nodiscard]] bool hasTimedLines() const;
   /// Whether any of the logs has so many.
@@ -45,8 +42,10 @@ class SessionLogs final : public MemoryUser {
     std::shared_ptr<SessionLogWriting> writing;
     std::shared_ptr<MemoryHold> hold;  ///< of the lines; let go of on the main thread
   };
-  /// Leaves them empty. The files come into the directory, with that ending of their names.
-  [[nodiscard]] Taken take(const std::string& directory, const std::string& fileEnding);
+  /// Leaves them empty. The files come into the directory, with that ending of their names. The header stands
+  /// at their top, in the quality log in the opposite order; whoever writes completes it.
+  [[nodiscard]] Taken take(const std::string& directory, const std::string& fileEnding,
+                           const std::shared_ptr<HeaderLines>& header);
 
   [[nodiscard]] std::uint64_t canGiveUp(const MemoryAccount* account) const override;
   void giveUp() override;
@@ -61,7 +60,8 @@ class SessionLogs final : public MemoryUser {
   template <class List>
   void _spill(Log<List>& log);
   template <class List>
-  [[nodiscard]] SessionLogWriting::File _fileOf(Log<List>& log, std::string path);
+  [[nodiscard]] SessionLogWriting::File _fileOf(Log<List>& log, std::string path,
+                                                std::shared_ptr<const HeaderLines> header);
   void _note(std::uint64_t bytes);
   [[nodiscard]] SpilledLines::Freed _freed();
 

@@ -8,6 +8,7 @@ SessionWritings::SessionWritings(RunLoop& loop, WorkQueues& queues)
     : _loop(loop), _queue(queues.makeSerial("session.logs")) {}
 
 void SessionWritings::begin(std::shared_ptr<SessionLogWriting> writing, Finish finish) {
+  ++_begun;
   _pending->push_back({writing, std::move(finish)});
   _queue->async([this, &loop = _loop, writing, alive = std::weak_ptr(_pending)] {
     writing->run();
@@ -17,6 +18,10 @@ void SessionWritings::begin(std::shared_ptr<SessionLogWriting> writing, Finish f
       while (pending && !pending->empty() && pending->front().writing == writing) _finishFirst();
     });
   });
+}
+
+void SessionWritings::keepUntilFinished(std::shared_ptr<void> kept) {
+  if (!_pending->empty()) _pending->back().kept.push_back(std::move(kept));
 }
 
 void SessionWritings::finishAll() {

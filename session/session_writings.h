@@ -1,8 +1,10 @@
 #pragma once
 
+#include <cstddef>
 #include <functional>
 #include <list>
 #include <memory>
+#include <vector>
 
 #include "platform/run_loop.h"
 #include "platform/work_queue.h"
@@ -10,9 +12,9 @@
 
 namespace zal {
 
-/// Ended sessions whose files take long, as there are many lines or files from another file system: they are
-/// written one after the other and away from the main thread. Main thread only; loop and queues outlive it.
-/// What is unfinished at its end is not told.
+/// The files of ended sessions: there may be many lines or files from another file system, and the reference
+/// time has to be asked for. They are written one after the other and away from the main thread. Main thread
+/// only; loop and queues outlive it. What is unfinished at its end is not told.
 class SessionWritings {
  public:
   using Finish = std::function<void(bool isWritten)>;
@@ -22,6 +24,10 @@ class SessionWritings {
 
   /// `finish` is called once on the main thread, after the files of this one and of all before it.
   void begin(std::shared_ptr<SessionLogWriting> writing, Finish finish);
+  /// How many there were.
+  [[nodiscard]] std::size_t begun() const { return _begun; }
+  /// Lets go of it once all that were begun are finished, at once when all are.
+  void keepUntilFinished(std::shared_ptr<void> kept);
   /// Waits for all of them: for the end of the process.
   void finishAll();
 
@@ -29,11 +35,13 @@ class SessionWritings {
   struct Pending {
     std::shared_ptr<SessionLogWriting> writing;
     Finish finish;
+    std::vector<std::shared_ptr<void>> kept{};
   };
   void _finishFirst();
 
   RunLoop& _loop;
   const std::unique_ptr<WorkQueue> _queue;
+  std::size_t _begun = 0;
   std::shared_ptr<std::list<Pending>> _pending = std::make_shared<std::list<Pending>>();
 };
 

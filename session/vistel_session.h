@@ -85,8 +85,9 @@ class ZalLoggingAgentVistelSession : public std::enable_shared_from_this<ZalLogg
 
   /// The device model, or nothing when the host has none.
   [[nodiscard]] std::optional<std::string> model();
-  /// Writes and empties the logs; does nothing but log while all have fewer than four lines. The files of a
-  /// large session are there later, and what follows them follows then.
+  /// Writes and empties the logs; does nothing but log while all have fewer than four lines. Where the
+  /// services have writings the files are there later, and what follows them follows then; when all sessions
+  /// end, only those of a large one.
   void writeSessionLog(bool endedByEndAll);
 
   /// Where the files of a session that started at that moment go: absolute, without dots, and without links
@@ -172,6 +173,7 @@ class ZalLoggingAgentVistelSession : public std::enable_shared_from_this<ZalLogg
   mutable std::mutex _propertyLock;
   std::optional<std::string> _model;
   SessionLogs _logs;
+  std::shared_ptr<HeaderLines> _header;                            // while they are being written
   std::vector<std::string> _callInfoCategories, _callInfoStrings;  // parallel
   std::map<std::string, std::vector<Number>, std::less<>> _qualityMetrics;
   FilesByCategory _filesToCollect;

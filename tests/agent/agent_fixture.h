@@ -60,8 +60,13 @@ class AgentFixture : public ::testing::Test {
     for (const auto& [key, value] : server->sessions()) keys.push_back(key);
     return keys;
   }
-  /// A file below the report root; its whole text.
-  [[nodiscard]] std::string report(const std::string& path) const {
+  /// Has the files of sessions that have ended written.
+  void writeSessions() {
+    while (fake.queues.runNext("session.logs")) fake.host.drain();
+  }
+  /// A file below the report root once sessions are written; its whole text.
+  [[nodiscard]] std::string report(const std::string& path) {
+    writeSessions();
     return readFile(fake.configuration.roots.DiagnosticReportRoot + "/" + path);
   }
 

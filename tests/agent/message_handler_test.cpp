@@ -57,8 +57,9 @@ class MessageHandlerTest : public testing::AgentFixture {
   void endVistel() {
     send(1, {{"sessionType", text("Vistel")}, {"sender", text("caller")}});
     advance(3s);
+    writeSessions();
   }
-  [[nodiscard]] std::string vistelFile(const std::string& name) const {
+  [[nodiscard]] std::string vistelFile(const std::string& name) {
     return report("Vistel/2024-05-02 at 14-03-07 (CEST) (Receiver)/" + name + " (14-03-07).log");
   }
 
@@ -122,6 +123,23 @@ TEST_F(MessageHandlerTest, TheDescriptionOfAMessageIsMadeOnlyForALogThatIsSwitch
   fake.agentLog.enabledCategories = {"IPC"};
   send(message);
   EXPECT_EQ(message.descriptions, 1);
+}
+
+TEST_F(MessageHandlerTest, BarriersOfAPeerWhoseRequestEndedASessionWaitForItsFiles) {
+  const auto other = std::make_shared<FakePeer>();
+  beginVistel();
+  for (const char* checkpoint : {"a", "b", "c"}) {
+    send(2, {{"checkpoint", text(checkpoint)}, {"session", text("Vistel")}, {"time", 1714651388.5}});
+  }
+  EXPECT_FALSE(peer->holdsBarriers());
+  beginVistel();  // ends the one that was open
+  EXPECT_TRUE(peer->holdsBarriers());
+  FakeMessage pulse{{"__ipc__event_code__", std::int64_t{7}}, {"session", std::string("Vistel")}};
+  fake.ipc.onPeerEvent(other, IpcEvent{&pulse});
+  EXPECT_FALSE(other->holdsBarriers());
+  fake.queues.runAll();
+  EXPECT_FALSE(peer->holdsBarriers());
+  EXPECT_THAT(vistelFile("Log"), HasSubstr("[Sender: caller] End Session"));
 }
 
 TEST_F(MessageHandlerTest, AWholeSessionInRequestsGivesTheThreeFilesWhole) {

@@ -26,7 +26,7 @@ class SessionRecoveryTest : public testing::AgentFixture {
   [[nodiscard]] testing::FakeSessionRecords::Kept& record(std::size_t number) const {
     return *fake.sessionRecords.records.at(number);
   }
-  [[nodiscard]] std::string logOf(const std::string& type, const std::string& name = "Log") const {
+  [[nodiscard]] std::string logOf(const std::string& type, const std::string& name = "Log") {
     return report(type + "/2024-05-02 at 14-03-07 (CEST) (Receiver)/" + name + " (14-03-07).log");
   }
 };

@@ -72,6 +72,7 @@ TEST_F(SessionRegistryTest, CapturesAreStartedBeforeTheEarlierSessionIsWritten) 
   begin("Vistel", "first", 3, 11);
   addLines("Vistel");
   begin("Vistel", "second", 5, 22);
+  writeSessions();
   const std::string root = std::filesystem::canonical(fake.configuration.roots.DiagnosticReportRoot);
   EXPECT_THAT(calls, ElementsAre("StartSessionCaptures 3", "StartSessionCaptures 5",
                                  "CollectServiceLogs Vistel into " + root +

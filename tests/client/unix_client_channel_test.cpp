@@ -1,4 +1,5 @@
 #include <array>
+#include <atomic>
 #include <string>
 
 #include <gtest/gtest.h>
@@ -28,6 +29,25 @@ class UnixClientChannelTest : public ::testing::Test {
 
   TemporaryDirectory directory;
 };
+
+TEST_F(UnixClientChannelTest, AReportOfDropsThatIsDroppedItselfIsNoneOfThem) {
+  ScriptedAgent agent(directory / "agent");
+  ClientChannelOptions small = options();
+  small.queueLimit = 1000;
+  const std::string large(5000, 'x');
+  std::atomic<int> reports = 0;
+  small.roomAgain = [&](ClientChannel& channel, std::uint64_t dropped) {
+    EXPECT_EQ(dropped, 1U);
+    EXPECT_EQ(sendText(channel, large), ClientOutcome::tooLarge);
+    ++reports;
+    return false;
+  };
+  const auto channel = openClientChannel(small);
+  EXPECT_EQ(sendText(*channel, large), ClientOutcome::tooLarge);
+  for (int i = 0; i < 3; ++i) EXPECT_EQ(channel->flush(30s), ClientOutcome::done);
+  EXPECT_GE(reports, 1);
+  EXPECT_EQ(channel->status().dropped, 1U);
+}
 
 TEST_F(UnixClientChannelTest, FastCallerCostsFarFewerWritesThanRecords) {
   ScriptedAgent agent(directory / "agent");

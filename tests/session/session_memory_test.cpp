@@ -120,6 +120,7 @@ TEST_F(SessionMemoryTest, AnOrdinarySessionNeedsNoDiskBeforeItsEnd) {
   session->beginSessionWithSender("caller");
   noteCheckpoints(2);
   session->endSessionWithSender("caller");
+  fakes.queues.runAll();
   EXPECT_EQ(fakes.spillFiles.made, 0);
   EXPECT_THAT(verboseLog(), HasSubstr("Begin Session"));
   EXPECT_EQ(memory.total(), 0U);

@@ -7,7 +7,12 @@
 namespace zal::testing {
 namespace {
 
+using ::testing::AnyOf;
+using ::testing::ElementsAre;
 using ::testing::HasSubstr;
+using ::testing::IsEmpty;
+using ::testing::Not;
+using ::testing::StartsWith;
 
 /// A session with a file to collect, which lies on another file system.
 class SessionWritingsTest : public SessionFixture {
@@ -35,8 +40,60 @@ class SessionWritingsTest : public SessionFixture {
   const std::string capture = fakes.home / "capture";
 };
 
+TEST_F(SessionWritingsTest, WhoAsksForTheReferenceTimeIsNotTheMainThread) {
+  fakes.files.isElsewhere = {};
+  runSession();
+  EXPECT_THAT(fakes.shell.commands, IsEmpty());
+  EXPECT_EQ(verboseLog(), "");
+  fakes.shell.respond = [this](const std::string&) {
+    writeFile(fakes.configuration.roots.TemporaryRoot + "/time-file.txt", "in time\n");
+    return 0;
+  };
+  fakes.queues.runAll();
+  EXPECT_THAT(fakes.shell.commands, ElementsAre(HasSubstr("getReferenceTime")));
+  EXPECT_THAT(verboseLog(), StartsWith("[Time: Separator]\n[Reference Time: in time]\n"));
+}
+
+TEST_F(SessionWritingsTest, WhatIsAddedMeanwhileBelongsToTheNextSessionOfTheObject) {
+  fakes.files.isElsewhere = {};
+  session->setRecipient("bob");
+  runSession();
+  session->setRecipient("eve");
+  session->logCallInfo("video", "Kind", "caller");
+  session->noteCheckpoint("Later", kNow, "caller");
+  fakes.queues.runAll();
+  EXPECT_THAT(verboseLog(), HasSubstr("[Recipient ID: bob]"));
+  EXPECT_THAT(verboseLog(), Not(AnyOf(HasSubstr("eve"), HasSubstr("video"), HasSubstr("Later"))));
+}
+
+TEST_F(SessionWritingsTest, TheEndOfAllSessionsIsOverWhenItReturns) {
+  session->beginSessionWithSender("caller");
+  session->addLogFile(capture, "caller", "");
+  noteCheckpoints(3);
+  session->endSessionWithSender("ENDALL");
+  EXPECT_THAT(verboseLog(), HasSubstr("End Session"));
+  EXPECT_TRUE(isMoved());
+  ASSERT_EQ(collections.size(), 1U);
+  EXPECT_FALSE(collections[0].background);
+}
+
+TEST_F(SessionWritingsTest, AnythingIsKeptUntilAllThatWereBegunAreFinished) {
+  const auto kept = std::make_shared<int>();
+  const std::weak_ptr<int> alive = kept;
+  runSession();
+  EXPECT_EQ(writings.begun(), 1U);
+  writings.keepUntilFinished(kept);
+  EXPECT_EQ(kept.use_count(), 2);
+  fakes.queues.runAll();
+  EXPECT_EQ(kept.use_count(), 1);
+  writings.keepUntilFinished(kept);  // there are none
+  EXPECT_EQ(kept.use_count(), 1);
+}
+
 TEST_F(SessionWritingsTest, AFileOfAnotherFileSystemDoesNotHoldTheMainThreadAndWhatFollowsWaitsForIt) {
   runSession();
+  ASSERT_TRUE(fakes.queues.runNext("session.logs"));
+  fakes.host.drain();
   EXPECT_THAT(verboseLog(), HasSubstr("End Session"));
   EXPECT_TRUE(std::filesystem::exists(capture));
   EXPECT_FALSE(isRecordRemoved());
@@ -47,9 +104,12 @@ TEST_F(SessionWritingsTest, AFileOfAnotherFileSystemDoesNotHoldTheMainThreadAndW
   EXPECT_EQ(collections.size(), 1U);
 }
 
-TEST_F(SessionWritingsTest, AFileOfTheSameOneIsInItsPlaceAtOnce) {
+TEST_F(SessionWritingsTest, AFileOfTheSameOneIsInItsPlaceWithTheLogs) {
   fakes.files.isElsewhere = {};
   runSession();
+  ASSERT_TRUE(fakes.queues.runNext("session.logs"));
+  fakes.host.drain();
+  EXPECT_EQ(fakes.queues.readyJobs("session.logs"), 0U);
   EXPECT_TRUE(isMoved());
   EXPECT_TRUE(isRecordRemoved());
   EXPECT_EQ(collections.size(), 1U);

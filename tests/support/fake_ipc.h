@@ -69,6 +69,7 @@ class FakePeer : public PeerConnection {
   ~FakePeer() override;
   explicit FakePeer(pid_t processId = 4711) : _processId(processId) {}
   bool connected = true;
+  std::weak_ptr<void> barrierHold;
   std::vector<std::pair<std::uint64_t, ValueMap>> replies;
 
   [[nodiscard]] pid_t processId() const override { return _processId; }
@@ -77,6 +78,12 @@ class FakePeer : public PeerConnection {
     if (connected) replies.emplace_back(replyToken, reply);
     return connected;
   }
+  [[nodiscard]] std::shared_ptr<void> holdBarriers() override {
+    const auto hold = std::make_shared<int>();
+    barrierHold = hold;
+    return hold;
+  }
+  [[nodiscard]] bool holdsBarriers() const { return !barrierHold.expired(); }
   void cancel() override { connected = false; }
 
  private:

@@ -14,7 +14,7 @@
 namespace zal {
 namespace {
 
-constexpr unsigned long kMadeByUnix = (3U << 8U) | 30U;
+constexpr unsigned long kMadeByUnixVersion30 = (3U << 8U) | 30U;
 constexpr unsigned long kNameIsUtf8 = 1U << 11U;
 constexpr unsigned long kDirectoryAttribute = 0x10;
 constexpr std::size_t kLongestName = 65535;
@@ -105,7 +105,7 @@ void ZipContainer::beginEntry(const ArchiveEntry& entry, ZipMethod method, std::
                                    time.bytes.data(), time.size, nullptr,
                                    method == ZipMethod::deflated ? Z_DEFLATED : 0, Z_DEFAULT_COMPRESSION,
                                    1 /* raw */, -MAX_WBITS, DEF_MEM_LEVEL, Z_DEFAULT_STRATEGY, nullptr, 0,
-                                   kMadeByUnix, kNameIsUtf8, expectedSize >= kZip64From ? 1 : 0));
+                                   kMadeByUnixVersion30, kNameIsUtf8, expectedSize >= kZip64From ? 1 : 0));
   ++_entries;
 }
 

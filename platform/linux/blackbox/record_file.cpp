@@ -8,9 +8,11 @@
 #include <charconv>
 #include <filesystem>
 #include <system_error>
+#include <tuple>
 #include <utility>
 
 #include "platform/linux/blackbox/record_frame.h"
+#include "platform/linux/files/file_copy.h"
 #include "platform/linux/files/private_directory.h"
 
 namespace zal {
@@ -23,11 +25,6 @@ constexpr std::uint64_t kReserve = 512U << 10U;
 /// What waits in memory for a disk that refuses.
 constexpr std::size_t kMostPending = 1U << 20U;
 
-void syncDirectory(const std::string& path) {
-  const Descriptor directory(::open(path.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
-  if (directory.isOpen()) ::fsync(directory.get());
-}
-
 void syncFilesIn(const std::string& directory) {
   std::error_code error;
   for (const auto& entry : std::filesystem::directory_iterator(directory, error)) {
@@ -35,7 +32,7 @@ void syncFilesIn(const std::string& directory) {
     const Descriptor file(::open(entry.path().c_str(), O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC));
     if (file.isOpen()) ::fdatasync(file.get());
   }
-  syncDirectory(directory);
+  std::ignore = syncDirectory(directory);
 }
 
 }  // namespace
@@ -124,7 +121,7 @@ void RecordFile::sync() {
   if (!_syncs || !_file.isOpen() || _written == _synced) return;
   ::fdatasync(_file.get());
   // Its name is there from now on as well.
-  if (_synced == 0) syncDirectory(_directory);
+  if (_synced == 0) std::ignore = syncDirectory(_directory);
   _synced = _written;
 }
 

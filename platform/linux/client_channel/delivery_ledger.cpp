@@ -23,9 +23,10 @@ void DeliveryLedger::noteConnected(pid_t agent) {
   ++_status.connections;
 }
 
-void DeliveryLedger::noteRefused(const std::string& trouble, bool somebodyIsThere) {
+void DeliveryLedger::noteRefused(const std::string& trouble, bool somebodyIsThere,
+                                 std::uint64_t lastQuestion) {
   _status.trouble = trouble;
-  if (!somebodyIsThere) _answers.unreachable();
+  if (!somebodyIsThere) _answers.unreachable(lastQuestion);
 }
 
 void DeliveryLedger::noteConnectionLost(const std::string& trouble) {

@@ -29,7 +29,9 @@ class DeliveryLedger {
   void noteWritten(FrameBatch::Count count);
 
   void noteConnected(pid_t agent);
-  void noteRefused(const std::string& trouble, bool somebodyIsThere);
+  /// Before an attempt to connect: what it finds says nothing about questions that are asked later.
+  [[nodiscard]] std::uint64_t lastQuestion() const { return _answers.lastCookie(); }
+  void noteRefused(const std::string& trouble, bool somebodyIsThere, std::uint64_t lastQuestion);
   void noteConnectionLost(const std::string& trouble);
   void noteAnswer(const Frame& frame);
 

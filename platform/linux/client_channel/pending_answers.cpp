@@ -31,8 +31,9 @@ void PendingAnswers::connectionLost(std::uint64_t writtenFrames) {
   }
 }
 
-void PendingAnswers::unreachable() {
+void PendingAnswers::unreachable(std::uint64_t lastCookie) {
   for (auto& [cookie, question] : _questions) {
+    if (cookie > lastCookie) return;
     if (question.isBarrier && !question.outcome) question.outcome = ClientOutcome::unreachable;
   }
 }

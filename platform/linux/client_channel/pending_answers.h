@@ -30,8 +30,10 @@ class PendingAnswers {
   void replied(std::uint64_t cookie, std::optional<ValueMap> reply);
   /// Whatever was asked within the first `writtenFrames` and is unanswered will never be.
   void connectionLost(std::uint64_t writtenFrames);
-  /// Nobody to connect to: barriers give up, replies may still come later.
-  void unreachable();
+  [[nodiscard]] std::uint64_t lastCookie() const { return _lastCookie; }
+  /// Nobody to connect to, when somebody looked after that question was asked: barriers up to it give up,
+  /// replies may still come later.
+  void unreachable(std::uint64_t lastCookie);
   /// The frame of this cookie was not accepted after all.
   void forget(std::uint64_t cookie);
 

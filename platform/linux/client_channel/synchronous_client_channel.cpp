@@ -145,7 +145,7 @@ bool SynchronousClientChannel::_connect(Moment deadline, bool atOnce) {
     return true;
   }
   _retry.failed(steady_clock::now());
-  _ledger.noteRefused(_socket.trouble(), attempt == AgentSocket::Attempt::busy);
+  _ledger.noteRefused(_socket.trouble(), attempt == AgentSocket::Attempt::busy, _ledger.lastQuestion());
   return false;
 }
 

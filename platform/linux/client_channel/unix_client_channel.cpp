@@ -66,7 +66,8 @@ ClientOutcome UnixClientChannel::ask(std::span<const RequestField> fields, std::
 ClientOutcome UnixClientChannel::_append(std::optional<std::string_view> frame, Lock& lock) {
   const bool fits = frame && frame->size() <= _options.queueLimit;
   if (!fits || _queuedBytes() + frame->size() > _options.queueLimit) {
-    _ledger.noteDropped();
+    // A report of what was dropped comes again.
+    if (std::this_thread::get_id() != _ownThread) _ledger.noteDropped();
     return fits ? ClientOutcome::dropped : ClientOutcome::tooLarge;
   }
   _queue.append(*frame, true);

@@ -77,6 +77,7 @@ class UnixClientChannel final : public ClientChannel {
   bool _stop = false;
   DeliveryLedger _ledger;
   std::uint64_t _dropsReported = 0;
+  std::thread::id _ownThread;
   std::condition_variable _answered;  // … to here
 
   // The thread's own.

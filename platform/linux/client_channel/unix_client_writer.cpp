@@ -26,6 +26,10 @@ constexpr auto kReportInterval = 1s;
 
 void UnixClientChannel::_run() {
   ::pthread_setname_np(::pthread_self(), "lirra");
+  {
+    const Lock lock(_mutex);
+    _ownThread = std::this_thread::get_id();
+  }
   while (_takeWork()) {
     if (!_batch.isEmpty()) {
       if (!_socket.isOpen()) _connectWhenDue();
@@ -47,9 +51,11 @@ bool UnixClientChannel::_takeWork() {
 }
 
 void UnixClientChannel::_connectWhenDue() {
+  std::uint64_t lastQuestion = 0;
   {
     const Lock lock(_mutex);
     if (!std::exchange(_hurry, false) && !_retry.isDue(steady_clock::now())) return;
+    lastQuestion = _ledger.lastQuestion();
   }
   const AgentSocket::Attempt attempt = _socket.connect(_options.address);
   const auto now = steady_clock::now();
@@ -65,7 +71,7 @@ void UnixClientChannel::_connectWhenDue() {
   } else {
     _retry.failed(now);
   }
-  _ledger.noteRefused(_socket.trouble(), busy);
+  _ledger.noteRefused(_socket.trouble(), busy, lastQuestion);
   _answered.notify_all();
 }
 

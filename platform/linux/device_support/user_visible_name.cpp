@@ -6,7 +6,7 @@
 namespace zal {
 namespace {
 
-bool isControl(char32_t codePoint) {
+bool hasNoPlaceInAName(char32_t codePoint) {
   return codePoint < 0x20 || (codePoint >= 0x7F && codePoint <= 0x9F) || codePoint == 0x2028 ||
          codePoint == 0x2029;
 }
@@ -16,7 +16,7 @@ std::string cleanName(std::string_view bytes) {
   std::string name;
   for (std::string_view rest = text; !rest.empty();) {
     const Utf8Step step = nextUtf8(rest);
-    if (!isControl(step.codePoint)) name += rest.substr(0, step.size);
+    if (!hasNoPlaceInAName(step.codePoint)) name += rest.substr(0, step.size);
     rest.remove_prefix(step.size);
   }
   const auto first = name.find_first_not_of(' ');

@@ -13,7 +13,7 @@
 namespace zal {
 namespace {
 
-constexpr int kDeepest = 4;
+constexpr int kDeepestReport = 4;
 
 class ReportWalk {
  public:
@@ -28,7 +28,7 @@ class ReportWalk {
       const auto kept = level > 0 ? keptNameOf(name) : std::nullopt;
       if (kept && _isAsNamed(*kept, status)) {
         if (status.st_uid == ::geteuid()) _add(directory, name, below, type, *kept, status);
-      } else if (S_ISDIR(status.st_mode) && level < kDeepest) {
+      } else if (S_ISDIR(status.st_mode) && level < kDeepestReport) {
         const Descriptor opened = openDirectoryAt(directory, name);
         if (opened.isOpen()) walk(opened.get(), below, level == 0 ? name : type, level + 1);
       }

@@ -85,6 +85,10 @@ void UnixPeerConnection::_readTurn() {
     _isDelayed = false;
     return _awaitInput();
   }
+  if (size == 0 && !_heldBarriers.empty()) {
+    _saidAll = true;  // and may still listen for the answers
+    return;
+  }
   if (size <= 0) return _becomeInvalid();
 
   _decoder.feed({buffer, static_cast<std::size_t>(size)});
@@ -167,15 +171,8 @@ void UnixPeerConnection::_takeFrame(const std::shared_ptr<PeerConnection>& self,
     case FrameKind::message:
     case FrameKind::messageExpectingReply:
       return _takeMessage(self, frame);
-    case FrameKind::barrier: {
-      const MainThreadWatch::Span span("barrier");
-      if (_context->confirm) _context->confirm();
-      _context->showShares();
-      FrameHeader passed;
-      passed.kind = FrameKind::barrierPassed;
-      passed.cookie = frame.header.cookie;
-      return _queue(passed, {});
-    }
+    case FrameKind::barrier:
+      return _takeBarrier(frame.header.cookie);
     case FrameKind::reply:
     case FrameKind::barrierPassed:
       return _skipFrame();  // nothing was asked of a client
@@ -187,6 +184,42 @@ void UnixPeerConnection::_takeMessage(const std::shared_ptr<PeerConnection>& sel
   const auto message = WireMessage::fromFrame(frame);
   if (!message) return _skipFrame();
   if (_context->delivering) _context->handler(self, &*message);
+}
+
+std::shared_ptr<void> UnixPeerConnection::holdBarriers() {
+  _context->mainThread.check("UnixPeerConnection");
+  if (auto hold = _barrierHold.lock()) return hold;
+  const auto letGo = [peer = weak_from_this()](void*) {
+    if (const auto self = peer.lock()) self->_answerHeldBarriers();
+  };
+  std::shared_ptr<void> hold(this, letGo);  // nobody looks at what it points to
+  _barrierHold = hold;
+  return hold;
+}
+
+void UnixPeerConnection::_takeBarrier(std::uint64_t cookie) {
+  const MainThreadWatch::Span span("barrier");
+  if (_barrierHold.expired()) return _answerBarrier(cookie);
+  _heldBarriers.push_back(cookie);
+  if (_heldBarriers.size() * kFrameHeaderSize <= _context->settings.maximumReplyBacklog) return;
+  _context->log.warning(_name() + " sends barriers without waiting for their answers; it is disconnected");
+  _becomeInvalid();
+}
+
+void UnixPeerConnection::_answerHeldBarriers() {
+  for (const std::uint64_t cookie : std::exchange(_heldBarriers, {})) {
+    if (_socket && !_finished) _answerBarrier(cookie);
+  }
+  if (_saidAll) _becomeInvalid();
+}
+
+void UnixPeerConnection::_answerBarrier(std::uint64_t cookie) {
+  if (_context->confirm) _context->confirm();
+  _context->showShares();
+  FrameHeader passed;
+  passed.kind = FrameKind::barrierPassed;
+  passed.cookie = cookie;
+  _queue(passed, {});
 }
 
 void UnixPeerConnection::_skipFrame() {

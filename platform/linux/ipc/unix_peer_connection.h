@@ -3,6 +3,7 @@
 #include <memory>
 #include <optional>
 #include <string>
+#include <vector>
 
 #include <asio/posix/stream_descriptor.hpp>
 #include <asio/steady_timer.hpp>
@@ -36,6 +37,7 @@ class UnixPeerConnection final : public PeerConnection,
   [[nodiscard]] pid_t processId() const override { return _credentials.process; }
   [[nodiscard]] bool isConnected() const override { return _socket.has_value(); }
   bool sendReply(std::uint64_t replyToken, const ValueMap& reply) override;
+  [[nodiscard]] std::shared_ptr<void> holdBarriers() override;
   void cancel() override;
 
  private:
@@ -51,6 +53,9 @@ class UnixPeerConnection final : public PeerConnection,
   void _takeFrame(const std::shared_ptr<PeerConnection>& self, const Frame& frame);
   void _takeMessage(const std::shared_ptr<PeerConnection>& self, const Frame& frame);
   void _skipFrame();
+  void _takeBarrier(std::uint64_t cookie);
+  void _answerBarrier(std::uint64_t cookie);
+  void _answerHeldBarriers();
   void _queue(const FrameHeader& header, std::string_view payload);
   void _sendBacklog();
   void _awaitOutput();
@@ -64,6 +69,9 @@ class UnixPeerConnection final : public PeerConnection,
   FrameDecoder _decoder;
   std::string _backlog;  // answers, of which the first _sent bytes are gone
   std::size_t _sent = 0;
+  std::weak_ptr<void> _barrierHold;          // barriers wait for its end
+  std::vector<std::uint64_t> _heldBarriers;  // their cookies
+  bool _saidAll = false;                     // before they were answered
   bool _awaitingOutput = false;
   bool _finished = false;  // no event is delivered any more
   const std::shared_ptr<MemoryAccount> _account = std::make_shared<MemoryAccount>();

@@ -151,6 +151,63 @@ TEST_F(UnixPeerConnectionTest, ABarrierIsAnsweredAfterWhatCameBeforeItWasHandled
   EXPECT_EQ(client.frames(), Lines{"4/12379813738877118345/0"});
 }
 
+TEST_F(UnixPeerConnectionTest, BarriersWaitForWhatAMessageOfThatPeerSetGoingAndForNobodyElses) {
+  std::shared_ptr<void> hold;
+  onEvent = [&](const std::shared_ptr<PeerConnection>& peer, const IpcEvent& event) {
+    if (described(event) == "1:") hold = peer->holdBarriers();
+    if (described(event) == "2:") EXPECT_EQ(peer->holdBarriers(), hold);
+  };
+  TestClient client(path), other(path);
+  ASSERT_TRUE(client.send(requestFrame(1) + bareFrame(FrameKind::barrier, 7) + requestFrame(2) +
+                          bareFrame(FrameKind::barrier, 8)));
+  ASSERT_TRUE(runUntilEvents(2));
+  ASSERT_TRUE(other.send(requestFrame(3) + bareFrame(FrameKind::barrier, 9)));
+  ASSERT_TRUE(runUntil([&] { return other.frames() == Lines{"4/9/0"}; }));
+  EXPECT_EQ(client.frames(), Lines{});
+  hold.reset();
+  EXPECT_TRUE(runUntil([&] { return client.frames() == Lines{"4/7/0", "4/8/0"}; }));
+  ASSERT_TRUE(client.send(bareFrame(FrameKind::barrier, 10)));
+  EXPECT_TRUE(runUntil([&] { return client.frames().back() == "4/10/0"; }));
+}
+
+TEST_F(UnixPeerConnectionTest, AHalfOpenPeerStillGetsTheAnswersThatWereHeld) {
+  std::shared_ptr<void> hold;
+  onEvent = [&](const std::shared_ptr<PeerConnection>& peer, const IpcEvent& event) {
+    if (described(event) == "1:") hold = peer->holdBarriers();
+  };
+  TestClient client(path);
+  ASSERT_TRUE(client.send(requestFrame(1) + bareFrame(FrameKind::barrier, 9)));
+  client.endWriting();
+  ASSERT_TRUE(runUntilEvents(1));
+  runFor(20ms);
+  EXPECT_EQ(events, Lines{"1:"});
+  hold.reset();
+  ASSERT_TRUE(runUntilEvents(2));
+  EXPECT_EQ(events.back(), "invalid");
+  EXPECT_TRUE(runUntil([&] { return client.seesTheEnd(); }));
+  EXPECT_EQ(client.frames(), Lines{"4/9/0"});
+}
+
+TEST_F(UnixPeerConnectionTest, AFloodOfHeldBarriersIsBounded) {
+  settings.maximumReplyBacklog = 1000;
+  listener.reset();
+  startService();
+  std::shared_ptr<void> hold;
+  onEvent = [&](const std::shared_ptr<PeerConnection>& peer, const IpcEvent& event) {
+    if (described(event) == "1:") hold = peer->holdBarriers();
+  };
+  TestClient client(path);
+  std::string frames = requestFrame(1);
+  for (int i = 0; i < 1000; ++i) frames += bareFrame(FrameKind::barrier, 1);
+  ASSERT_TRUE(client.send(frames));
+  ASSERT_TRUE(runUntilEvents(2));
+  EXPECT_EQ(events, (Lines{"1:", "invalid"}));
+  lastPeer.reset();
+  hold.reset();  // whoever had it is gone
+  runFor(5ms);
+  EXPECT_EQ(events, (Lines{"1:", "invalid"}));
+}
+
 /// An agent of the thread in which its answers fail.
 class UnansweringAgent : public IpcFixture {
  public:
