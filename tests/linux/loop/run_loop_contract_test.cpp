@@ -131,7 +131,8 @@ TYPED_TEST(RunLoopContractTest, SleepObserversRunOnceNothingIsLeftToDo) {
   this->loop.addSleepObserver(this->note('.'));
   this->loop.post([this] { this->loop.post(this->note('b')); });
   this->loop.post(this->note('a'));
-  this->host.runFor(1ms);
+  // A busy machine may let the end of a run come before its sleep.
+  for (int tries = 0; tries < 1000 && this->trace.size() < 3; ++tries) this->host.runFor(1ms);
   EXPECT_EQ(this->trace.substr(0, 3), "ab.");
 }
 

@@ -21,8 +21,9 @@ struct LinuxHost {
   LinuxClock realClock;
   RunLoop& loop = runLoop;
   Clock& clock = realClock;
+  /// However late it is then: what was posted before is over.
   void runFor(std::chrono::nanoseconds duration) {
-    loop.callAfter(duration, [this] { loop.stop(); });
+    loop.callAfter(duration, [this] { loop.post([this] { loop.stop(); }); });
     loop.run();
   }
 };
