@@ -1,6 +1,7 @@
 #include "collectors/network_diagnostics.h"
 
 #include <optional>
+#include <utility>
 
 #include "collectors/cellular_snapshot.h"
 #include "collectors/command_table.h"
@@ -52,6 +53,11 @@ void makeDirectories(const DumpDirectories& paths, FileCollector& files, AgentLo
 
 }  // namespace
 
+NetworkDiagnostics::NetworkDiagnostics(const Services& services)
+    : _services(services), _captures(services.queues.makeSerial("network.captures")) {}
+
+NetworkDiagnostics::~NetworkDiagnostics() = default;
+
 bool NetworkDiagnostics::VideoCallsOverCellularAvailable() {
   return _services.deviceSupport.videoCallsOverCellularAvailable();
 }
@@ -65,34 +71,47 @@ void NetworkDiagnostics::StopCaptures() {
   _services.shell.PerformSystem(_services.table.stopReadersCommand());
 }
 
+void NetworkDiagnostics::StopCapturesThen(std::function<void()> then) {
+  _captures->async([this, then = std::move(then)] {
+    StopCaptures();
+    then();
+  });
+}
+
 void NetworkDiagnostics::StartSessionCaptures(std::uint64_t flags) {
-  const std::string& directory = _services.configuration.roots.TemporaryRoot;
-  StopCaptures();
-  if (_isPingTestPreferred() || (flags & kBeginFlagPingCaptures) != 0) {
-    if (VideoCallsOverCellularAvailable()) {
-      _services.pings.addPingTest(_services.configuration.endpoints.cellPingServer, kUntilStopped, false,
-                                  directory, kCellularPingCapture);
+  const bool withPings = _isPingTestPreferred() || (flags & kBeginFlagPingCaptures) != 0;
+  StopCapturesThen([this, flags, withPings] {
+    const std::string& directory = _services.configuration.roots.TemporaryRoot;
+    if (withPings) {
+      if (VideoCallsOverCellularAvailable()) {
+        _services.pings.addPingTest(_services.configuration.endpoints.cellPingServer, kUntilStopped, false,
+                                    directory, kCellularPingCapture);
+      }
+      _services.pings.addPingTest(kGateway, kUntilStopped, true, directory, kWifiPingCapture);
     }
-    _services.pings.addPingTest(kGateway, kUntilStopped, true, directory, kWifiPingCapture);
-  }
-  if ((flags & kBeginFlagSystemLogCaptures) != 0) {
-    _services.table.runInBackground(_services.commands, CommandGroup::sessionCaptures, directory);
-  }
+    if ((flags & kBeginFlagSystemLogCaptures) != 0) {
+      _services.table.runInBackground(_services.commands, CommandGroup::sessionCaptures, directory);
+    }
+  });
 }
 
 void NetworkDiagnostics::StartServerPings(const std::string& wifiOutputPath,
                                           const std::string& cellularOutputPath) {
-  const Endpoints& endpoints = _services.configuration.endpoints;
-  StopCaptures();
-  if (VideoCallsOverCellularAvailable()) {
-    _services.pings.addPingTest(endpoints.cellPingServer, kUntilStopped, false, cellularOutputPath);
-  }
-  _services.pings.addPingTest(endpoints.wifiPingServer, kUntilStopped, true, wifiOutputPath);
+  StopCapturesThen([this, wifiOutputPath, cellularOutputPath] {
+    const Endpoints& endpoints = _services.configuration.endpoints;
+    if (VideoCallsOverCellularAvailable()) {
+      _services.pings.addPingTest(endpoints.cellPingServer, kUntilStopped, false, cellularOutputPath);
+    }
+    _services.pings.addPingTest(endpoints.wifiPingServer, kUntilStopped, true, wifiOutputPath);
+  });
 }
 
 void NetworkDiagnostics::ForceNetworkDump(const std::string& directory, bool includePing) {
-  const bool withPings = _isPingTestPreferred() || includePing;
-  StopCaptures();
+  StopCapturesThen(
+      [this, directory, withPings = WantsPings(includePing)] { QueueNetworkDump(directory, withPings); });
+}
+
+void NetworkDiagnostics::QueueNetworkDump(const std::string& directory, bool withPings) {
   _services.queues.global(QueuePriority::background).async([this, directory, withPings] {
     CollectNetworkLogs(directory, withPings);
   });

@@ -1,6 +1,8 @@
 #pragma once
 
 #include <cstdint>
+#include <functional>
+#include <memory>
 #include <string>
 
 namespace zal {
@@ -13,6 +15,7 @@ class DeviceSupport;
 class FileCollector;
 class PreferenceStore;
 class SystemShell;
+class WorkQueue;
 class WorkQueues;
 enum class CommandGroup;
 class _ZalLoggingAgentPingRunner;
@@ -40,18 +43,28 @@ class NetworkDiagnostics {
     CellularSnapshot& cellular;
     _ZalLoggingAgentPingRunner& pings;
   };
-  explicit NetworkDiagnostics(const Services& services) : _services(services) {}
+  explicit NetworkDiagnostics(const Services& services);
+  ~NetworkDiagnostics();
+
+  // To kill the log readers a shell has to be waited for: where it does not say otherwise that is left to one
+  // serial queue, so that captures stop and start in the order in which this was called.
 
   /// Stops what captures there are, then starts those that the flags (or the preference "pingtest")
   /// ask for, into fixed files of the temporary root. Main thread only.
   void StartSessionCaptures(std::uint64_t flags);
   /// Stops long ping tests and kills every live log reader; waits for the latter. Any thread.
   void StopCaptures();
+  /// The same without waiting; `then` is called once they are gone, on any thread.
+  void StopCapturesThen(std::function<void()> then);
   /// Continuous pings of the two servers into these files. Main thread only.
   void StartServerPings(const std::string& wifiOutputPath, const std::string& cellularOutputPath);
   /// Stops the captures, then queues the collection at background priority. Main thread only;
   /// returns without waiting for the dump.
   void ForceNetworkDump(const std::string& directory, bool includePing);
+  /// The same where the captures were stopped; any thread.
+  void QueueNetworkDump(const std::string& directory, bool withPings);
+  /// Whether a dump has pings: asked for, or preferred by "pingtest". Main thread only.
+  [[nodiscard]] bool WantsPings(bool includePing) { return includePing || _isPingTestPreferred(); }
   /// The dump itself: fills CT, WiFi, Other, Statistics and Console below the directory, which are
   /// made as needed, and moves the captures there. Any thread, but made for the background queue: it
   /// takes its time. Commands and pings that it starts outlive it.
@@ -69,6 +82,7 @@ class NetworkDiagnostics {
   void _startDumpPings(const std::string& statistics, bool includePing);
 
   Services _services;
+  const std::unique_ptr<WorkQueue> _captures;
 };
 
 }  // namespace zal

@@ -36,17 +36,22 @@ std::string targetOf(const ValueMap* userInfo) {
 
 }  // namespace
 
+Automation::Automation(Platform& platform)
+    : _platform(platform), _commands(platform.queues.makeSerial("automation")) {}
+
+Automation::~Automation() = default;
+
 void Automation::startVideoCalls(OptionalText sender, ActionServer& server) {
   _log("Starting automation on behalf of: ", textOr(sender, kNoSender));
-  _platform.shell.PerformSystem(callStressCommand(resolveAndStandardize(
-      _platform.configuration.roots.DiagnosticReportRoot, _platform.files.homeDirectory())));
+  _perform(callStressCommand(resolveAndStandardize(_platform.configuration.roots.DiagnosticReportRoot,
+                                                   _platform.files.homeDirectory())));
   server.setAutomationRunning(true);
   _alert(kAutomationTitle, "Started Vistel automation");
 }
 
 void Automation::stopVideoCalls(OptionalText sender, ActionServer& server) {
   _log("Stopping automation on behalf of: ", textOr(sender, kNoSender));
-  _platform.shell.PerformSystem("/usr/bin/killall -9 runnel");
+  _perform("/usr/bin/killall -9 runnel");
   server.setAutomationRunning(false);
   _alert(kAutomationTitle, "Stopped Vistel automation");
 }
@@ -62,16 +67,20 @@ void Automation::startMessaging(OptionalText sender, const ValueMap* userInfo, A
   const std::string command =
       messagingTestCommand(target, integerOf(userInfo, "repetitions"), integerOf(userInfo, "interval"));
   _log("Starting zaltool automation: ", command);
-  _platform.shell.PerformSystem(command);
+  _perform(command);
   server.setAutomationRunning(true);
   _alert(kMessaging, "Starting Quillet automation with: " + target);
 }
 
 void Automation::stopMessaging(OptionalText sender, ActionServer& server) {
   _log("Stopping Quillet automation on behalf of: ", textOr(sender, kNoSender));
-  _platform.shell.PerformSystem("/usr/bin/killall -9 zaltool");
+  _perform("/usr/bin/killall -9 zaltool");
   server.setAutomationRunning(false);
   _alert(kMessaging, "Stopped Quillet automation");
+}
+
+void Automation::_perform(const std::string& command) {
+  _commands->async([&shell = _platform.shell, command] { shell.PerformSystem(command); });
 }
 
 void Automation::_log(std::string_view what, std::string_view text) {

@@ -24,11 +24,14 @@ class ServiceCollection {
     ClosingStages& closing;
     SignalWait wait = waitInSteadyTime;
     DiskBudgetKeeper* disk = nullptr;  ///< says whether there is room for the big steps
+    /// What may take long happens on the standard queue, in the same order; else on the calling thread.
+    bool usesQueues = false;
   };
   explicit ServiceCollection(const Services& services) : _services(services) {}
 
   /// Returns when the closing stages are queued, or their first one is done when the request is not
-  /// for the background. The completion runs once, on the main thread, when the archive is made.
+  /// for the background; with queues, and unless it is the last one, when the first steps are queued and the
+  /// destination is there. The completion runs once, on the main thread, when the archive is made.
   /// Whether the destination may be written to is the caller's affair.
   void CollectServiceLogs(const CollectionRequest& request, std::function<void()> completion = {});
 
@@ -38,7 +41,8 @@ class ServiceCollection {
                                                      bool savesRoom = false);
 
  private:
-  void _dumpCoexistence();
+  class Run;
+  [[nodiscard]] std::function<void()> _coexistenceDump(const CollectionRequest& request);
 
   Services _services;
   // The manager is looked up at the first need and then remembered, present or not.

@@ -115,7 +115,7 @@ void ZalLoggingAgentVistelSession::writeSessionLog(bool endedByEndAll) {
 
 CollectionRequest ZalLoggingAgentVistelSession::_collection(const std::string& directory,
                                                             bool endedByEndAll) const {
-  CollectionRequest request{_sessionType, directory, std::nullopt, !endedByEndAll, _endFlags};
+  CollectionRequest request{_sessionType, directory, std::nullopt, !endedByEndAll, _endFlags, endedByEndAll};
   const auto reason = failureReason();
   if (!isEmptyText(reason)) request.reason = _sessionType + " - " + *reason;
   return request;

@@ -36,6 +36,7 @@ struct CollectionRequest {
   std::optional<std::string> reason;  ///< "<type> - <failure reason>", when there was a failure
   bool background = true;             ///< false only when the agent ends all its sessions
   std::uint32_t flags = 0;            ///< the session's end flags
+  bool isLast = false;                ///< the process ends: nothing may be left for later
   bool operator==(const CollectionRequest&) const = default;
 };
 

@@ -68,6 +68,7 @@ TEST_F(AgentWorkshopTest, ASessionThatEndsIsCollectedInTheBackground) {
 
 TEST_F(AgentWorkshopTest, ASessionThatBeginsStartsTheCapturesItAskedFor) {
   server().beginSession("Vistel", "caller", 2, 0);
+  fake.queues.runAll();
   EXPECT_THAT(fake.shell.commands, Contains(::testing::HasSubstr("tessel")));
 }
 

@@ -10,6 +10,7 @@ class NetworkDiagnosticsTest : public testing::NetworkFixture {
   /// Requests a dump into "dump" and lets it run to its end.
   void dump(bool includePing) {
     network.ForceNetworkDump(fake.home / "dump", includePing);
+    changeCaptures();
     EXPECT_TRUE(fake.queues.runNext("global.background"));
   }
   void putCaptures() {
@@ -146,7 +147,7 @@ TEST_F(NetworkDiagnosticsTest, PreferencePingtestMakesADumpWithoutPingsTheSameAs
   EXPECT_NE(preferred.find("ping report.example over cellular"), std::string::npos);
 }
 
-TEST_F(NetworkDiagnosticsTest, RequestStopsTheCapturesAtOnceAndLeavesTheRestToTheBackgroundQueue) {
+TEST_F(NetworkDiagnosticsTest, RequestStopsTheCapturesFirstAndLeavesTheRestToTheBackgroundQueue) {
   network.ForceNetworkDump(fake.home / "dump", true);
   EXPECT_EQ(happened(), "run /usr/bin/killall -9 tessel\n");
   EXPECT_FALSE(std::filesystem::exists(fake.home / "dump"));

@@ -58,6 +58,7 @@ class NetworkFixture : public ::testing::Test {
   }
   /// Everything that happened, a line each.
   std::string happened() {
+    changeCaptures();
     _notePings();
     std::string text;
     for (const std::string& event : events) text += event + "\n";
@@ -66,6 +67,7 @@ class NetworkFixture : public ::testing::Test {
   /// The pings so far, finished now: where each went, for how long, and the file it wrote. A test's
   /// own default time stands as 60.
   std::string finishedPings() {
+    changeCaptures();
     _notePings();
     std::string text;
     for (const auto& test : fake.pings.tests) {
@@ -76,6 +78,11 @@ class NetworkFixture : public ::testing::Test {
       text += "\n";
     }
     return text;
+  }
+  /// Carries out what was asked of the captures so far.
+  void changeCaptures() {
+    while (fake.queues.runNext("network.captures")) {
+    }
   }
   static std::string pingText(const ScriptedPings::Test& test) {
     return "ping " + test.address + (test.wifi ? " over wifi" : " over cellular");

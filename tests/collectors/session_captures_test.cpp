@@ -17,6 +17,20 @@ TEST_F(SessionCapturesTest, FlagsOfNothingStartNothingButStopReadersAndRunningPi
   EXPECT_TRUE(fake.pings.tests.at(0)->stopped);
 }
 
+TEST_F(SessionCapturesTest, NobodyWaitsForTheReadersAndEachStartStopsWhatWasStartedBefore) {
+  network.StartSessionCaptures(2);
+  network.StartSessionCaptures(0);
+  bool isNext = false;
+  network.StopCapturesThen([&] { isNext = true; });
+  EXPECT_EQ(events, std::vector<std::string>{});
+  EXPECT_EQ(happened(),
+            std::string(kStop) +
+                "run /usr/bin/tessel -w > \"~/tmp/vistel-syslog.log\"  2>&1 &\n"
+                "run /usr/bin/tessel -k Time ge -5m > \"~/tmp/vistel-syslog-before.log\"  2>&1 &\n" +
+                kStop + kStop);
+  EXPECT_TRUE(isNext);
+}
+
 TEST_F(SessionCapturesTest, FlagOneAlonePingsTheServerOverCellularAndThenTheGateway) {
   network.StartSessionCaptures(1);
   EXPECT_EQ(happened(),

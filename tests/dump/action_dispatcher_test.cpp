@@ -227,6 +227,7 @@ TEST_F(ActionDispatcherTest, AutomationIsStartedAndStopped) {
   perform(11);
   EXPECT_THAT(server.calls,
               ElementsAre("automation runs", "automation stopped", "automation runs", "automation stopped"));
+  fake.queues.runAll();
   EXPECT_THAT(fake.shell.commands, SizeIs(4));
 }
 

@@ -36,11 +36,16 @@ class AutomationTest : public ::testing::Test {
     }
     return texts;
   }
+  /// Once the queue has carried them out.
+  const std::vector<std::string>& commands() {
+    fake.queues.runAll();
+    return fake.shell.commands;
+  }
   /// What the last command was given behind "-h".
   [[nodiscard]] std::string commandFor(const std::string& target) {
     fake.shell.commands.clear();
     startMessaging({{"target", target}});
-    return fake.shell.commands.empty() ? "(none)" : fake.shell.commands.front();
+    return commands().empty() ? "(none)" : commands().front();
   }
   static std::string commandWith(const std::string& word) {
     return "/usr/bin/nohup /usr/local/bin/zaltool -w automation-test -s Quillet -h " + word +
@@ -56,9 +61,8 @@ TEST_F(AutomationTest, VideoCallsStartInTheBackgroundAndWriteIntoTheReportRoot) 
   fake.configuration.roots.DiagnosticReportRoot = "/nowhere/mobile/Reports";
   automation.startVideoCalls("caller", server);
   EXPECT_THAT(fake.agentLog.lines, ElementsAre("log:Automation: Starting automation on behalf of: caller"));
-  EXPECT_THAT(fake.shell.commands,
-              ElementsAre("/usr/bin/nohup /usr/local/etc/runnelUI/general/callstress.js >> "
-                          "/nowhere/mobile/Reports/CallRunLog.txt &"));
+  EXPECT_THAT(commands(), ElementsAre("/usr/bin/nohup /usr/local/etc/runnelUI/general/callstress.js >> "
+                                      "/nowhere/mobile/Reports/CallRunLog.txt &"));
   EXPECT_THAT(server.calls, ElementsAre("automation runs"));
   EXPECT_THAT(alertTexts(), ElementsAre("Vistel Automation: Started Vistel automation"));
 }
@@ -67,15 +71,22 @@ TEST_F(AutomationTest, AReportRootInTheHomeIsWrittenOutAndAnOddOneQuoted) {
   fake.configuration.roots.DiagnosticReportRoot = "~/Logs of $(me)";
   automation.startVideoCalls("caller", server);
   const std::string home = std::filesystem::canonical(fake.home.path()).string();
-  EXPECT_THAT(fake.shell.commands,
-              ElementsAre("/usr/bin/nohup /usr/local/etc/runnelUI/general/callstress.js >> '" + home +
-                          "/Logs of $(me)/CallRunLog.txt' &"));
+  EXPECT_THAT(commands(), ElementsAre("/usr/bin/nohup /usr/local/etc/runnelUI/general/callstress.js >> '" +
+                                      home + "/Logs of $(me)/CallRunLog.txt' &"));
+}
+
+TEST_F(AutomationTest, NobodyWaitsForACommandAndTheyKeepTheirOrder) {
+  automation.startVideoCalls("caller", server);
+  automation.stopVideoCalls("caller", server);
+  EXPECT_THAT(fake.shell.commands, IsEmpty());
+  EXPECT_THAT(server.calls, ElementsAre("automation runs", "automation stopped"));
+  EXPECT_THAT(commands(), ElementsAre(::testing::HasSubstr("callstress.js"), "/usr/bin/killall -9 runnel"));
 }
 
 TEST_F(AutomationTest, VideoCallsStop) {
   automation.stopVideoCalls("caller", server);
   EXPECT_THAT(fake.agentLog.lines, ElementsAre("log:Automation: Stopping automation on behalf of: caller"));
-  EXPECT_THAT(fake.shell.commands, ElementsAre("/usr/bin/killall -9 runnel"));
+  EXPECT_THAT(commands(), ElementsAre("/usr/bin/killall -9 runnel"));
   EXPECT_THAT(server.calls, ElementsAre("automation stopped"));
   EXPECT_THAT(alertTexts(), ElementsAre("Vistel Automation: Stopped Vistel automation"));
 }
@@ -89,7 +100,7 @@ TEST_F(AutomationTest, MessagingStartsWithTheTarget) {
   EXPECT_THAT(fake.agentLog.lines,
               ElementsAre("log:Automation: Starting Quillet automation on behalf of: caller",
                           "log:Automation: Starting zaltool automation: " + command));
-  EXPECT_THAT(fake.shell.commands, ElementsAre(command));
+  EXPECT_THAT(commands(), ElementsAre(command));
   EXPECT_THAT(server.calls, ElementsAre("automation runs"));
   EXPECT_THAT(alertTexts(),
               ElementsAre("Quillet Automation: Starting Quillet automation with: kim@example.com"));
@@ -99,7 +110,7 @@ TEST_F(AutomationTest, Repetitions3AndInterval1RunTheToolWith10And5) {
   startMessaging({{"target", "kim"}, {"repetitions", std::int64_t{3}}, {"interval", std::int64_t{1}}});
   startMessaging({{"target", "kim"}});
   startMessaging({{"target", "kim"}, {"repetitions", std::int64_t{-20}}, {"interval", std::int64_t{-20}}});
-  EXPECT_THAT(fake.shell.commands, ElementsAre(commandWith("kim"), commandWith("kim"), commandWith("kim")));
+  EXPECT_THAT(commands(), ElementsAre(commandWith("kim"), commandWith("kim"), commandWith("kim")));
 }
 
 TEST_F(AutomationTest, MessagingDoesNotStartWithoutATarget) {
@@ -111,7 +122,7 @@ TEST_F(AutomationTest, MessagingDoesNotStartWithoutATarget) {
   EXPECT_THAT(alertTexts(), ElementsAre(refusal, refusal, refusal, refusal));
   const std::string line = "log:Automation: Starting Quillet automation on behalf of: caller";
   EXPECT_THAT(fake.agentLog.lines, ElementsAre(line, line, line, line));
-  EXPECT_THAT(fake.shell.commands, IsEmpty());
+  EXPECT_THAT(commands(), IsEmpty());
   EXPECT_THAT(server.calls, IsEmpty());
 }
 
@@ -120,7 +131,7 @@ TEST_F(AutomationTest, MessagingStartsOnInternalInstallsOnly) {
   startMessaging({{"target", "kim"}});
   EXPECT_THAT(fake.agentLog.lines, IsEmpty());
   EXPECT_THAT(alertTexts(), IsEmpty());
-  EXPECT_THAT(fake.shell.commands, IsEmpty());
+  EXPECT_THAT(commands(), IsEmpty());
   EXPECT_THAT(server.calls, IsEmpty());
 }
 
@@ -129,7 +140,7 @@ TEST_F(AutomationTest, MessagingStopsOnAnyInstall) {
   automation.stopMessaging("caller", server);
   EXPECT_THAT(fake.agentLog.lines,
               ElementsAre("log:Automation: Stopping Quillet automation on behalf of: caller"));
-  EXPECT_THAT(fake.shell.commands, ElementsAre("/usr/bin/killall -9 zaltool"));
+  EXPECT_THAT(commands(), ElementsAre("/usr/bin/killall -9 zaltool"));
   EXPECT_THAT(server.calls, ElementsAre("automation stopped"));
   EXPECT_THAT(alertTexts(), ElementsAre("Quillet Automation: Stopped Quillet automation"));
 }
@@ -137,7 +148,7 @@ TEST_F(AutomationTest, MessagingStopsOnAnyInstall) {
 TEST_F(AutomationTest, AStartWhileOneRunsStartsASecond) {
   automation.startVideoCalls("caller", server);
   automation.startVideoCalls("caller", server);
-  EXPECT_EQ(fake.shell.commands.size(), 2U);
+  EXPECT_EQ(commands().size(), 2U);
 }
 
 TEST_F(AutomationTest, ASenderWithoutANameIsCalledSo) {

@@ -2,6 +2,8 @@
 
 #include <sys/stat.h>
 
+#include <stdexcept>
+
 #include "dump/disk_budget_keeper.h"
 #include "dump/planned_steps.h"
 #include "tests/dump/collection_fixture.h"
@@ -399,6 +401,73 @@ TEST_F(ServiceCollectionTest, WithoutRoomOnTheDiskTheBigStepsAreSkippedAndTheMan
   const std::string manifest = host.fileCopier.endings.at(0);
   EXPECT_NE(manifest.find(R"("Location", "state": "skipped", "why": ["over budget"])"), std::string::npos)
       << manifest;
+}
+
+TEST_F(ServiceCollectionTest, WithQueuesWhatMayTakeLongLeavesTheCallingThreadAndKeepsItsOrder) {
+  put("Location/fix.log");
+  int waitsForWifi = 0;
+  ServiceCollection queued{{.platform = host.platform,
+                            .collectors = collectors,
+                            .closing = closing,
+                            .wait =
+                                [&](std::binary_semaphore& signal, std::chrono::seconds) {
+                                  ++waitsForWifi;
+                                  EXPECT_EQ(host.dumpProgress.lines.back(), "STEP 2 Wi-Fi diagnostics");
+                                  return signal.try_acquire();
+                                },
+                            .usesQueues = true}};
+  const CollectionRequest wanted = request("Vistel", kEveryStep);
+  queued.CollectServiceLogs(wanted, [this] { ++completions; });
+  EXPECT_EQ(tree(), "");
+  EXPECT_TRUE(exists("dump"));
+  EXPECT_EQ(waitsForWifi, 0);
+  ASSERT_TRUE(host.queues.runNext("global.default"));
+  EXPECT_TRUE(exists("dump/TCPDump"));
+  EXPECT_FALSE(exists("dump/Location"));
+  EXPECT_EQ(waitsForWifi, 0);
+  host.host.drain();
+  EXPECT_EQ(waitsForWifi, 1);
+  host.queues.runAll();
+  advance(8s);
+  finishArchives();
+  EXPECT_EQ(completions, 1);
+  Lines expected;
+  std::size_t number = 0;
+  for (const std::string& name : wantedNames(ServiceCollection::plan(wanted))) {
+    expected.push_back("STEP " + std::to_string(++number) + " " + name);
+  }
+  Lines steps;
+  for (const std::string& line : host.dumpProgress.lines) {
+    if (line.starts_with("STEP")) steps.push_back(line);
+  }
+  EXPECT_EQ(steps, expected);
+}
+
+TEST_F(ServiceCollectionTest, TheLastCollectionLeavesNothingToTheQueues) {
+  put("Logs/Reports/Vistel-1.crash");
+  ServiceCollection queued{
+      {.platform = host.platform, .collectors = collectors, .closing = closing, .usesQueues = true}};
+  CollectionRequest last = request("Quillet", kCollectLocation);
+  last.isLast = true;
+  queued.CollectServiceLogs(last, {});
+  EXPECT_TRUE(exists("dump/Location"));
+  EXPECT_TRUE(exists("dump/System Logs/Vistel-1.crash"));
+  EXPECT_EQ(host.queues.readyJobs("global.default"), 0U);
+}
+
+TEST_F(ServiceCollectionTest, AStepThatIsGivenUpHasFailedAndTheOthersGoOn) {
+  duringTheWait = [] { throw std::runtime_error("no memory"); };
+  put("Logs/Reports/Vistel-1.crash");
+  collect("Quillet", kCollectMedia | kCollectLocation);
+  EXPECT_EQ(linesWith("given up"),
+            Lines{"warning: The step \"Wi-Fi diagnostics\" of a collection was given up: no memory"});
+  EXPECT_TRUE(exists("dump/Location"));
+  advance(8s);
+  const std::string manifest = host.fileCopier.endings.at(0);
+  EXPECT_NE(manifest.find(R"("Wi-Fi diagnostics", "state": "failed")"), std::string::npos) << manifest;
+  EXPECT_NE(manifest.find(R"("why": ["no memory"])"), std::string::npos) << manifest;
+  finishArchives();
+  EXPECT_EQ(completions, 1);
 }
 
 TEST_F(ServiceCollectionTest, TheBudgetIsLookedAtWhenTheArchiveIsMade) {

@@ -318,7 +318,7 @@ TEST_F(SessionLogFilesTest, HandsOverNoReasonWithoutAFailure) {
   noteCheckpoints(2);
   session->endSessionWithSender("ENDALL");
   EXPECT_EQ(collections,
-            (std::vector<CollectionRequest>{{"Vistel", receiverDirectory, std::nullopt, false, 0}}));
+            (std::vector<CollectionRequest>{{"Vistel", receiverDirectory, std::nullopt, false, 0, true}}));
 }
 
 TEST_F(SessionLogFilesTest, TheFilesAreThereWhenTheCollectionStarts) {
