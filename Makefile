@@ -89,7 +89,7 @@ run-thread:
 fuzz-short:
 	scripts/fuzz $(BUILD)/address $(TEST_FUZZ_SECONDS)
 
-## make fuzz     the fuzzers, FUZZ_SECONDS each (120)
+## make fuzz     the fuzzers, FUZZ_SECONDS each (120), FUZZ_JOBS at a time (one a processor)
 fuzz: dependencies-build dependencies-test build-address
 	scripts/fuzz $(BUILD)/address $(FUZZ_SECONDS)
 

@@ -102,5 +102,17 @@ TEST_F(WholeSessionE2eTest, ACallReportedThroughTheLibraryBecomesThreeLogFiles) 
   EXPECT_EQ(testing::readFile(sandbox.sessionDirectory("Vistel") + "/Traces/trace.txt"), "a trace");
 }
 
+TEST_F(WholeSessionE2eTest, ABarrierAfterARequestThatEndsASessionAtOnceFindsItsFiles) {
+  start();
+  lirra::Client client({.socketPath = sandbox.socketPath(), .sender = "callservice"});
+  for (const char* round : {"first", "second"}) {
+    client.beginSession("Vistel");
+    client.checkpoint("Vistel", round, 1714651381.5);
+    client.describe("Vistel", round, "", 1714651382.5);
+  }
+  ASSERT_EQ(client.flush(60'000), LIRRA_OK);
+  EXPECT_THAT(sandbox.sessionFile("Vistel", "Verbose Log"), ::testing::HasSubstr("] End Session"));
+}
+
 }  // namespace
 }  // namespace zal

@@ -13,6 +13,7 @@
 #include "platform/linux/disk/archive_parts.h"
 #include "platform/linux/disk/open_elsewhere.h"
 #include "platform/linux/disk/report_walk.h"
+#include "platform/linux/disk/unnamed_files.h"
 #include "platform/linux/files/changed_at.h"
 #include "platform/linux/files/directory_tree.h"
 #include "platform/linux/files/system_error.h"
@@ -25,6 +26,7 @@ namespace {
 
 /// One that is longer is no small thing to keep for a year.
 constexpr std::uint64_t kLongestStub = 1U << 20U;
+constexpr std::uint64_t kBytesOfBlock = 512;  // as POSIX counts st_blocks here
 constexpr std::size_t kLogStart = 256U << 10U;
 constexpr std::string_view kRecord = ".session";
 constexpr std::string_view kDamagedRecord = ".session.damaged";
@@ -111,6 +113,7 @@ std::vector<KeptItem> FileKeptStore::items() {
     _addTemporary(reports.get(), items);
   }
   _addRecords(items);
+  _addSpilledLines(items);
   return items;
 }
 
@@ -132,6 +135,21 @@ void FileKeptStore::_addRecords(std::vector<KeptItem>& items) const {
     item.changed = changedAt(status);
     item.isElsewhere = !isKnown || status.st_dev != reports.st_dev;
     if (!name.ends_with(kDamagedRecord)) item.inUse = "a session goes on or is to be recovered";
+    items.push_back(std::move(item));
+  }
+}
+
+void FileKeptStore::_addSpilledLines(std::vector<KeptItem>& items) const {
+  struct stat reports {};
+  const bool isKnown = ::stat(_places.reports.c_str(), &reports) == 0;
+  for (UnnamedFile& file : unnamedFilesIn(_places.blackBox)) {
+    KeptItem item;
+    item.kind = KeptKind::temporary;
+    item.path = std::move(file.path);
+    item.bytes = static_cast<std::uint64_t>(file.status.st_blocks) * kBytesOfBlock;
+    item.changed = changedAt(file.status);
+    item.isElsewhere = !isKnown || file.status.st_dev != reports.st_dev;
+    item.inUse = "lines of a session that goes on";
     items.push_back(std::move(item));
   }
 }

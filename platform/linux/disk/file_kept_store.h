@@ -18,7 +18,7 @@ class FileKeptStore final : public KeptStore {
   struct Places {
     std::string reports;        ///< sessions and dumps lie below
     std::string userLogs;       ///< TYPE/Latest-TYPE in it lead to archives that stay
-    std::string blackBox;       ///< records
+    std::string blackBox;       ///< records, and lines of long sessions in files without a name
     std::string progress;       ///< of collections
     std::string temporaryArea;  ///< the base, in the reports' directory
   };
@@ -32,6 +32,7 @@ class FileKeptStore final : public KeptStore {
 
  private:
   void _addRecords(std::vector<KeptItem>& items) const;
+  void _addSpilledLines(std::vector<KeptItem>& items) const;
   void _addTemporary(int reports, std::vector<KeptItem>& items) const;
   [[nodiscard]] bool _leaveStub(int directory, const std::string& archive, std::string_view manifest);
 

@@ -4,6 +4,7 @@
 
 #include <cerrno>
 #include <chrono>
+#include <exception>
 #include <utility>
 
 #include <asio/post.hpp>
@@ -190,7 +191,15 @@ std::shared_ptr<void> UnixPeerConnection::holdBarriers() {
   _context->mainThread.check("UnixPeerConnection");
   if (auto hold = _barrierHold.lock()) return hold;
   const auto letGo = [peer = weak_from_this()](void*) {
-    if (const auto self = peer.lock()) self->_answerHeldBarriers();
+    const auto self = peer.lock();
+    if (!self) return;
+    try {
+      self->_answerHeldBarriers();
+    } catch (const std::exception& exception) {
+      // Nothing may pass whoever lets go. The end of the connection says that there is no answer.
+      self->_context->log.warning(self->_name() + " is disconnected: " + exception.what());
+      self->_close();
+    }
   };
   std::shared_ptr<void> hold(this, letGo);  // nobody looks at what it points to
   _barrierHold = hold;

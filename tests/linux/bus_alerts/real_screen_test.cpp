@@ -82,7 +82,9 @@ class RealScreenTest : public BusFixture {
   std::optional<VirtualDisplay> display;
   std::optional<ChildProgram> dunst;
   BusConnection connection{host, host.sessionBus, "session bus"};
-  NotificationScreen notifications{host, connection};
+  // Its place would be taken by a dialog where the host is slow, as it is to be for people.
+  NotificationScreen notifications{
+      host, connection, {.call = std::chrono::minutes(1), .patience = std::chrono::minutes(1)}};
   DialogScreen dialogs{loop.context(), log, {.hasDisplay = true}};
   AlertScreens screens{{&notifications, &dialogs}};
   RuntimeAlertStore store{loop.context(), loop, clock, log, alerts};

@@ -20,9 +20,10 @@ std::string VirtualDisplay::obstacle() {
 
 VirtualDisplay::VirtualDisplay() {
   const std::string number = _directory / "number";
+  // Without repeated keys: on a slow host one that is pressed for long would become several letters.
   _server = std::make_unique<ChildProgram>(
       ChildProgram::Options{.command = {"/usr/bin/Xvfb", "-displayfd", "1", "-screen", "0", "480x800x24",
-                                        "-nolisten", "tcp", "-noreset"},
+                                        "-nolisten", "tcp", "-noreset", "-r"},
                             .output = number});
   if (!eventually([&] { return readFile(number).ends_with('\n'); })) {
     throw std::runtime_error("the virtual display does not come up");

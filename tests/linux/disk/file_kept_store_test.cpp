@@ -11,6 +11,7 @@
 #include <filesystem>
 
 #include "platform/linux/archive/zip_archive.h"
+#include "platform/linux/blackbox/unnamed_spill_files.h"
 #include "platform/linux/files/descriptor.h"
 #include "platform/linux/files/posix_file_placement.h"
 #include "platform/linux/progress/progress_record.h"
@@ -257,6 +258,32 @@ TEST_F(FileKeptStoreTest, OfTheRecordsOnlyThoseThatWereSetAsideMayGo) {
     EXPECT_FALSE(store.remove(item));
   }
   EXPECT_THAT(found(), ElementsAre(record + ".tried" + goesOn, record + goesOn));
+}
+
+TEST_F(FileKeptStoreTest, LinesOfALongSessionThatHaveNoNameCountAsLongAsTheyAreThere) {
+  std::filesystem::create_directories(directory / "real");
+  std::filesystem::create_directory_symlink(directory / "real", directory / "BlackBox");
+  std::filesystem::permissions(directory / "real", std::filesystem::perms::owner_all);
+  UnnamedSpillFiles spillFiles(directory / "real");
+  const auto lines = spillFiles.make(), none = spillFiles.make();
+  ASSERT_TRUE(lines->append(std::string(1U << 20U, 'x'))) << lines->trouble();
+  put("BlackBox/named");
+  const KeptItem item = only();
+  EXPECT_EQ(item.kind, KeptKind::temporary);
+  EXPECT_GE(item.bytes, 1U << 20U);
+  EXPECT_EQ(item.inUse, "lines of a session that goes on");
+  EXPECT_EQ(item.path.find("deleted"), std::string::npos) << item.path;
+}
+
+TEST_F(FileKeptStoreTest, LinesThatAreGoneCountNoLonger) {
+  std::filesystem::create_directories(directory / "BlackBox");
+  std::filesystem::permissions(directory / "BlackBox", std::filesystem::perms::owner_all);
+  UnnamedSpillFiles spillFiles(directory / "BlackBox");
+  auto lines = spillFiles.make();
+  ASSERT_TRUE(lines->append("a line")) << lines->trouble();
+  EXPECT_EQ(store.items().size(), 1U);
+  lines.reset();
+  EXPECT_EQ(store.items().size(), 0U);
 }
 
 TEST_F(FileKeptStoreTest, HalfMadeArchivesStayAsLongAsTheirAgentLivesAndAreLeftoversThen) {
