@@ -7,8 +7,8 @@
 #include <array>
 #include <cerrno>
 #include <system_error>
+#include <utility>
 
-#include "platform/linux/files/descriptor.h"
 #include "platform/linux/files/escaped_text.h"
 #include "platform/linux/files/system_error.h"
 #include "platform/linux/files/whole_file.h"
@@ -68,13 +68,25 @@ std::string firstLine(const std::string& text) { return text.substr(0, text.find
 
 }  // namespace
 
+DumpFiles::DumpFiles(std::string directory, std::string prefix)
+    : _directory(std::move(directory)),
+      _prefix(std::move(prefix)),
+      _opened(::open(_directory.c_str(), O_PATH | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC)),
+      _trouble(_opened.isOpen() ? std::error_code() : lastSystemError()) {}
+
+/// By the handle, in the words of a path.
+std::string DumpFiles::_at(const std::string& fileName) const {
+  return "/proc/self/fd/" + std::to_string(_opened.get()) + "/" + fileName;
+}
+
 void DumpFiles::_fail(const std::string& name, const std::string& reason) {
   _hasFailed = true;
   _lines.push_back(name + ": cannot be written: " + escapedLine(reason));
 }
 
 bool DumpFiles::_place(const std::string& name, std::string_view content) {
-  const auto error = placeWholeFile(pathOf(name), content, ExistingFile::isReplaced);
+  const auto error =
+      _trouble ? _trouble : placeWholeFile(_at(_prefix + name), content, ExistingFile::isReplaced);
   if (error) _fail(name, error.message());
   return !error;
 }
@@ -110,7 +122,11 @@ bool DumpFiles::copy(const std::string& name, const std::string& source, std::ui
     missing(source, lastSystemError().message());
     return false;
   }
-  const std::string temporary = _directory + "/.new-" + std::to_string(::getpid()) + "-copy";
+  if (_trouble) {
+    _fail(name, _trouble.message());
+    return false;
+  }
+  const std::string temporary = _at(".new-" + std::to_string(::getpid()) + "-copy");
   const Descriptor to(::open(temporary.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_NOFOLLOW | O_CLOEXEC, 0600));
   if (!to.isOpen()) {
     _fail(name, lastSystemError().message());
@@ -122,7 +138,7 @@ bool DumpFiles::copy(const std::string& name, const std::string& source, std::ui
     missing(source, copied.trouble.empty() ? "is empty" : copied.trouble);
     return false;
   }
-  if (::rename(temporary.c_str(), pathOf(name).c_str()) != 0) {
+  if (::rename(temporary.c_str(), _at(_prefix + name).c_str()) != 0) {
     _fail(name, lastSystemError().message());
     return false;
   }

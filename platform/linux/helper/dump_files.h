@@ -3,8 +3,10 @@
 #include <cstdint>
 #include <string>
 #include <string_view>
+#include <system_error>
 #include <vector>
 
+#include "platform/linux/files/descriptor.h"
 #include "platform/linux/helper/bounded_program.h"
 #include "platform/linux/helper/patience.h"
 
@@ -15,9 +17,8 @@ namespace zal::helper {
 /// the rest of the dump. It keeps a line about every source, for the note that goes with the files.
 class DumpFiles {
  public:
-  /// The directory exists.
-  DumpFiles(std::string directory, std::string prefix)
-      : _directory(std::move(directory)), _prefix(std::move(prefix)) {}
+  /// The directory exists and is no link. It is looked for once: what takes its name later gets nothing.
+  DumpFiles(std::string directory, std::string prefix);
 
   /// A source's text under that name (behind the prefix). A note about it is optional.
   void write(const std::string& name, std::string_view content, const std::string& remark = {});
@@ -45,11 +46,14 @@ class DumpFiles {
   void writeNote(const std::string& name, const std::string& reason, const Patience& patience);
 
  private:
+  [[nodiscard]] std::string _at(const std::string& fileName) const;
   bool _place(const std::string& name, std::string_view content);
   void _fail(const std::string& name, const std::string& reason);
 
   const std::string _directory;
   const std::string _prefix;
+  const Descriptor _opened;        // the directory
+  const std::error_code _trouble;  // why it is not
   std::vector<std::string> _lines;
   bool _gaveSomething = false;
   bool _hasFailed = false;

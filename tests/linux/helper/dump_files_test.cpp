@@ -91,5 +91,32 @@ TEST_F(DumpFilesTest, FileThatCannotBeWrittenIsToldAndRemembered) {
   EXPECT_EQ(listing(), "p-a.txt/\np-a.txt/in the way/\n");
 }
 
+TEST_F(DumpFilesTest, ADirectoryThatIsALinkGetsNothingAndTheLinesSaySo) {
+  const std::string link = directory / "link";
+  std::filesystem::create_directory_symlink(elsewhere.path(), link);
+  testing::writeFile(elsewhere / "source", "text");
+  DumpFiles through(link, "p-");
+  through.write("a.txt", "four");
+  EXPECT_FALSE(through.copy("b.txt", elsewhere / "source", 100, patience));
+  EXPECT_TRUE(through.hasFailed());
+  EXPECT_EQ(through.lines(), (Lines{"a.txt: cannot be written: Not a directory",
+                                    "b.txt: cannot be written: Not a directory"}));
+  EXPECT_EQ(testing::listTree(elsewhere.path()), "source\n");
+}
+
+TEST_F(DumpFilesTest, ALinkThatTakesTheDirectorysNameMeanwhileIsNotFollowed) {
+  const std::string place = directory / "reports", moved = directory / "moved";
+  std::filesystem::create_directory(place);
+  testing::writeFile(directory / "source", "text");
+  DumpFiles reports(place, "p-");
+  std::filesystem::rename(place, moved);
+  std::filesystem::create_directory_symlink(elsewhere.path(), place);
+  reports.write("a.txt", "four");
+  EXPECT_TRUE(reports.copy("b.txt", directory / "source", 100, patience));
+  EXPECT_EQ(testing::listTree(elsewhere.path()), "");
+  EXPECT_EQ(testing::readFile(moved + "/p-a.txt"), "four");
+  EXPECT_EQ(testing::readFile(moved + "/p-b.txt"), "text");
+}
+
 }  // namespace
 }  // namespace zal::helper
