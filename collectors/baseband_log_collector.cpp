@@ -33,7 +33,7 @@ void LogCollectors::CollectBasebandLogs(const std::string& dumpDirectory, WallTi
   const std::string destination = dumpDirectory + "/Baseband";
   walkLogs(_services.log, "baseband logs", [&] {
     const auto names = sortedNames(source, _services.placement);
-    _services.files.MakeDirectory(destination);
+    _services.files.makeDirectory(destination);
     _services.log.notice("Processing baseband logs");
     const auto chosen = chosenSet(names, dumpLimit(startTime), _services.clock);
     if (!chosen) return;

@@ -44,7 +44,7 @@ void CommandRunner::RunCommandInBackground(std::string_view commandLine, std::st
                                            std::string_view fileName) {
   if (!_isOursToWrite(directory, fileName)) return;
   if (_witnesses != nullptr) _witnesses->command(commandLine, directory, fileName, std::nullopt);
-  _shell.PerformSystemInBackground(redirected(commandLine, directory, fileName) + " &");
+  _shell.performSystemInBackground(redirected(commandLine, directory, fileName) + " &");
 }
 
 bool CommandRunner::RunCommandAndWait(std::string_view commandLine, std::string_view directory,

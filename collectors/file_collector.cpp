@@ -47,12 +47,12 @@ void FileCollector::_tell(const std::string& source, const std::string& director
                      isThere ? "" : error.message());
 }
 
-std::error_code FileCollector::MakeDirectory(const std::string& directory) {
+std::error_code FileCollector::makeDirectory(const std::string& directory) {
   return _files.makeDirectories(directory);
 }
 
 void FileCollector::_makeParent(const std::string& target) {
-  MakeDirectory(std::filesystem::path(target).parent_path().string());
+  makeDirectory(std::filesystem::path(target).parent_path().string());
 }
 
 std::string FileCollector::_source(const std::string& path, const std::string& directory) const {

@@ -49,7 +49,7 @@ class FileCollector {
                                                const std::string& suffix);
 
   /// Makes the directory with all missing parents, with mode 0777. Returned: why it is not there.
-  std::error_code MakeDirectory(const std::string& directory);
+  std::error_code makeDirectory(const std::string& directory);
 
   /// Copies files and directories of a directory into another, which must exist; hidden ones and
   /// compressed older logs stay out, those of "beacond" excepted. Failures are logged; after the

@@ -45,7 +45,7 @@ struct DumpDirectories {
 void makeDirectories(const DumpDirectories& paths, FileCollector& files, AgentLog& log) {
   for (const std::string& path :
        {paths.top, paths.other, paths.cellular, paths.wifi, paths.statistics, paths.console}) {
-    if (const std::error_code error = files.MakeDirectory(path)) {
+    if (const std::error_code error = files.makeDirectory(path)) {
       log.warning("Failed to make the directory " + path + ": " + error.message());
     }
   }
@@ -71,7 +71,7 @@ void NetworkDiagnostics::StopCaptures() {
   _services.shell.PerformSystem(_services.table.stopReadersCommand());
 }
 
-void NetworkDiagnostics::StopCapturesThen(std::function<void()> then) {
+void NetworkDiagnostics::stopCapturesThen(std::function<void()> then) {
   _captures->async([this, then = std::move(then)] {
     StopCaptures();
     then();
@@ -80,7 +80,7 @@ void NetworkDiagnostics::StopCapturesThen(std::function<void()> then) {
 
 void NetworkDiagnostics::StartSessionCaptures(std::uint64_t flags) {
   const bool withPings = _isPingTestPreferred() || (flags & kBeginFlagPingCaptures) != 0;
-  StopCapturesThen([this, flags, withPings] {
+  stopCapturesThen([this, flags, withPings] {
     const std::string& directory = _services.configuration.roots.TemporaryRoot;
     if (withPings) {
       if (VideoCallsOverCellularAvailable()) {
@@ -97,7 +97,7 @@ void NetworkDiagnostics::StartSessionCaptures(std::uint64_t flags) {
 
 void NetworkDiagnostics::StartServerPings(const std::string& wifiOutputPath,
                                           const std::string& cellularOutputPath) {
-  StopCapturesThen([this, wifiOutputPath, cellularOutputPath] {
+  stopCapturesThen([this, wifiOutputPath, cellularOutputPath] {
     const Endpoints& endpoints = _services.configuration.endpoints;
     if (VideoCallsOverCellularAvailable()) {
       _services.pings.addPingTest(endpoints.cellPingServer, kUntilStopped, false, cellularOutputPath);
@@ -107,11 +107,11 @@ void NetworkDiagnostics::StartServerPings(const std::string& wifiOutputPath,
 }
 
 void NetworkDiagnostics::ForceNetworkDump(const std::string& directory, bool includePing) {
-  StopCapturesThen(
-      [this, directory, withPings = WantsPings(includePing)] { QueueNetworkDump(directory, withPings); });
+  stopCapturesThen(
+      [this, directory, withPings = wantsPings(includePing)] { queueNetworkDump(directory, withPings); });
 }
 
-void NetworkDiagnostics::QueueNetworkDump(const std::string& directory, bool withPings) {
+void NetworkDiagnostics::queueNetworkDump(const std::string& directory, bool withPings) {
   _services.queues.global(QueuePriority::background).async([this, directory, withPings] {
     CollectNetworkLogs(directory, withPings);
   });

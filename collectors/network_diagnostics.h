@@ -55,16 +55,16 @@ class NetworkDiagnostics {
   /// Stops long ping tests and kills every live log reader; waits for the latter. Any thread.
   void StopCaptures();
   /// The same without waiting; `then` is called once they are gone, on any thread.
-  void StopCapturesThen(std::function<void()> then);
+  void stopCapturesThen(std::function<void()> then);
   /// Continuous pings of the two servers into these files. Main thread only.
   void StartServerPings(const std::string& wifiOutputPath, const std::string& cellularOutputPath);
   /// Stops the captures, then queues the collection at background priority. Main thread only;
   /// returns without waiting for the dump.
   void ForceNetworkDump(const std::string& directory, bool includePing);
   /// The same where the captures were stopped; any thread.
-  void QueueNetworkDump(const std::string& directory, bool withPings);
+  void queueNetworkDump(const std::string& directory, bool withPings);
   /// Whether a dump has pings: asked for, or preferred by "pingtest". Main thread only.
-  [[nodiscard]] bool WantsPings(bool includePing) { return includePing || _isPingTestPreferred(); }
+  [[nodiscard]] bool wantsPings(bool includePing) { return includePing || _isPingTestPreferred(); }
   /// The dump itself: fills CT, WiFi, Other, Statistics and Console below the directory, which are
   /// made as needed, and moves the captures there. Any thread, but made for the background queue: it
   /// takes its time. Commands and pings that it starts outlive it.

@@ -33,7 +33,7 @@ void LogCollectors::LinkFullPacketCapture(const std::string& destination) {
 void LogCollectors::DumpPushServiceState(const std::string& destination) {
   const std::string& source = _services.configuration.collection.pushLogDirectory;
   if (destination.empty() || source.empty()) return;
-  _services.files.MakeDirectory(destination);
+  _services.files.makeDirectory(destination);
   _services.files.CopyDirectoryContents(source, destination);
   _services.table.runInBackground(_services.commands, CommandGroup::pushService, destination);
 }

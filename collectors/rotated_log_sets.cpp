@@ -34,7 +34,7 @@ void linkFiles(FileCollector& collector, const DirectoryRoots& roots, const std:
 void LinkRotatedLogSets(FileCollector& collector, const DirectoryRoots& roots, AgentLog& log,
                         const std::vector<std::string>& names, const std::string& destination,
                         bool includeAllGenerations) {
-  collector.MakeDirectory(destination);
+  collector.makeDirectory(destination);
   for (const auto& name : names) {
     if (!isPlainName(name)) {
       log.warning("Refused the log set \"" + name + "\": its name leads out of the log directory");

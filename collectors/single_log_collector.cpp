@@ -13,7 +13,7 @@ void LogCollectors::CopyDiagnosticAndSyncLogs(const std::string& destination) {
   const DirectoryRoots& roots = _services.configuration.roots;
   for (const std::string& source :
        {roots.MobileLogRoot + "/Cirrel", roots.DiagnosticReportRoot + "/DiagnosticLogs"}) {
-    _services.files.MakeDirectory(destination);
+    _services.files.makeDirectory(destination);
     _services.files.CopyDirectoryContents(source, destination);
   }
 }

@@ -94,7 +94,7 @@ void collectPrediction(const CollectionContext& at) {
 void collectNetwork(const CollectionContext& at) {
   const std::string directory = at.make("Network");
   at.record.keepForThisStep(directory);  // it goes on by itself
-  at.collectors.network.QueueNetworkDump(directory, at.withPings);
+  at.collectors.network.queueNetworkDump(directory, at.withPings);
 }
 
 void collectRegistration(const CollectionContext& at) {

@@ -37,7 +37,7 @@ class ServiceCollection::Run : public std::enable_shared_from_this<Run> {
             *_record,
             services.wait,
             std::move(dumpCoexistence),
-            services.collectors.network.WantsPings((_request.flags & kCollectPings) != 0)},
+            services.collectors.network.wantsPings((_request.flags & kCollectPings) != 0)},
         _completion(std::move(completion)) {}
 
   [[nodiscard]] bool savesRoom() const { return _savesRoom; }
@@ -65,7 +65,7 @@ class ServiceCollection::Run : public std::enable_shared_from_this<Run> {
     while (const CollectionStep* const step = _next()) {
       if (_leavesMainThread() && step->isForMain != _isOnMain) return _goOnElsewhere();
       if (step->stopsCaptures && !std::exchange(_areCapturesStopped, true)) {
-        if (_leavesMainThread()) return _network().StopCapturesThen(_onStandardQueue());
+        if (_leavesMainThread()) return _network().stopCapturesThen(_onStandardQueue());
         _network().StopCaptures();
       }
       _take(*step);
@@ -127,7 +127,7 @@ class ServiceCollection::Run : public std::enable_shared_from_this<Run> {
       services.platform.queues.global(QueuePriority::standard)
           .async([&services, work = std::move(work)]() mutable { services.closing.run(std::move(work)); });
     };
-    if (_leavesMainThread()) return _network().StopCapturesThen(std::move(closeElsewhere));
+    if (_leavesMainThread()) return _network().stopCapturesThen(std::move(closeElsewhere));
     _network().StopCaptures();
     closeElsewhere();
   }

@@ -14,7 +14,7 @@ class SystemShell {
   virtual int PerformSystem(const std::string& commandLine) = 0;
   /// The same for a line that ends with "&" and whose outcome nobody looks at. It may start a moment
   /// after the call, but such lines of one thread start in the order given.
-  virtual void PerformSystemInBackground(const std::string& commandLine) { PerformSystem(commandLine); }
+  virtual void performSystemInBackground(const std::string& commandLine) { PerformSystem(commandLine); }
 };
 
 }  // namespace zal

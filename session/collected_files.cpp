@@ -57,7 +57,7 @@ void CollectedFilesMove::_beginCategory() {
   }
   const std::string destination = _directory + "/" + *contained;
   _log.notice("category:" + destination + " files=" + fileSetText(paths));
-  if (const std::error_code error = _collector.MakeDirectory(destination)) {
+  if (const std::error_code error = _collector.makeDirectory(destination)) {
     _log.warning("No files are moved into " + destination + ": " + error.message());
     return;
   }

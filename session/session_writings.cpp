@@ -7,7 +7,7 @@ namespace zal {
 SessionWritings::SessionWritings(RunLoop& loop, WorkQueues& queues)
     : _loop(loop), _queue(queues.makeSerial("session.logs")) {}
 
-void SessionWritings::begin(std::shared_ptr<SessionLogWriting> writing, Finish finish) {
+void SessionWritings::begin(const std::shared_ptr<SessionLogWriting>& writing, Finish finish) {
   ++_begun;
   _pending->push_back({writing, std::move(finish)});
   _queue->async([this, &loop = _loop, writing, alive = std::weak_ptr(_pending)] {

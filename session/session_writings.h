@@ -23,7 +23,7 @@ class SessionWritings {
   SessionWritings& operator=(const SessionWritings&) = delete;
 
   /// `finish` is called once on the main thread, after the files of this one and of all before it.
-  void begin(std::shared_ptr<SessionLogWriting> writing, Finish finish);
+  void begin(const std::shared_ptr<SessionLogWriting>& writing, Finish finish);
   /// How many there were.
   [[nodiscard]] std::size_t begun() const { return _begun; }
   /// Lets go of it once all that were begun are finished, at once when all are.

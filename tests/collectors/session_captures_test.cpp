@@ -21,7 +21,7 @@ TEST_F(SessionCapturesTest, NobodyWaitsForTheReadersAndEachStartStopsWhatWasStar
   network.StartSessionCaptures(2);
   network.StartSessionCaptures(0);
   bool isNext = false;
-  network.StopCapturesThen([&] { isNext = true; });
+  network.stopCapturesThen([&] { isNext = true; });
   EXPECT_EQ(events, std::vector<std::string>{});
   EXPECT_EQ(happened(),
             std::string(kStop) +

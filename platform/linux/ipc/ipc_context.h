@@ -26,13 +26,13 @@ inline constexpr std::size_t kReadBufferSize = 256U << 10U;
 /// borrowed parts. Main thread only.
 struct IpcContext {
   IpcContext(asio::io_context& loop, AgentLog& agentLog, IpcSettings ipcSettings,
-             std::function<void()> flushLogs, std::function<void()> keepWhatCame = {},
+             std::function<void()> flushLogs, const std::function<void()>& keepWhatCame = {},
              MemoryLedger* memoryLedger = nullptr)
       : io(loop),
         log(agentLog),
         settings(std::move(ipcSettings)),
         flush(std::move(flushLogs)),
-        confirm(keepWhatCame ? std::move(keepWhatCame) : flush),
+        confirm(keepWhatCame ? keepWhatCame : flush),
         memory(memoryLedger) {}
 
   asio::io_context& io;

@@ -16,9 +16,9 @@ QueueingShell::~QueueingShell() { startWhatIsQueued(); }
 
 int QueueingShell::PerformSystem(const std::string& commandLine) { return _shell.PerformSystem(commandLine); }
 
-void QueueingShell::PerformSystemInBackground(const std::string& commandLine) {
+void QueueingShell::performSystemInBackground(const std::string& commandLine) {
   if (std::this_thread::get_id() != _spared) {
-    _shell.PerformSystemInBackground(commandLine);
+    _shell.performSystemInBackground(commandLine);
     return;
   }
   if (!_queue) _queue = _queues.makeSerial("com.vendel.lirra.shellqueue");
@@ -27,7 +27,7 @@ void QueueingShell::PerformSystemInBackground(const std::string& commandLine) {
     ++_waiting;
   }
   _queue->async([this, commandLine] {
-    _shell.PerformSystemInBackground(commandLine);
+    _shell.performSystemInBackground(commandLine);
     _started();
   });
 }

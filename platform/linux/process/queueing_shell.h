@@ -24,7 +24,7 @@ class QueueingShell : public SystemShell {
   QueueingShell(const QueueingShell&) = delete;
   QueueingShell& operator=(const QueueingShell&) = delete;
   int PerformSystem(const std::string& commandLine) override;
-  void PerformSystemInBackground(const std::string& commandLine) override;
+  void performSystemInBackground(const std::string& commandLine) override;
   /// Before the process ends: what was accepted is started, if that is possible in a few seconds.
   void startWhatIsQueued();
 

@@ -24,8 +24,8 @@ class QueueingShellTest : public ::testing::Test {
 };
 
 TEST_F(QueueingShellTest, ItsOwnThreadDoesNotWaitForBackgroundLinesAndTheirOrderStays) {
-  queueing.PerformSystemInBackground("one &");
-  queueing.PerformSystemInBackground("two &");
+  queueing.performSystemInBackground("one &");
+  queueing.performSystemInBackground("two &");
   EXPECT_THAT(shell.commands, IsEmpty());
   queues.runAll();
   EXPECT_THAT(shell.commands, ElementsAre("one &", "two &"));
@@ -38,12 +38,12 @@ TEST_F(QueueingShellTest, AForegroundLineIsWaitedFor) {
 }
 
 TEST_F(QueueingShellTest, OtherThreadsRunTheirLinesThemselves) {
-  std::thread([&] { queueing.PerformSystemInBackground("three &"); }).join();
+  std::thread([&] { queueing.performSystemInBackground("three &"); }).join();
   EXPECT_THAT(shell.commands, ElementsAre("three &"));
 }
 
 TEST_F(QueueingShellTest, AtTheEndWhatWasAcceptedIsStarted) {
-  queueing.PerformSystemInBackground("last &");
+  queueing.performSystemInBackground("last &");
   std::thread worker([&] { queues.runAll(); });
   queueing.startWhatIsQueued();
   worker.join();
