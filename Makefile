@@ -31,7 +31,7 @@ build: dependencies-build
 	$(CMAKE) --build $(BUILD) -j $(JOBS)
 
 ## make test     all tests with sanitizers (address and undefined; thread), the finished product from outside, a short fuzz run
-# The next build takes what the tests leave of the processors: they wait more than they compute.
+# The next build takes what the tests leave of the processors.
 test: dependencies-build dependencies-test
 	$(MAKE) --no-print-directory house-check
 	$(MAKE) --no-print-directory build-plain
@@ -106,16 +106,12 @@ soak: dependencies-build dependencies-test build-plain
 	ZAL_SOAK_ROUNDS=$(SOAK_ROUNDS) $(BUILD)/tests/bin/e2e_tests --gtest_filter='SoakE2eTest.*'
 
 ## make bench    the benchmarks against their peers, one table at the end
-bench: dependencies-build dependencies-test dependencies-bench
-	$(call configure,$(BUILD)) -DCMAKE_BUILD_TYPE=Release -DZAL_TESTS=OFF -DZAL_BENCH=ON
-	$(CMAKE) --build $(BUILD) -j $(JOBS)
-	bench/run $(BUILD)/bin
-
 ## make bench-once  whether the benchmarks work, in a minute; their figures say nothing
-bench-once: dependencies-build dependencies-test dependencies-bench
+bench-once: BENCH_OPTIONS := --quick
+bench bench-once: dependencies-build dependencies-test dependencies-bench
 	$(call configure,$(BUILD)) -DCMAKE_BUILD_TYPE=Release -DZAL_TESTS=OFF -DZAL_BENCH=ON
 	$(CMAKE) --build $(BUILD) -j $(JOBS)
-	bench/run $(BUILD)/bin --quick
+	bench/run $(BUILD)/bin $(BENCH_OPTIONS)
 
 ## make lint     each file by itself: does it compile, what does clang-tidy say, how is it laid out
 lint: dependencies-build dependencies-develop

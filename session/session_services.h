@@ -66,7 +66,7 @@ struct SessionServices {
   MemoryLedger* memory = nullptr;
   SpillFiles* spillFiles = nullptr;
   WorkQueues* queues = nullptr;         ///< for the way to the disk
-  SessionWritings* writings = nullptr;  ///< for the end of sessions that takes long
+  SessionWritings* writings = nullptr;  ///< of the files of sessions that have ended
 };
 
 }  // namespace zal

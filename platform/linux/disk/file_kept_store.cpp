@@ -26,7 +26,6 @@ namespace {
 
 /// One that is longer is no small thing to keep for a year.
 constexpr std::uint64_t kLongestStub = 1U << 20U;
-constexpr std::uint64_t kBytesOfBlock = 512;  // as POSIX counts st_blocks here
 constexpr std::size_t kLogStart = 256U << 10U;
 constexpr std::string_view kRecord = ".session";
 constexpr std::string_view kDamagedRecord = ".session.damaged";

@@ -14,7 +14,6 @@ namespace zal {
 namespace {
 
 constexpr int kDeepest = 100;
-constexpr std::uint64_t kBlock = 512;  // of st_blocks, on every file system
 
 struct CloseDirectory {
   void operator()(DIR* directory) const { ::closedir(directory); }
@@ -23,7 +22,7 @@ struct CloseDirectory {
 std::uint64_t bytesAt(int parent, const std::string& name, int levels) {
   struct stat status {};
   if (::fstatat(parent, name.c_str(), &status, AT_SYMLINK_NOFOLLOW) != 0) return 0;
-  std::uint64_t bytes = static_cast<std::uint64_t>(status.st_blocks) * kBlock;
+  std::uint64_t bytes = static_cast<std::uint64_t>(status.st_blocks) * kBytesOfBlock;
   if (!S_ISDIR(status.st_mode)) return bytes / std::max<std::uint64_t>(status.st_nlink, 1);
   if (levels == 0) return bytes;
   const Descriptor directory = openDirectoryAt(parent, name);

@@ -13,6 +13,9 @@ namespace zal {
 // outside is looked at or removed. Links are seen, never followed. Any thread; waits for a disk. Directories
 // are gone into up to a hundred levels deep, each of which takes a descriptor.
 
+/// Of st_blocks, on every file system.
+inline constexpr std::uint64_t kBytesOfBlock = 512;
+
 /// Not open when it is no directory: a link to one is none.
 [[nodiscard]] Descriptor openDirectoryAt(int parent, const std::string& name);
 /// Without "." and "..", in the order of bytes; as far as it could be read.
