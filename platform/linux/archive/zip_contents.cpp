@@ -1,102 +1,59 @@
 #include "platform/linux/archive/zip_contents.h"
 
+#include <fcntl.h>
 #include <sys/stat.h>
-#include <unzip.h>
 
-#include <memory>
+#include "platform/linux/archive/entry_check.h"
+#include "platform/linux/archive/zip_directory.h"
+#include "platform/linux/files/descriptor.h"
 
 namespace zal {
 namespace {
 
 constexpr std::uint64_t kLargestText = 1ULL << 30U;
-constexpr std::size_t kLongestEntryName = 65'535;  // what the container can hold
 
-struct CloseZip {
-  void operator()(void* archive) const { unzClose(archive); }
-};
-using OpenZip = std::unique_ptr<void, CloseZip>;
-
-struct Current {
-  std::string name;
-  unz_file_info64 information{};
-};
-
-std::optional<Current> currentEntry(unzFile archive) {
-  Current entry;
-  if (unzGetCurrentFileInfo64(archive, &entry.information, nullptr, 0, nullptr, 0, nullptr, 0) != UNZ_OK) {
-    return std::nullopt;
-  }
-  if (entry.information.size_filename > kLongestEntryName) return std::nullopt;
-  entry.name.resize(entry.information.size_filename + 1);
-  if (unzGetCurrentFileInfo64(archive, &entry.information, entry.name.data(), entry.name.size(), nullptr, 0,
-                              nullptr, 0) != UNZ_OK) {
-    return std::nullopt;
-  }
-  entry.name.pop_back();
-  return entry;
+Descriptor openArchive(const std::string& path) {
+  return Descriptor(::open(path.c_str(), O_RDONLY | O_NONBLOCK | O_NOCTTY | O_CLOEXEC));
 }
 
-bool isRegular(const Current& entry) {
+bool isRegular(const ZipDirectoryEntry& entry) {
   if (entry.name.ends_with('/')) return false;
-  const auto mode = static_cast<mode_t>(entry.information.external_fa >> 16U);
   // Archives of other makers may know no modes.
-  return (mode & S_IFMT) == 0 || S_ISREG(mode);
+  return (entry.mode & S_IFMT) == 0 || S_ISREG(entry.mode);
 }
 
-/// Calls `visit` for each entry until it says false. Returned: whether the archive could be read.
-template <class Visit>
-bool forEachEntry(unzFile archive, Visit&& visit) {
-  int step = unzGoToFirstFile(archive);
-  // An archive with nothing in it has no first file either.
-  if (step == UNZ_END_OF_LIST_OF_FILE) return true;
-  for (; step == UNZ_OK; step = unzGoToNextFile(archive)) {
-    const auto entry = currentEntry(archive);
-    if (!entry) return false;
-    if (!visit(*entry)) return true;
-  }
-  return step == UNZ_END_OF_LIST_OF_FILE;
-}
-
-std::optional<std::string> readCurrent(unzFile archive, std::uint64_t bytes) {
-  if (bytes > kLargestText || unzOpenCurrentFile(archive) != UNZ_OK) return std::nullopt;
-  std::string text(static_cast<std::size_t>(bytes), '\0');
-  std::size_t filled = 0;
-  while (filled < text.size()) {
-    const int got =
-        unzReadCurrentFile(archive, text.data() + filled, static_cast<unsigned>(text.size() - filled));
-    if (got <= 0) break;
-    filled += static_cast<std::size_t>(got);
-  }
-  const bool whole = filled == text.size();
-  // Closing says whether the checksum was right.
-  if (unzCloseCurrentFile(archive) != UNZ_OK || !whole) return std::nullopt;
+std::optional<std::string> contentOf(int file, const ZipDirectoryEntry& entry) {
+  if (!isRegular(entry) || entry.size > kLargestText) return std::nullopt;
+  std::string text;
+  text.reserve(static_cast<std::size_t>(entry.size));
+  const std::string trouble = EntryCheck(file).troubleOf(
+      entry, [&text](const char* bytes, std::size_t size) { text.append(bytes, size); });
+  if (!trouble.empty()) return std::nullopt;
   return text;
 }
 
 }  // namespace
 
 std::optional<std::vector<ZipEntry>> listZip(const std::string& archive) {
-  const OpenZip file(unzOpen64(archive.c_str()));
-  if (!file) return std::nullopt;
+  const Descriptor file = openArchive(archive);
+  ZipDirectory directory(file.get());
+  if (!directory.isWhole()) return std::nullopt;
   std::vector<ZipEntry> entries;
-  const bool readable = forEachEntry(file.get(), [&](const Current& entry) {
-    if (isRegular(entry)) entries.push_back({entry.name, entry.information.uncompressed_size});
-    return true;
-  });
-  if (!readable) return std::nullopt;
+  while (const auto entry = directory.next()) {
+    if (isRegular(*entry)) entries.push_back({entry->name, entry->size});
+  }
+  if (!directory.isAtEnd()) return std::nullopt;
   return entries;
 }
 
 std::optional<std::string> readZipEntry(const std::string& archive, const std::string& name) {
-  const OpenZip file(unzOpen64(archive.c_str()));
-  if (!file) return std::nullopt;
-  std::optional<std::string> text;
-  forEachEntry(file.get(), [&](const Current& entry) {
-    if (entry.name != name) return true;
-    if (isRegular(entry)) text = readCurrent(file.get(), entry.information.uncompressed_size);
-    return false;
-  });
-  return text;
+  const Descriptor file = openArchive(archive);
+  ZipDirectory directory(file.get());
+  if (!directory.isWhole()) return std::nullopt;
+  while (const auto entry = directory.next()) {
+    if (entry->name == name) return contentOf(file.get(), *entry);
+  }
+  return std::nullopt;
 }
 
 }  // namespace zal

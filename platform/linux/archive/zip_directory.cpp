@@ -117,6 +117,7 @@ std::optional<ZipDirectoryEntry> ZipDirectory::next() {
   entry.packedSize = loadLittle(fixed.data() + 20, 4);
   entry.size = loadLittle(fixed.data() + 24, 4);
   entry.header = loadLittle(fixed.data() + 42, 4);
+  entry.mode = static_cast<unsigned>(loadLittle(fixed.data() + 40, 2));
   entry.name.resize(loadLittle(fixed.data() + 28, 2));
   std::string extra(loadLittle(fixed.data() + 30, 2), '\0');
   const std::size_t comment = loadLittle(fixed.data() + 32, 2);

@@ -16,6 +16,7 @@ struct ZipDirectoryEntry {
   std::uint32_t crc = 0;
   std::uint64_t packedSize = 0, size = 0;
   std::uint64_t header = 0;  ///< where its own header stands
+  unsigned mode = 0;         ///< as stat() has it; 0 where the maker knew none
 };
 
 /// Reads bytes of a file at any place. Returned: whether all of them were there.

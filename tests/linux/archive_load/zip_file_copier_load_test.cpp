@@ -4,6 +4,7 @@
 #include <cerrno>
 #include <cstring>
 
+#include "platform/linux/archive/zip_contents.h"
 #include "platform/linux/loop/linux_run_loop.h"
 #include "platform/linux/loop/linux_work_queues.h"
 #include "tests/linux/archive/archive_fixture.h"
@@ -76,6 +77,12 @@ TEST_P(LargeArchiveTest, AFileLargerThanTheOldFormatCounts) {
                     quoted),
             "[0, 6, 4294971617, 9] b'behind it'\n");
   EXPECT_EQ(printed("unzip -p " + quoted + " Dump/sparse | cmp - '" + input("sparse") + "'"), "");
+  const auto entries = listZip(output());
+  ASSERT_TRUE(entries);
+  ASSERT_EQ(entries->size(), 3U);
+  EXPECT_EQ((*entries)[1].bytes, kSize);
+  EXPECT_EQ(readZipEntry(output(), "Dump/z"), "behind it");
+  EXPECT_EQ(readZipEntry(output(), "Dump/sparse"), std::nullopt);  // more than it reads
 }
 
 /// Real queues, two threads of them at work at once.
