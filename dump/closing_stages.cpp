@@ -11,6 +11,7 @@
 #include "collectors/collectors.h"
 #include "dump/archive_gaps.h"
 #include "dump/disk_budget_keeper.h"
+#include "dump/guarded_step.h"
 #include "dump/latest_link.h"
 #include "dump/log_compressor.h"
 #include "dump/manifest.h"
@@ -167,7 +168,7 @@ class ClosingRun : public std::enable_shared_from_this<ClosingRun> {
     for (const Step& step : steps) {
       if (!step.isWanted(_work.flags, _work.savesRoom)) continue;
       _work.record->step(_nextStep++);
-      step.run(_services, _work);
+      runGuarded(step.name, *_work.record, _services.platform.agentLog, [&] { step.run(_services, _work); });
     }
   }
 
@@ -293,7 +294,8 @@ void ClosingStages::finishCutOff() {
     platform.queues.global(QueuePriority::standard)
         .async([services = _services, work = std::move(work)]() mutable {
           work.record->step(1);
-          tellGaps(services, work);
+          runGuarded(kArchiveStep, *work.record, services.platform.agentLog,
+                     [&] { tellGaps(services, work); });
           archiveAndLink(services, std::move(work));
         });
   }

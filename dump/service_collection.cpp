@@ -1,6 +1,5 @@
 #include "dump/service_collection.h"
 
-#include <exception>
 #include <memory>
 #include <string>
 #include <string_view>
@@ -9,6 +8,7 @@
 #include "collectors/collectors.h"
 #include "dump/collection_steps.h"
 #include "dump/disk_budget_keeper.h"
+#include "dump/guarded_step.h"
 #include "dump/planned_steps.h"
 #include "platform/platform.h"
 #include "session/collected_files.h"
@@ -88,14 +88,7 @@ class ServiceCollection::Run : public std::enable_shared_from_this<Run> {
   void _take(const CollectionStep& step) {
     ++_index;
     _record->step(++_number);
-    try {
-      step.run(_at);
-    } catch (const std::exception& exception) {
-      // What there is goes into the archive all the same, and the client gets its answer.
-      _services.platform.agentLog.warning("The step \"" + std::string(step.name) +
-                                          "\" of a collection was given up: " + exception.what());
-      _record->stepGives(PartState::failed, exception.what());
-    }
+    runGuarded(step.name, *_record, _services.platform.agentLog, [&] { step.run(_at); });
   }
 
   void _close() {

@@ -154,6 +154,19 @@ TEST_F(ClosingStagesTest, CapturesAreStoppedAfterTheCrashLogs) {
   EXPECT_EQ(host.shell.commands.back(), "/usr/bin/killall -9 tessel");
 }
 
+TEST_F(ClosingStagesTest, AStepThatIsGivenUpHasFailedAndTheArchiveIsMadeAllTheSame) {
+  host.shell.respond = [](const std::string&) -> int { throw std::runtime_error("no thread"); };
+  put("Logs/Reports/zalagent-2024-05-02-140307.txt");
+  run(0);
+  EXPECT_EQ(linesWith("given up"),
+            Lines{"warning: The step \"Waiting for slow writers\" of a collection was given up: no thread"});
+  advance(8s);
+  const std::string manifest = host.fileCopier.endings.at(0);
+  EXPECT_NE(manifest.find(R"("Waiting for slow writers", "state": "failed")"), std::string::npos) << manifest;
+  EXPECT_NE(manifest.find(R"("Snapshots", "state": "done")"), std::string::npos) << manifest;
+  EXPECT_EQ(completions, 1);
+}
+
 TEST_F(ClosingStagesTest, BasebandDumpIsLookedAtOnceASecondUntilItIsComplete) {
   testing::writeFile(marker(), "");
   put("Wireless/Logs/Telvane.log");
