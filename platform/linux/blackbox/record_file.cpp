@@ -8,12 +8,12 @@
 #include <charconv>
 #include <filesystem>
 #include <system_error>
-#include <tuple>
 #include <utility>
 
 #include "platform/linux/blackbox/record_frame.h"
 #include "platform/linux/files/file_copy.h"
 #include "platform/linux/files/private_directory.h"
+#include "platform/linux/files/system_error.h"
 
 namespace zal {
 namespace {
@@ -25,14 +25,24 @@ constexpr std::uint64_t kReserve = 512U << 10U;
 /// What waits in memory for a disk that refuses.
 constexpr std::size_t kMostPending = 1U << 20U;
 
-void syncFilesIn(const std::string& directory) {
-  std::error_code error;
+std::error_code syncFile(const Descriptor& file) {
+  while (::fdatasync(file.get()) != 0) {
+    if (errno != EINTR) return lastSystemError();
+  }
+  return {};
+}
+
+/// The first trouble; the others are synced all the same.
+std::error_code syncFilesIn(const std::string& directory) {
+  std::error_code error, trouble;
   for (const auto& entry : std::filesystem::directory_iterator(directory, error)) {
     if (!entry.is_regular_file(error)) continue;
     const Descriptor file(::open(entry.path().c_str(), O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC));
-    if (file.isOpen()) ::fdatasync(file.get());
+    error = file.isOpen() ? syncFile(file) : lastSystemError();
+    if (!trouble) trouble = error;
   }
-  std::ignore = syncDirectory(directory);
+  error = syncDirectory(directory);
+  return trouble ? trouble : error;
 }
 
 }  // namespace
@@ -119,17 +129,27 @@ void RecordFile::_refuse(int error) {
 
 void RecordFile::sync() {
   if (!_syncs || !_file.isOpen() || _written == _synced) return;
-  ::fdatasync(_file.get());
-  // Its name is there from now on as well.
-  if (_synced == 0) std::ignore = syncDirectory(_directory);
+  std::error_code error = syncFile(_file);
+  // Its name is there from then on as well.
+  if (!error && _synced == 0) error = syncDirectory(_directory);
+  if (error) return _tellUnsynced(_path, error);
   _synced = _written;
+  _isUnsyncedTold = false;
+}
+
+void RecordFile::_tellUnsynced(const std::string& path, const std::error_code& error) {
+  if (std::exchange(_isUnsyncedTold, true)) return;
+  _log.warning("What a session accepted may not outlive the end of the power: " + path + ": " +
+               error.message());
 }
 
 void RecordFile::remove(const std::string& writtenInto) {
   if (std::exchange(_removed, true)) return;
   std::string().swap(_pending);
   if (!_file.isOpen()) return;
-  if (_syncs && !writtenInto.empty()) syncFilesIn(writtenInto);
+  if (_syncs && !writtenInto.empty()) {
+    if (const std::error_code error = syncFilesIn(writtenInto)) _tellUnsynced(writtenInto, error);
+  }
   ::unlink(_path.c_str());
   _file = {};
 }

@@ -4,6 +4,7 @@
 #include <cstdint>
 #include <string>
 #include <string_view>
+#include <system_error>
 
 #include "platform/agent_log.h"
 #include "platform/linux/files/descriptor.h"
@@ -32,13 +33,15 @@ class RecordFile final : public SessionRecord {
 
   /// Hands the pieces to the kernel.
   void write();
-  /// Brings what was written on to the medium, when that is wanted.
+  /// Brings what was written on to the medium, when that is wanted. A medium that refuses is told in the
+  /// log, once until it takes it, and tried again by the next call.
   void sync();
 
  private:
   [[nodiscard]] bool _open();
   void _reserve(std::size_t more);
   void _refuse(int error);
+  void _tellUnsynced(const std::string& path, const std::error_code& error);
 
   AgentLog& _log;
   const std::string _directory;
@@ -49,6 +52,7 @@ class RecordFile final : public SessionRecord {
   std::string _pending;
   std::uint64_t _written = 0, _reserved = 0, _synced = 0;
   bool _refused = false;
+  bool _isUnsyncedTold = false;
   bool _removed = false;
 };
 

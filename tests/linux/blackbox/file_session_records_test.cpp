@@ -1,12 +1,15 @@
 #include <fcntl.h>
 #include <gmock/gmock.h>
 #include <sys/stat.h>
+#include <sys/syscall.h>
 #include <unistd.h>
 
+#include <cerrno>
 #include <fstream>
 #include <stdexcept>
 
 #include "platform/linux/blackbox/file_session_records.h"
+#include "tests/support/failing_calls.h"
 #include "tests/support/fake_services.h"
 #include "tests/support/file_size_limit.h"
 #include "tests/support/manual_run_loop.h"
@@ -16,10 +19,12 @@
 namespace zal {
 namespace {
 
+using ::testing::AllOf;
 using ::testing::ElementsAre;
 using ::testing::HasSubstr;
 using ::testing::IsEmpty;
 using ::testing::SizeIs;
+using ::testing::StartsWith;
 using Pieces = std::vector<std::string>;
 
 /// A black box in a directory that does not exist yet. Another object is another process: the lock is on
@@ -280,6 +285,43 @@ TEST_F(FileSessionRecordsTest, SyncingKeepsAndRemovesTheSame) {
   EXPECT_THAT(files(), IsEmpty());
   leave({"three"});
   EXPECT_THAT(recovered(), ElementsAre(Pieces{"three"}));
+}
+
+TEST_F(FileSessionRecordsTest, AMediumThatRefusesIsToldOnceAndTriedAgain) {
+  settings.sync = true;
+  records = makeRecords();
+  auto record = records->begin();
+  std::size_t whileItRefused = 0;
+  const bool canFail = testing::withFailingCalls({{SYS_fdatasync, EINTR, 1}, {SYS_fdatasync, EIO, 2}}, [&] {
+    for (const char* piece : {"one", "two"}) {
+      record->append(piece);
+      records->flush();
+    }
+    whileItRefused = log.lines.size();
+    records->flush();  // nothing new, but what there is has still to go
+  });
+  if (!canFail) GTEST_SKIP() << "the host lets no system call fail";
+  EXPECT_EQ(whileItRefused, 1U);
+  EXPECT_THAT(
+      log.lines,
+      ElementsAre(AllOf(StartsWith("warning: What a session accepted may not outlive the end of the power"),
+                        HasSubstr("Input/output error"))));
+  EXPECT_TRUE(testing::withFailingCalls({{SYS_fdatasync, EIO, 1}}, [&] { records->flush(); }));
+  EXPECT_EQ(log.lines.size(), 1U);  // it went with the third call
+}
+
+TEST_F(FileSessionRecordsTest, LogsThatTheMediumRefusesAreToldAndTheRecordGoes) {
+  settings.sync = true;
+  records = makeRecords();
+  auto record = records->begin();
+  record->append("one");
+  records->flush();
+  testing::writeFile(home / "reports/Log.log", "lines");
+  const bool canFail =
+      testing::withFailingCalls({{SYS_fdatasync, EIO, 1}}, [&] { record->remove(home / "reports"); });
+  if (!canFail) GTEST_SKIP() << "the host lets no system call fail";
+  EXPECT_THAT(log.lines, ElementsAre(HasSubstr(home / "reports: Input/output error")));
+  EXPECT_THAT(files(), IsEmpty());
 }
 
 TEST_F(FileSessionRecordsTest, SwitchedOffItKeepsNothingAndStillFindsWhatWasLeft) {
