@@ -5,6 +5,7 @@
 
 #include "tests/e2e/dump_fixture.h"
 #include "tests/support/process_size.h"
+#include "tests/support/withheld_time.h"
 
 namespace zal {
 namespace {
@@ -13,6 +14,7 @@ using testing::eventually;
 using testing::filesBelow;
 using testing::ProcessSize;
 using testing::soakLength;
+using testing::WithheldTime;
 
 constexpr int kAnswer = 60'000;  ///< milliseconds
 
@@ -54,7 +56,7 @@ class SoakE2eTest : public testing::DumpFixture {
   }
   [[nodiscard]] std::string blackBox() const { return sandbox / "home/kept/BlackBox"; }
   /// How often what held the main thread for more than the watchdog's limit, and for how long at most. Told,
-  /// not judged: a host with other work holds it, too.
+  /// not judged: a host with other work holds it, too, and says how much in all.
   [[nodiscard]] std::string whatHeldTheMainThread() const {
     struct Held {
       int times = 0;
@@ -90,6 +92,7 @@ class SoakE2eTest : public testing::DumpFixture {
 
 TEST_F(SoakE2eTest, ManyCallsFloodsAndDumpsLeaveTheAgentAsLargeAsTheFirstOnes) {
   const int rounds = soakLength("ZAL_SOAK_ROUNDS", 2);
+  const WithheldTime withheld;
   start();
   ProcessSize early;
   for (int round = 0; round < 2 * rounds; ++round) {
@@ -105,7 +108,7 @@ TEST_F(SoakE2eTest, ManyCallsFloodsAndDumpsLeaveTheAgentAsLargeAsTheFirstOnes) {
     return late.descriptors <= early.descriptors + 2 && late.threads <= early.threads + 2;
   }));
   std::cout << "after " << 3 * rounds << " calls " << early << "; after " << 6 * rounds << " " << late << "\n"
-            << whatHeldTheMainThread();
+            << whatHeldTheMainThread() << withheld.text() << "\n";
 #ifdef NDEBUG  // a sanitizer's heap keeps what was freed; ours keeps some pages of threads that went
   EXPECT_LE(late.residentKilobytes, early.residentKilobytes + 4096);
 #endif
