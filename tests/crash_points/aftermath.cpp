@@ -121,18 +121,19 @@ void Aftermath::checkLogSet(const Told& told) {
                 "the log set");
 }
 
-void Aftermath::checkGatheredFile() {
+void Aftermath::checkGatheredFile(const std::string& path, int most) {
   int copies = 0;
-  const std::string source = _sandbox / kGatheredFile;
+  const std::string source = _sandbox / path;
+  const std::string name = fs::path(path).stem().string();
   if (fs::exists(source)) {
     ++copies;
-    if (readFile(source) != kGatheredText) fail("the gathered file's source is not whole");
+    if (readFile(source) != kGatheredText) fail(name + ": its source is not whole");
   }
-  for (const GatheredText& file : _gathered("gathered.txt")) {
+  for (const GatheredText& file : _gathered(name)) {
     ++copies;
     if (file.text != kGatheredText) fail("not whole: " + file.name);
   }
-  if (copies != 1) fail("the gathered file is there " + std::to_string(copies) + " times");
+  if (copies < 1 || copies > most) fail(name + " is there " + std::to_string(copies) + " times");
 }
 
 void Aftermath::checkSource(const std::string& path, const std::string& text) {

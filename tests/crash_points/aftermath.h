@@ -17,8 +17,8 @@ class Aftermath {
   void checkSession(const Told& told);
   /// Every confirmed log record once and in order.
   void checkLogSet(const Told& told);
-  /// The file that was to be collected is in one place, whole.
-  void checkGatheredFile();
+  /// The file that was to be collected is there, whole, and in so many places at most.
+  void checkGatheredFile(const std::string& path, int most);
   /// A file that is collected and stays: as it was, and in archives too if they have it.
   void checkSource(const std::string& path, const std::string& text);
   /// Every archive is as it was made, and has no directory beside it; the newest is linked.

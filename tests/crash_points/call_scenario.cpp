@@ -15,6 +15,7 @@ class Call : public Scenario {
     sandbox.settings = "[testing]\nclosingStageDelay = 0.001\ndelayedEnd = 0.001\n[bus]\nenabled = false\n";
     sandbox.logSettings += "rotationSize = 1024\n";  // several times within one call
     writeFile(sandbox / kGatheredFile, kGatheredText);
+    writeFile(sandbox / kFarFile, kGatheredText);
   }
 
   void play(const AgentSandbox& sandbox, PlayedClient& client, Told& told) const override {
@@ -33,11 +34,13 @@ class Call : public Scenario {
       if (number % 5 == 0) _tellHeader(client, told, number / 5);
       if (number % 3 == 0) tellRecord(client, told, number);
     }
-    client.tell([&](MessageBuilder& message) {
-      begin(message, 14, "session");
-      message.setString("category", "Gathered");
-      message.setString("path", sandbox / kGatheredFile);
-    });
+    for (const char* const file : {kGatheredFile, kFarFile}) {
+      client.tell([&](MessageBuilder& message) {
+        begin(message, 14, "session");
+        message.setString("category", "Gathered");
+        message.setString("path", sandbox / file);
+      });
+    }
     for (int attempt = 0; attempt < 3 && !told.endIsConfirmed; ++attempt) {
       told.endIsConfirmed = client.tell([](MessageBuilder& message) { begin(message, 1, "sessionType"); });
     }
@@ -47,7 +50,9 @@ class Call : public Scenario {
   void check(Aftermath& after, const Told& told) const override {
     after.checkSession(told);
     after.checkLogSet(told);
-    after.checkGatheredFile();
+    after.checkGatheredFile(kGatheredFile, 1);
+    // The copy has its name before the source goes; who is cut off in between finds the source again.
+    after.checkGatheredFile(kFarFile, 2);
   }
 
  private:

@@ -18,6 +18,7 @@
 #include <thread>
 
 #include "tests/crash_points/aftermath.h"
+#include "tests/crash_points/expected_texts.h"
 #include "tests/crash_points/supervised_agent.h"
 #include "tests/e2e/agent_process.h"
 #include "tests/e2e/small_disk.h"
@@ -244,6 +245,8 @@ class Trial {
   const Scenario& _scenario;
   const TrialPoint _point;
   AgentSandbox _sandbox;
+  /// Where nothing may be mounted, it is no other file system.
+  const SmallDisk _elsewhere{_sandbox / kFarDirectory, "1m"};
   std::optional<SmallDisk> _disk;
   bool _isTold = false;
   Told _told;

@@ -39,26 +39,34 @@ bool isFile(const std::string& path) {
   return std::filesystem::is_regular_file(std::filesystem::symlink_status(path, error));
 }
 
-/// Copies to a hidden name first, so that the target's own name never shows a half file.
-std::error_code copyIntoPlace(const std::string& source, const RootedPlace& target) {
-  const int directory = target.directory.get();
-  const std::string temporary = ".zal-" + randomName();
-  const CopyOutcome copied = copyTreeTo(directory, source, temporary, {.sync = true});
+bool areOnOneFileSystem(const std::string& directory, int other) {
+  struct stat here {
+  }, there{};
+  return ::stat(directory.c_str(), &here) == 0 && ::fstat(other, &there) == 0 && here.st_dev == there.st_dev;
+}
+
+/// By way of another name, so that the target's own never shows a half file.
+std::error_code copyThrough(int directory, const std::string& name, const std::string& source,
+                            const RootedPlace& target) {
+  const CopyOutcome copied = copyTreeTo(directory, source, name, {.sync = true});
   std::error_code error = copied.error;
   if (!error && copied.skipped > 0) error = std::make_error_code(std::errc::operation_not_supported);
-  if (!error) error = renameNoReplaceAt(directory, temporary, directory, target.name);
+  if (!error) error = renameNoReplaceAt(directory, name, target.directory.get(), target.name);
   if (error) {
-    removeTreeAt(directory, temporary);
+    removeTreeAt(directory, name);
     return error;
   }
-  return syncDirectoryAt(directory);
+  return syncDirectoryAt(target.directory.get());
 }
 
 }  // namespace
 
 PosixFilePlacement::PosixFilePlacement(std::string homeDirectory, std::string temporaryArea,
                                        const std::vector<std::string>& roots)
-    : _home(std::move(homeDirectory)), _temporaryArea(std::move(temporaryArea)), _paths(roots, _home) {}
+    : _home(std::move(homeDirectory)),
+      _temporaryParent(std::filesystem::path(temporaryArea).parent_path().string()),
+      _temporaryArea(std::move(temporaryArea)),
+      _paths(roots, _home) {}
 
 std::string PosixFilePlacement::randomTemporaryPath(std::string_view suffix) {
   return _temporaryArea.path() + '/' + randomName() + std::string(suffix);
@@ -103,9 +111,23 @@ std::error_code PosixFilePlacement::move(const std::string& source, const std::s
   // Across file systems the kernel says so before it looks at the target.
   if (nameIsTakenAt(to.directory.get(), to.name, error)) return std::make_error_code(std::errc::file_exists);
   if (error) return error;
-  error = copyIntoPlace(source, to);
+  error = _copyIntoPlace(source, to);
   if (!error) std::filesystem::remove_all(source, error);
   return error;
+}
+
+// In the temporary area, where the next start finds what a kill leaves of it.
+std::error_code PosixFilePlacement::_copyIntoPlace(const std::string& source, const RootedPlace& target) {
+  std::error_code error = std::make_error_code(std::errc::cross_device_link);
+  if (areOnOneFileSystem(_temporaryParent, target.directory.get())) {
+    // A directory: a file that nobody may write is kept there for a day.
+    const std::string room = randomTemporaryPath("");
+    if (::mkdir(room.c_str(), S_IRWXU) == 0)
+      error = copyThrough(openDirectoryAt(AT_FDCWD, room).get(), "copy", source, target);
+    ::rmdir(room.c_str());
+  }
+  if (error != std::errc::cross_device_link) return error;
+  return copyThrough(target.directory.get(), ".zal-" + randomName(), source, target);
 }
 
 std::error_code PosixFilePlacement::prepareOutput(const std::string& path) {

@@ -16,9 +16,9 @@ namespace zal {
 ///
 /// What a directory copy cannot take along, it leaves out and reports the first reason; pipes,
 /// sockets and devices are left out without an error. A move across file systems takes all or
-/// nothing: it copies under a hidden temporary name beside the target (".zal-" and 32 hex digits),
-/// syncs, renames, and only then removes the source. If that removal fails, both are there and the
-/// error says why.
+/// nothing: it copies into the temporary area, or under a hidden name beside the target (".zal-" and 32 hex
+/// digits) where that area is on another file system than the target, syncs, renames, and only then removes
+/// the source. If that removal fails, both are there and the error says why.
 class PosixFilePlacement : public FilePlacement {
  public:
   /// The temporary area need not exist: it is made, for this user alone, when first needed.
@@ -43,7 +43,10 @@ class PosixFilePlacement : public FilePlacement {
   std::error_code remove(const std::string& path) override;
 
  private:
+  std::error_code _copyIntoPlace(const std::string& source, const RootedPlace& target);
+
   const std::string _home;
+  const std::string _temporaryParent;
   TemporaryArea _temporaryArea;
   const RootedPaths _paths;
 };

@@ -3,12 +3,19 @@
 #include <fcntl.h>
 #include <gtest/gtest.h>
 #include <sys/stat.h>
+#include <sys/syscall.h>
+#include <sys/wait.h>
+#include <unistd.h>
 
+#include <chrono>
+#include <csignal>
 #include <filesystem>
 #include <set>
 #include <string>
 
 #include "platform/linux/files/rename_no_replace.h"
+#include "platform/linux/files/temporary_leftovers.h"
+#include "tests/support/failing_calls.h"
 #include "tests/support/real_places.h"
 #include "tests/support/temporary_directory.h"
 
@@ -303,6 +310,47 @@ TEST_F(MoveAcrossFileSystemsTest, ASymbolicLinkArrivesAsALink) {
   EXPECT_FALSE(files.move(directory / "a", other / "b"));
   EXPECT_EQ(fs::read_symlink(other / "b"), "secret");
   EXPECT_EQ(listTree(directory.path()), "secret\n");
+}
+
+TEST_F(MoveAcrossFileSystemsTest, ACopyIsMadeInTheTemporaryAreaWhereThatIsOnTheTargetsFileSystem) {
+  PosixFilePlacement near{directory / "home", other / "area"};
+  putLargeFile("a");
+  writeFile(directory / "d/file", "content");
+  EXPECT_FALSE(near.move(directory / "a", other / "b"));
+  EXPECT_FALSE(near.move(directory / "d", other / "e"));
+  expectLargeFile(other / "b");
+  EXPECT_EQ(listTree(other.path), "area/\nb\ne/\ne/file\n");
+  EXPECT_EQ(listTree(directory.path()), "");
+}
+
+TEST_F(MoveAcrossFileSystemsTest, WhatAKillLeavesOfACopyIsFoundByTheNextStart) {
+  putLargeFile("a");
+  ::chmod((directory / "a").c_str(), 0404);
+  const pid_t process = ::fork();
+  if (process == 0) {
+    PosixFilePlacement dying{directory / "home", other / "area"};
+    int renames = 0;
+    const bool canDie =
+        withFailingCalls({{.number = SYS_renameat2,
+                           .ofThose =
+                               [&renames](const std::uint64_t*) {
+                                 // The first one finds that there are two file systems.
+                                 if (++renames == 2) ::raise(SIGKILL);
+                                 return false;
+                               }}},
+                         [&] { static_cast<void>(dying.move(directory / "a", other / "b")); });
+    ::_exit(canDie ? 0 : 77);
+  }
+  int status = 0;
+  ASSERT_EQ(::waitpid(process, &status, 0), process);
+  if (WIFEXITED(status) && WEXITSTATUS(status) == 77) GTEST_SKIP() << "the host lets no system call fail";
+  EXPECT_TRUE(WIFSIGNALED(status)) << status;
+  EXPECT_FALSE(fs::exists(other / "b"));
+  EXPECT_EQ(removeTemporaryLeftovers(other / "area", std::chrono::floor<std::chrono::microseconds>(
+                                                         std::chrono::system_clock::now())),
+            1U);
+  EXPECT_EQ(listTree(other.path), "");
+  EXPECT_EQ(readFile(directory / "a"), std::string(300'000, 'x'));
 }
 
 TEST_F(MoveAcrossFileSystemsTest, ATakenTargetIsAnErrorAndChangesNothing) {
