@@ -5,6 +5,7 @@
 
 #include <atomic>
 #include <cerrno>
+#include <charconv>
 #include <cstdio>
 
 #include "platform/linux/files/rename_no_replace.h"
@@ -13,10 +14,13 @@
 namespace zal {
 namespace {
 
+constexpr std::string_view kUnfinished = ".new-";
+
 std::string temporaryPathBeside(const std::string& path) {
   static std::atomic<unsigned> counter{0};
-  return path.substr(0, path.rfind('/') + 1) + ".new-" + std::to_string(::getpid()) + "-" +
-         std::to_string(++counter);
+  std::string temporary = path.substr(0, path.rfind('/') + 1);
+  temporary.append(kUnfinished).append(std::to_string(::getpid())).append("-");
+  return temporary + std::to_string(++counter);
 }
 
 std::error_code moveInto(const std::string& temporary, const std::string& path, ExistingFile existing) {
@@ -25,6 +29,16 @@ std::error_code moveInto(const std::string& temporary, const std::string& path, 
 }
 
 }  // namespace
+
+std::optional<pid_t> makerOfUnfinished(std::string_view name) {
+  if (!name.starts_with(kUnfinished)) return std::nullopt;
+  name.remove_prefix(kUnfinished.size());
+  pid_t process = 0;
+  const auto [end, error] = std::from_chars(name.data(), name.data() + name.size(), process);
+  if (error != std::errc() || end == name.data() + name.size() || *end != '-' || process <= 0)
+    return std::nullopt;
+  return process;
+}
 
 std::error_code writeWhole(int descriptor, std::string_view content) {
   while (!content.empty()) {

@@ -1,5 +1,8 @@
 #pragma once
 
+#include <sys/types.h>
+
+#include <optional>
 #include <string>
 #include <string_view>
 #include <system_error>
@@ -15,6 +18,9 @@ enum class ExistingFile { isReplaced, stays };
 /// the name was taken and the file there stays.
 [[nodiscard]] std::error_code placeWholeFile(const std::string& path, std::string_view content,
                                              ExistingFile existing);
+
+/// Of a name that placeWholeFile() gives to what is not whole yet: its process. Nothing for other names.
+[[nodiscard]] std::optional<pid_t> makerOfUnfinished(std::string_view name);
 
 /// Writes everything at the descriptor's position. Returned: why only a part of it.
 [[nodiscard]] std::error_code writeWhole(int descriptor, std::string_view content);

@@ -10,7 +10,9 @@
 #include "platform/linux/disk/kept_places.h"
 #include "platform/linux/files/root_parents.h"
 #include "platform/linux/files/temporary_leftovers.h"
+#include "platform/linux/files/unfinished_files.h"
 #include "platform/linux/host/held_text.h"
+#include "platform/linux/ipc/client_shares.h"
 #include "platform/linux/log/journal_stream.h"
 #include "platform/linux/notifications/notification_file.h"
 #include "platform/linux/progress/progress_file.h"
@@ -38,6 +40,15 @@ std::string helperProgram(const Configuration& configuration, const std::string&
 
 RootedPaths rootedPaths(const Configuration& configuration, const HostEnvironment& environment) {
   return {writtenRoots(configuration.roots), environment.homeDirectory};
+}
+
+/// What processes left that ended between a file and its name.
+void removeUnfinishedIn(const std::string& runtimeRoot, WallTime now) {
+  const std::string shares = clientSharesPath(runtimeRoot);
+  for (const std::string& directory : {notificationDirectory(runtimeRoot), alertDirectory(runtimeRoot),
+                                       shares.substr(0, shares.rfind('/'))}) {
+    removeUnfinishedFiles(directory, now);
+  }
 }
 
 BasebandDumpStarter::Places basebandPlaces(const Configuration& configuration,
@@ -176,6 +187,7 @@ LinuxPlatform::LinuxPlatform(const HostEnvironment& environment)
   // Where standard error goes to the journal, each line is there already.
   _agentLog.setLogFacility(speaksToJournal(environment) ? &_logFiles : &_logFacility);
   for (const std::string& warning : _loaded.warnings) _agentLog.warning(warning);
+  removeUnfinishedIn(_loaded.configuration.roots.RuntimeRoot, _clock.wallNow());
   removeTemporaryLeftoversLater(_queues.global(QueuePriority::background), _clock, _agentLog,
                                 temporaryArea(_loaded.configuration.roots, environment.userId));
 }

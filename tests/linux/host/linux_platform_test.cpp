@@ -15,6 +15,7 @@
 #include "platform/linux/progress/progress_file.h"
 #include "tests/linux/log/listening_journal.h"
 #include "tests/support/child_program.h"
+#include "tests/support/real_places.h"
 #include "tests/support/temporary_directory.h"
 
 namespace zal {
@@ -120,6 +121,18 @@ TEST_F(LinuxPlatformTest, AlertsAndProgressAreRecordsInTheRuntimeDirectory) {
   const auto progress = services.dumpProgress.begin({"Vistel", "/d", {"one"}});
   EXPECT_EQ(listAlerts(home / "runtime/alerts").at(0).alert.title, "Title");
   EXPECT_EQ(listDumpProgress(home / "runtime/dumps").at(0).record.service, "Vistel");
+}
+
+TEST_F(LinuxPlatformTest, AStartRemovesWhatWasNeverFinishedInTheRuntimeDirectory) {
+  configure("[roots]\nRuntimeRoot = '" + (home / "runtime") + "'\n");
+  for (const std::string name : {"notifications/.post-1", "alerts/.new-1", "clients/.new-1"}) {
+    const std::string path = home / ("runtime/" + name);
+    writeFile(path, "half");
+    testing::setTime(path, 1'500'000'000, 0);
+  }
+  writeFile(home / "runtime/notifications/posted", "");
+  const LinuxPlatform platform(environment());
+  EXPECT_EQ(testing::listTree(home / "runtime"), "alerts/\nclients/\nnotifications/\nnotifications/posted\n");
 }
 
 TEST_F(LinuxPlatformTest, TheEndOfTheProcessIsInTheRecordsOfWaitingAlerts) {
