@@ -32,6 +32,8 @@ std::error_code syncFile(const Descriptor& file) {
   return {};
 }
 
+std::string parentOf(const std::string& path) { return path.substr(0, path.rfind('/')); }
+
 /// The first trouble; the others are synced all the same.
 std::error_code syncFilesIn(const std::string& directory) {
   std::error_code error, trouble;
@@ -41,8 +43,11 @@ std::error_code syncFilesIn(const std::string& directory) {
     error = file.isOpen() ? syncFile(file) : lastSystemError();
     if (!trouble) trouble = error;
   }
-  error = syncDirectory(directory);
-  return trouble ? trouble : error;
+  for (const std::string& place : {directory, parentOf(directory)}) {
+    error = syncDirectory(place);
+    if (!trouble) trouble = error;
+  }
+  return trouble;
 }
 
 }  // namespace
@@ -130,8 +135,9 @@ void RecordFile::_refuse(int error) {
 void RecordFile::sync() {
   if (!_syncs || !_file.isOpen() || _written == _synced) return;
   std::error_code error = syncFile(_file);
-  // Its name is there from then on as well.
+  // Its name is there from then on as well, and that of the directory, which may be as new.
   if (!error && _synced == 0) error = syncDirectory(_directory);
+  if (!error && _synced == 0) error = syncDirectory(parentOf(_directory));
   if (error) return _tellUnsynced(_path, error);
   _synced = _written;
   _isUnsyncedTold = false;

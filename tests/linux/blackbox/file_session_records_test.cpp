@@ -310,6 +310,27 @@ TEST_F(FileSessionRecordsTest, AMediumThatRefusesIsToldOnceAndTriedAgain) {
   EXPECT_EQ(log.lines.size(), 1U);  // it went with the third call
 }
 
+TEST_F(FileSessionRecordsTest, SyncingTakesTheNamesOnTheWayAlongOnce) {
+  settings.sync = true;
+  records = makeRecords();
+  auto record = records->begin();
+  std::vector<std::string> synced;
+  const auto noteDirectory = [&synced](const std::uint64_t* words) {
+    synced.push_back(std::filesystem::read_symlink("/proc/self/fd/" + std::to_string(words[0])));
+    return false;
+  };
+  const bool canAsk = testing::withFailingCalls({{SYS_fsync, 0, 1, noteDirectory}}, [&] {
+    for (const char* piece : {"one", "two"}) {
+      record->append(piece);
+      records->flush();
+    }
+    testing::writeFile(home / "reports/Session/Log.log", "lines");
+    record->remove(home / "reports/Session");
+  });
+  if (!canAsk) GTEST_SKIP() << "the host lets no system call fail";
+  EXPECT_THAT(synced, ElementsAre(directory, home / "state", home / "reports/Session", home / "reports"));
+}
+
 TEST_F(FileSessionRecordsTest, LogsThatTheMediumRefusesAreToldAndTheRecordGoes) {
   settings.sync = true;
   records = makeRecords();
