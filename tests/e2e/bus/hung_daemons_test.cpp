@@ -97,9 +97,16 @@ TEST_F(HungDaemonsE2eTest, ADaemonThatHangsAndABusThatDiesHoldUpNobodyAndLeaveAS
   ASSERT_TRUE(log.samples.contains("cell-signal-percentage"));
   EXPECT_EQ(log.samples.at("cell-signal-percentage").back(), 40);
   EXPECT_EQ(log.samples.at("wifi-signal-strength").back(), kSignal.strength);
-  // One line for each, not one a beat.
+  // One line for each, not one a beat. On a host without time for it the daemon may hang of itself as well.
   EXPECT_EQ(linesWith("The system bus is lost"), 1U);
-  EXPECT_EQ(linesWith("Without the cellular signal: "), 1U) << output();
+  bool isWithout = false;
+  for (const std::string& line : linesOf(output())) {
+    const bool goes = line.find("Without the cellular signal: ") != std::string::npos;
+    const bool comesBack = line.find("The cellular signal is sampled again") != std::string::npos;
+    if (!goes && !comesBack) continue;
+    EXPECT_NE(goes, isWithout) << output();
+    isWithout = goes;
+  }
   EXPECT_EQ(agent->terminate(), 0);
 }
 
