@@ -10,15 +10,16 @@ namespace zal {
 
 /// What one session accepted, piece by piece, until its log files have it. It outlives the process unless
 /// removed; letting go of it keeps it. Nothing here fails towards the caller: what cannot be kept is logged
-/// once. Main thread only.
+/// once. Main thread only, but for its removal.
 class SessionRecord {
  public:
   virtual ~SessionRecord() = default;
   /// Adds a piece at the end; it is safe from the next flush on, or when the main loop sleeps.
   virtual void append(std::string_view piece) = 0;
-  /// Takes it away: the files in that directory hold everything now, or nothing needs to be held when the
-  /// directory is empty. What is appended afterwards is lost.
-  virtual void remove(const std::string& writtenInto) = 0;
+  /// From now on what is appended is lost. Returned: what takes the record away, to be called once at most,
+  /// on any thread, as it waits for the disk; never called, it leaves the record to the next start. The files
+  /// in that directory hold everything, or nothing needs to be held when the directory is empty.
+  [[nodiscard]] virtual std::function<void()> removal(const std::string& writtenInto) = 0;
 };
 
 /// A record that its process did not come to remove. It may be larger than memory. Main thread only.

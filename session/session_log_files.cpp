@@ -25,17 +25,33 @@ namespace {
 /// A log of fewer lines says nothing but that there was a session.
 constexpr std::size_t kFewestLines = 4;
 
-/// What has to be copied to another file system would hold the main thread for as long as that takes.
+/// What waits for the disk would hold the main thread for as long as that takes.
+void runElsewhere(const SessionLogWriting::File& part, SessionServices& services,
+                  const SessionWritings::Finish& finish) {
+  if (services.writings == nullptr) return finish(part());
+  const std::vector<SessionLogWriting::File> parts{part};
+  services.writings->begin(std::make_shared<SessionLogWriting>(parts, services.agentLog), finish);
+}
+
 void placeCollectedFiles(const std::shared_ptr<CollectedFilesMove>& files, SessionServices& services,
                          const SessionWritings::Finish& finish) {
+  if (files->moveWithinFileSystem()) return finish(true);
   const SessionLogWriting::File moveRest = [files] {
     files->moveRest();
     return true;
   };
-  if (files->moveWithinFileSystem()) return finish(true);
-  if (services.writings == nullptr) return finish(moveRest());
-  const std::vector<SessionLogWriting::File> parts{moveRest};
-  services.writings->begin(std::make_shared<SessionLogWriting>(parts, services.agentLog), finish);
+  runElsewhere(moveRest, services, finish);
+}
+
+/// One that is left stays: perhaps the disk takes the files at the next start.
+void removeRecord(SessionRecord* record, const std::string& writtenInto, SessionServices& services,
+                  const SessionWritings::Finish& finish) {
+  if (record == nullptr) return finish(true);
+  const SessionLogWriting::File remove = [removal = record->removal(writtenInto)] {
+    removal();
+    return true;
+  };
+  runElsewhere(remove, services, finish);
 }
 
 }  // namespace
@@ -94,9 +110,9 @@ void ZalLoggingAgentVistelSession::writeSessionLog(bool endedByEndAll) {
   const SessionLogs::Taken logs = _logs.take(directory, fileEnding, std::exchange(_header, nullptr));
   const auto close = [&services = _services, directory, record = _recorder.release(),
                       collection = _collection(directory, endedByEndAll)](bool isWritten) {
-    // One that is left stays: perhaps the disk takes the files at the next start.
-    if (record && isWritten) record->remove(directory);
-    if (services.CollectServiceLogs) services.CollectServiceLogs(collection);
+    removeRecord(isWritten ? record.get() : nullptr, directory, services, [&services, collection](bool) {
+      if (services.CollectServiceLogs) services.CollectServiceLogs(collection);
+    });
   };
   const auto files =
       std::make_shared<CollectedFilesMove>(_filesToCollect, directory, _services.fileCollector, log);

@@ -28,9 +28,9 @@ void SessionRecorder::note(const SessionEntry& entry) {
   if (_piece.capacity() > kLargestSparePiece) std::string().swap(_piece);
 }
 
-void SessionRecorder::remove(const std::string& writtenInto) {
+void SessionRecorder::remove() {
   if (!_record) return;
-  _record->remove(writtenInto);
+  _record->removal({})();
   _record.reset();
 }
 

@@ -24,8 +24,8 @@ class SessionRecorder {
   void open(WallTime now);
   /// Nothing while no record is open.
   void note(const SessionEntry& entry);
-  /// The record is of no more use; see SessionRecord::remove.
-  void remove(const std::string& writtenInto);
+  /// The record, if there is one, is of no more use.
+  void remove();
   /// The record as it is, which who lets go of it leaves to the next start of the agent; null: there is none.
   [[nodiscard]] std::shared_ptr<SessionRecord> release() { return std::exchange(_record, nullptr); }
 

@@ -31,7 +31,11 @@ void SessionWritings::finishAll() {
 void SessionWritings::_finishFirst() {
   const Pending first = std::move(_pending->front());
   _pending->pop_front();
+  const std::size_t begun = _begun;
   first.finish(first.writing->run());
+  // What follows from it belongs to it.
+  if (_begun == begun) return;
+  for (const auto& kept : first.kept) keepUntilFinished(kept);
 }
 
 }  // namespace zal

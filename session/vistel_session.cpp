@@ -23,7 +23,7 @@ ZalLoggingAgentVistelSession::ZalLoggingAgentVistelSession(std::string sessionTy
       _dateFormatter(services.clock, services.timeZone) {}
 
 ZalLoggingAgentVistelSession::~ZalLoggingAgentVistelSession() {
-  if (!_active) _recorder.remove({});
+  if (!_active) _recorder.remove();
 }
 
 void ZalLoggingAgentVistelSession::beginSessionWithSender(OptionalText sender) {

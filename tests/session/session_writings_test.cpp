@@ -83,8 +83,12 @@ TEST_F(SessionWritingsTest, AnythingIsKeptUntilAllThatWereBegunAreFinished) {
   runSession();
   EXPECT_EQ(writings.begun(), 1U);
   writings.keepUntilFinished(kept);
-  EXPECT_EQ(kept.use_count(), 2);
-  fakes.queues.runAll();
+  // The logs, the file from another file system, the record.
+  for (int step = 0; step < 3; ++step) {
+    EXPECT_EQ(kept.use_count(), 2) << step;
+    ASSERT_TRUE(fakes.queues.runNext("session.logs"));
+    fakes.host.drain();
+  }
   EXPECT_EQ(kept.use_count(), 1);
   writings.keepUntilFinished(kept);  // there are none
   EXPECT_EQ(kept.use_count(), 1);
@@ -109,10 +113,21 @@ TEST_F(SessionWritingsTest, AFileOfTheSameOneIsInItsPlaceWithTheLogs) {
   runSession();
   ASSERT_TRUE(fakes.queues.runNext("session.logs"));
   fakes.host.drain();
-  EXPECT_EQ(fakes.queues.readyJobs("session.logs"), 0U);
   EXPECT_TRUE(isMoved());
+}
+
+TEST_F(SessionWritingsTest, TheRecordGoesAwayFromTheMainThreadAndBeforeTheCollection) {
+  fakes.files.isElsewhere = {};
+  runSession();
+  ASSERT_TRUE(fakes.queues.runNext("session.logs"));
+  fakes.host.drain();
+  EXPECT_FALSE(isRecordRemoved());
+  ASSERT_TRUE(fakes.queues.runNext("session.logs"));
   EXPECT_TRUE(isRecordRemoved());
+  EXPECT_EQ(collections.size(), 0U);
+  fakes.host.drain();
   EXPECT_EQ(collections.size(), 1U);
+  EXPECT_EQ(fakes.queues.readyJobs("session.logs"), 0U);
 }
 
 TEST_F(SessionWritingsTest, TheEndOfTheProcessWaitsForIt) {

@@ -41,9 +41,11 @@ class FakeSessionRecords : public SessionRecords {
    public:
     explicit Record(std::shared_ptr<Kept> kept) : _kept(std::move(kept)) {}
     void append(std::string_view piece) override { _kept->pieces.emplace_back(piece); }
-    void remove(const std::string& writtenInto) override {
-      _kept->isRemoved = true;
-      _kept->writtenInto = writtenInto;
+    [[nodiscard]] std::function<void()> removal(const std::string& writtenInto) override {
+      return [kept = _kept, writtenInto] {
+        kept->isRemoved = true;
+        kept->writtenInto = writtenInto;
+      };
     }
 
    private:

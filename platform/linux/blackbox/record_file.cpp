@@ -7,6 +7,7 @@
 #include <cerrno>
 #include <charconv>
 #include <filesystem>
+#include <memory>
 #include <system_error>
 #include <utility>
 
@@ -48,6 +49,11 @@ std::error_code syncFilesIn(const std::string& directory) {
     if (!trouble) trouble = error;
   }
   return trouble;
+}
+
+void tellUnsynced(AgentLog& log, const std::string& path, const std::error_code& error) {
+  log.warning("What a session accepted may not outlive the end of the power: " + path + ": " +
+              error.message());
 }
 
 }  // namespace
@@ -138,26 +144,23 @@ void RecordFile::sync() {
   // Its name is there from then on as well, and that of the directory, which may be as new.
   if (!error && _synced == 0) error = syncDirectory(_directory);
   if (!error && _synced == 0) error = syncDirectory(parentOf(_directory));
-  if (error) return _tellUnsynced(_path, error);
-  _synced = _written;
-  _isUnsyncedTold = false;
+  if (!error) _synced = _written;
+  if (!std::exchange(_isUnsyncedTold, static_cast<bool>(error)) && error) tellUnsynced(_log, _path, error);
 }
 
-void RecordFile::_tellUnsynced(const std::string& path, const std::error_code& error) {
-  if (std::exchange(_isUnsyncedTold, true)) return;
-  _log.warning("What a session accepted may not outlive the end of the power: " + path + ": " +
-               error.message());
-}
-
-void RecordFile::remove(const std::string& writtenInto) {
-  if (std::exchange(_removed, true)) return;
+std::function<void()> RecordFile::removal(const std::string& writtenInto) {
+  _removed = true;
   std::string().swap(_pending);
-  if (!_file.isOpen()) return;
-  if (_syncs && !writtenInto.empty()) {
-    if (const std::error_code error = syncFilesIn(writtenInto)) _tellUnsynced(writtenInto, error);
-  }
-  ::unlink(_path.c_str());
-  _file = {};
+  if (!_file.isOpen()) return [] {};
+  // With its lock, which another start of the agent respects.
+  return [&log = _log, path = _path, file = std::make_shared<Descriptor>(std::move(_file)),
+          toSync = _syncs ? writtenInto : std::string()] {
+    if (!toSync.empty()) {
+      if (const std::error_code error = syncFilesIn(toSync)) tellUnsynced(log, toSync, error);
+    }
+    ::unlink(path.c_str());
+    *file = {};
+  };
 }
 
 }  // namespace zal

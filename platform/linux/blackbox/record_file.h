@@ -2,9 +2,9 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <functional>
 #include <string>
 #include <string_view>
-#include <system_error>
 
 #include "platform/agent_log.h"
 #include "platform/linux/files/descriptor.h"
@@ -18,10 +18,11 @@ inline constexpr std::string_view kRecordFileEnding = ".session";
 
 /// One record as a file of its own in a private directory, locked for as long as its process lives. Made
 /// when the first piece is written. Ahead of what is written there is always room that was reserved while
-/// there was some. While the disk refuses, a mebibyte waits in memory for it. Main thread only.
+/// there was some. While the disk refuses, a mebibyte waits in memory for it. Main thread only, but
+/// for the removal.
 class RecordFile final : public SessionRecord {
  public:
-  /// With `syncs`, sync() and remove() wait for the medium.
+  /// With `syncs`, sync() and the removal wait for the medium.
   RecordFile(AgentLog& log, std::string directory, bool syncs);
   /// What is pending is still written.
   ~RecordFile() override;
@@ -29,7 +30,7 @@ class RecordFile final : public SessionRecord {
   RecordFile& operator=(const RecordFile&) = delete;
 
   void append(std::string_view piece) override;
-  void remove(const std::string& writtenInto) override;
+  [[nodiscard]] std::function<void()> removal(const std::string& writtenInto) override;
 
   /// Hands the pieces to the kernel.
   void write();
@@ -41,7 +42,6 @@ class RecordFile final : public SessionRecord {
   [[nodiscard]] bool _open();
   void _reserve(std::size_t more);
   void _refuse(int error);
-  void _tellUnsynced(const std::string& path, const std::error_code& error);
 
   AgentLog& _log;
   const std::string _directory;

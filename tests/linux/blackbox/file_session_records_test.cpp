@@ -131,7 +131,7 @@ TEST_F(FileSessionRecordsTest, ARemovedRecordLeavesNothing) {
   const auto record = records->begin();
   record->append("one");
   loop.drain();
-  record->remove("");
+  record->removal("")();
   record->append("two");
   loop.drain();
   EXPECT_THAT(files(), IsEmpty());
@@ -281,7 +281,7 @@ TEST_F(FileSessionRecordsTest, SyncingKeepsAndRemovesTheSame) {
   record->append("two");
   records->flush();
   testing::writeFile(home / "reports/Log.log", "lines");
-  record->remove(home / "reports");
+  record->removal(home / "reports")();
   EXPECT_THAT(files(), IsEmpty());
   leave({"three"});
   EXPECT_THAT(recovered(), ElementsAre(Pieces{"three"}));
@@ -325,7 +325,7 @@ TEST_F(FileSessionRecordsTest, SyncingTakesTheNamesOnTheWayAlongOnce) {
       records->flush();
     }
     testing::writeFile(home / "reports/Session/Log.log", "lines");
-    record->remove(home / "reports/Session");
+    record->removal(home / "reports/Session")();
   });
   if (!canAsk) GTEST_SKIP() << "the host lets no system call fail";
   EXPECT_THAT(synced, ElementsAre(directory, home / "state", home / "reports/Session", home / "reports"));
@@ -339,7 +339,7 @@ TEST_F(FileSessionRecordsTest, LogsThatTheMediumRefusesAreToldAndTheRecordGoes) 
   records->flush();
   testing::writeFile(home / "reports/Log.log", "lines");
   const bool canFail =
-      testing::withFailingCalls({{SYS_fdatasync, EIO, 1}}, [&] { record->remove(home / "reports"); });
+      testing::withFailingCalls({{SYS_fdatasync, EIO, 1}}, [&] { record->removal(home / "reports")(); });
   if (!canFail) GTEST_SKIP() << "the host lets no system call fail";
   EXPECT_THAT(log.lines, ElementsAre(HasSubstr(home / "reports: Input/output error")));
   EXPECT_THAT(files(), IsEmpty());
