@@ -13,7 +13,8 @@ struct ZipEntry {
   std::uint64_t bytes = 0;
 };
 
-/// The regular files of an archive, in its order; nothing when it cannot be read. Any thread.
+/// The regular files of an archive, in its order; nothing when it cannot be read, or is none as ZipDirectory
+/// takes them. Any thread.
 [[nodiscard]] std::optional<std::vector<ZipEntry>> listZip(const std::string& archive);
 
 /// One file out of an archive, whole and with its checksum right; nothing otherwise, or when it is
